@@ -1,0 +1,16 @@
+# IC::ZQ and IC::VXLog: the agent's own libraries below IC_PLATFORM_DIR. Used by the build and by the
+# installed package.
+foreach(name ZQ VXLog)
+    if(TARGET IC::${name})
+        continue()
+    endif()
+    find_library(IC_PLATFORM_${name} ${name} PATHS ${IC_PLATFORM_DIR}/lib NO_DEFAULT_PATH NO_CACHE)
+    if(NOT IC_PLATFORM_${name} OR NOT IS_DIRECTORY ${IC_PLATFORM_DIR}/include/${name})
+        message(FATAL_ERROR "IC: no ${name} library in '${IC_PLATFORM_DIR}' (IC_PLATFORM_DIR): "
+                            "lib/ must hold the library and include/${name}/ its headers")
+    endif()
+    add_library(IC::${name} UNKNOWN IMPORTED)
+    set_target_properties(IC::${name} PROPERTIES
+        IMPORTED_LOCATION ${IC_PLATFORM_${name}}
+        INTERFACE_INCLUDE_DIRECTORIES ${IC_PLATFORM_DIR}/include)
+endforeach()

@@ -1,0 +1,66 @@
+#pragma once
+
+#include <iosfwd>
+#include <string>
+#include <type_traits>
+
+#include "ZQ/Types.h"
+
+namespace [[gnu::visibility("default")]] IC {
+
+// One member of some enumeration as a plain unsigned number; it does not know which enumeration.
+//
+// A plain value, trivially copyable; one object belongs to one thread at a time. Every refusal writes a log
+// record and a trace record (category "Vexilon.IC.EnumValue", level 6000) and then throws.
+//
+//   IC::EnumValue state(7u);
+//   unsigned char code = state;                // 7
+//   std::cout << state;                        // 7
+class EnumValue {
+public:
+    EnumValue() noexcept : value_(0) { }
+    EnumValue(const unsigned char& value) noexcept : value_(value) { }
+    EnumValue(const unsigned short& value) noexcept : value_(value) { }
+    EnumValue(const unsigned int& value) noexcept : value_(value) { }
+
+    // The value at the width asked for; nothing is cut off.
+    //
+    //   refused        logged, with the value              thrown: std::out_of_range
+    //   above 65535    "Uint16: number out of range: "     "The number is too large to convert to a 16-bit
+    //                                                       integer"
+    //   above 255      "Uint8: number out of range: "      "The number is too large to convert to an 8-bit
+    //                                                       integer"
+    operator unsigned int() const noexcept { return value_; }
+    operator unsigned short() const
+    {
+        return value_ <= 0xFFFFu ? static_cast<unsigned short>(value_) : refuseUint16();
+    }
+    operator unsigned char() const
+    {
+        return value_ <= 0xFFu ? static_cast<unsigned char>(value_) : refuseUint8();
+    }
+
+    // The decimal digits, as a fresh std::ostringstream writes them under the global locale.
+    operator std::string() const;
+
+private:
+    [[noreturn, gnu::cold]] unsigned short refuseUint16() const;
+    [[noreturn, gnu::cold]] unsigned char refuseUint8() const;
+
+    ZQ::Uint32 value_;
+};
+
+static_assert(std::is_trivially_copyable_v<EnumValue>);
+
+// Compare the values as unsigned numbers.
+bool operator==(const EnumValue& a, const EnumValue& b);
+bool operator!=(const EnumValue& a, const EnumValue& b);
+bool operator<(const EnumValue& a, const EnumValue& b);
+bool operator<=(const EnumValue& a, const EnumValue& b);
+bool operator>(const EnumValue& a, const EnumValue& b);
+bool operator>=(const EnumValue& a, const EnumValue& b);
+
+// Inserts std::string(value) as one text: width and fill apply to the whole of it.
+std::ostream& operator<<(std::ostream& out, const EnumValue& value);
+
+}  // namespace gnu::visibility("default")]]IC

@@ -1,0 +1,65 @@
+#pragma once
+
+#include <iosfwd>
+#include <string>
+
+#include "IC/Number.h"
+#include "ZQ/Types.h"
+
+namespace [[gnu::visibility("default")]] IC {
+
+// How an operation went, without an exception: a status, perhaps a number that goes with it, perhaps a text.
+//
+// Built once and read. A plain value; one object belongs to one thread at a time.
+//
+//   IC::Error error("no such property", IC::Error::STATUS_NO_SUCH_PROPERTY);
+//   std::cout << error;                        // 5 - no such property
+//
+// Mind the order of the arguments: the constructor of three takes the status first, the others last.
+class Error {
+public:
+    // 1 to 4 and 6 to 15 are valid as well; their meaning is the caller's.
+    enum StatusType : ZQ::Uint8 {
+        STATUS_SUCCESS = 0,
+        STATUS_NO_SUCH_PROPERTY = 5,
+        STATUS_READ_ONLY = 16  // the largest status
+    };
+
+    // Without a number the value is of kind Number::KIND_UNKNOWN; without a text the message is empty.
+    // A null `message` throws std::logic_error.
+    //
+    //   refused            logged, with the status                  thrown: std::invalid_argument
+    //   status above 16    "initstatus: Invalid error status="      "Invalid error status"
+    //
+    // The records have the category "Vexilon.IC.Error" and the level 6000.
+    Error(const Number& value, unsigned char status);
+    Error(unsigned char status, const Number& value, const std::string& message);
+    Error(const char* message, unsigned char status);
+    Error(const std::string& message, unsigned char status);
+
+    StatusType getStatus() const noexcept { return status_; }
+    operator StatusType() const noexcept { return status_; }
+    operator unsigned char() const noexcept { return status_; }
+
+    Number getValue() const noexcept { return value_; }
+    operator Number() const noexcept { return value_; }
+
+    std::string getMessage() const { return message_; }
+
+    // The status; " - " and the number unless its kind is KIND_UNKNOWN; " - " and the message unless it is
+    // empty: "0", "5 - 17", "5 - no such property". As a fresh std::ostringstream writes it under the global
+    // locale.
+    operator std::string() const;
+
+private:
+    void initStatus(unsigned char status);
+
+    StatusType status_ = STATUS_SUCCESS;
+    Number value_;
+    std::string message_;
+};
+
+// Inserts std::string(error) as one text: width and fill apply to the whole of it.
+std::ostream& operator<<(std::ostream& out, const Error& error);
+
+}  // namespace gnu::visibility("default")]]IC

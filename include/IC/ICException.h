@@ -1,0 +1,46 @@
+#pragma once
+
+#include <string>
+
+namespace [[gnu::visibility("default")]] IC {
+
+// The root of the library's own exceptions. It has no base: handlers of std::exception do not see it.
+class ICException {
+public:
+    explicit ICException(const std::string& text = std::string());
+    ICException(const ICException&) = default;
+    ICException& operator=(const ICException&) = default;
+    virtual ~ICException();
+
+    // A copy of the message.
+    virtual std::string what() const;
+
+protected:
+    std::string message;
+};
+
+// Thrown by PropertyValue: an unknown kind, or a value that is not of the kind asked for.
+//
+// The base is private on purpose: `catch (IC::ICException&)` does not catch it; catch it by its own name.
+class PropertyValueInvalidKind : private ICException {
+public:
+    explicit PropertyValueInvalidKind(const std::string& text);
+    PropertyValueInvalidKind(const PropertyValueInvalidKind&) = default;
+    PropertyValueInvalidKind& operator=(const PropertyValueInvalidKind&) = default;
+    ~PropertyValueInvalidKind() override;
+
+    using ICException::what;
+};
+
+// Thrown by Node for a sensor code above 73. The base is private on purpose, as above.
+class NodeInvalidSensor : private ICException {
+public:
+    explicit NodeInvalidSensor(const std::string& text);
+    NodeInvalidSensor(const NodeInvalidSensor&) = default;
+    NodeInvalidSensor& operator=(const NodeInvalidSensor&) = default;
+    ~NodeInvalidSensor() override;
+
+    using ICException::what;
+};
+
+}  // namespace gnu::visibility("default")]]IC

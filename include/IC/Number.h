@@ -1,0 +1,284 @@
+#pragma once
+
+#include <cstddef>
+#include <cstring>
+#include <iosfwd>
+#include <string>
+#include <type_traits>
+
+#include "ZQ/DateTime.h"
+#include "ZQ/Types.h"
+
+// Some systems define these as macros; inside this header they are names.
+#pragma push_macro("major")
+#pragma push_macro("minor")
+#undef major
+#undef minor
+
+namespace IC {
+class Number;
+}
+namespace IC::detail {
+class Text;
+void append(Text& text, const Number& number);
+}  // namespace IC::detail
+
+namespace [[gnu::visibility("default")]] IC {
+
+// The display names of the sensor types, indexed by Node::SensorType. Entry 74, "invalid", is no sensor type.
+// Programs hold a copy of the table, so its size never changes.
+extern const std::string pst[75];
+
+// A version of two numbers; its text is "2.15".
+struct Version2 {
+    ZQ::Uint8 major;
+    ZQ::Uint8 minor;
+};
+
+// A reference to a node: its sensor type (an index into `pst`) and its number.
+struct sNodeRef {
+    ZQ::Uint32 type;
+    ZQ::Uint32 id;
+};
+using NodeRef = sNodeRef;
+
+// One number of one of eleven kinds, which gives itself back only as what it is.
+//
+// A plain value, trivially copyable; one object belongs to one thread at a time. It has no default
+// constructor. Every refusal writes a log record and a trace record (category "Vexilon.IC.Number", level
+// 6000) and then throws; a refused conversion or comparison changes nothing.
+//
+//   IC::Number speed(3600u);
+//   unsigned int rpm = speed;                  // 3600
+//   std::cout << speed;                        // 3600
+//
+// Rules that look odd and are meant:
+// - unsigned char is a kind code: Number(static_cast<unsigned char>(3)) is the kind KIND_UINT32 with 0.
+//   unsigned short and char widen to int and give a signed number.
+// - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
+// - A signed number converts to int and to nothing else; a negative real converts to no integer.
+// - Two signed numbers are always equal and never ordered; so are two node references.
+class Number {
+public:
+    enum KindType : ZQ::Uint32 {
+        KIND_UNKNOWN = 0,   // no value
+        KIND_BOOL = 1,      // a flag
+        KIND_INT = 2,       // a signed 32-bit integer
+        KIND_UINT32 = 3,    // an unsigned 32-bit integer
+        KIND_UINT64 = 4,    // an unsigned 64-bit integer
+        KIND_REAL = 5,      // a 64-bit real, NaN and infinities included
+        KIND_NAN = 6,       // no value: "not a number"
+        KIND_INFINITY = 7,  // no value: positive infinity
+        KIND_VERSION = 8,   // a Version2
+        KIND_DATETIME = 9,  // seconds, milliseconds and scope
+        KIND_NODEREF = 10   // an sNodeRef
+    };
+
+    Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL) { store(static_cast<ZQ::Uint8>(value)); }
+    Number(const int& value) noexcept : Number(Tag(), KIND_INT) { store(value); }
+    Number(const unsigned int& value) noexcept : Number(Tag(), KIND_UINT32) { store(value); }
+    Number(const unsigned long long& value) noexcept : Number(Tag(), KIND_UINT64) { store(value); }
+    // The kind is KIND_REAL for a NaN and for infinities too.
+    Number(const double& value) noexcept : Number(Tag(), KIND_REAL) { store(value); }
+    Number(const Version2& value) noexcept : Number(Tag(), KIND_VERSION) { store(value); }
+    Number(const sNodeRef& value) noexcept : Number(Tag(), KIND_NODEREF) { nodeRef_ = value; }
+
+    // A date-time of scope 3. Seconds since the epoch.
+    Number(long seconds, unsigned short milliseconds) noexcept : Number(Tag(), KIND_DATETIME)
+    {
+        storeDateTime(seconds, milliseconds, defaultScope);
+    }
+
+    // A date-time; the scope is cut to 8 bits and the milliseconds to 16.
+    Number(const ZQ::DateTime& value);
+
+    // A number of the kind with this code, with the content that initKind gives.
+    //
+    //   refused                logged, with the code                 thrown
+    //   11 and above           "Number: wrong kind of number: "      std::invalid_argument
+    //   2, 10                  as by initKind                        "Invalid kind of number"
+    Number(const unsigned char& code);
+
+    // The same; every refusal is initKind's.
+    Number(const KindType& kind);
+
+    // A pointer would silently become a flag.
+    template <class T>
+    Number(T*) = delete;
+    Number(std::nullptr_t) = delete;
+
+    KindType getKind() const noexcept { return kind_; }
+    operator KindType() const noexcept { return kind_; }
+
+    // Stores the kind and gives the value that kind's first content: 0, 0.0, version 0.0, or the current time
+    // in whole seconds with scope 3. For the kinds 0, 1, 6 and 7 the flag byte is cleared and the rest is
+    // kept.
+    //
+    //   refused                logged, with the kind                 thrown
+    //   2, 10, 11 and above    "initkind: invalid kind of number "   std::invalid_argument
+    //                                                                "Invalid kind of number"
+    //
+    // The refused kind stays stored (deliberate). A kind of 11 or more then behaves like KIND_UNKNOWN in
+    // conversions and comparisons, and its text is "invalid".
+    void initKind(const KindType& kind);
+
+    // Replaces the kind and keeps the bytes of the value as they lie in storage: a reinterpretation, no
+    // conversion. All kinds from 0 to 10 are taken. A flag byte above 1 made this way converts to true, 1 and
+    // 1.0, and prints "true".
+    //
+    //   refused                logged, with the code                 thrown
+    //   11 and above           "setKind: invalid kind "              std::invalid_argument "Invalid kind"
+    //
+    // A refused call changes nothing.
+    void setKind(const unsigned char& code);
+
+    // The conversions. Each takes the kinds in its row and refuses the others with std::out_of_range. A real
+    // is cut toward zero and refused where the target cannot hold it; nothing is saturated.
+    //
+    //   to                  takes
+    //   bool                flag, uint32, uint64, real (not 0; NaN is true)
+    //   int                 flag, int; uint32 and uint64 below 2^32 and reals from 0 to below 2^32, the low
+    //   32
+    //                       bits of which are taken as signed; the refusals speak of an unsigned integer
+    //   unsigned int        flag, uint32; uint64 and reals below 2^32
+    //   unsigned long long  flag, uint32, uint64; reals below 2^64
+    //   double              flag, uint32, uint64, real, NaN, infinity; a version as major.minor (2.15)
+    //   Version2            version; uint32 and uint64 up to 255, as the major number
+    //   ZQ::DateTime        date-time of scope 1 to 3
+    //   sNodeRef            node reference
+    //
+    //   refused          logged                                              thrown: std::out_of_range
+    //   the kind         "bool: Can't return current value as a Boolean,     "Can't return current value as a
+    //                     kind=", and the kind                                Boolean"
+    //                    "Uint32: ... as a 32-bit integer, kind=" (and int)  "... as a 32-bit integer"
+    //                    "Uint64: ... as a 64-bit integer, kind="            "... as a 64-bit integer"
+    //                    "Real: ... as a Real, kind="                        "... as a Real"
+    //                    "Version: ... as a Version, kind="                  "... as a Version"
+    //                    "DateTime: ... as a DateTime, kind="                "... as a DateTime"
+    //                    "NodeRef: ... as a pair, kind="                     "... as pair"
+    //   too large        "Uint32: number out of range: ", and the value      "The number is too large to
+    //   convert
+    //                                                                         to a 32-bit integer"
+    //                    "Uint64: number out of range: "                     "... to a 64-bit integer"
+    //                    "Version: Number too large for version: "           "... to a version"
+    //   below 0          "Uint32: number out of range: "                     "A negative number cannot
+    //   convert to
+    //                                                                         an unsigned 32-bit integer"
+    //                    "Uint64: number out of range: "                     "... an unsigned 64-bit integer"
+    //
+    // A real NaN passes both range checks: it gives 0 for the 32-bit integers and 2^63 for the 64-bit one.
+    operator bool() const { return kind_ == KIND_BOOL ? load<ZQ::Uint8>() != 0 : toBool(); }
+    operator int() const
+    {
+        return kind_ == KIND_INT ? load<int>() : static_cast<int>(toUint32("operator int"));
+    }
+    operator unsigned int() const
+    {
+        return kind_ == KIND_UINT32 ? load<ZQ::Uint32>() : toUint32("operator ZQ::Uint32");
+    }
+    operator unsigned long long() const { return kind_ == KIND_UINT64 ? load<ZQ::Uint64>() : toUint64(); }
+    operator double() const { return kind_ == KIND_REAL ? load<ZQ::Real64>() : toReal(); }
+    operator Version2() const { return kind_ == KIND_VERSION ? load<Version2>() : toVersion(); }
+    operator ZQ::DateTime() const;
+    operator sNodeRef() const { return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef(); }
+
+    // The text, as a fresh std::ostringstream writes it under the global locale: "unknown", "true", decimal
+    // digits, a real with six significant digits, "not a number", "infinity", "2.15", a date-time,
+    // "CPU:7" for a node reference (a sensor type above 74 takes the name of entry 74), "invalid".
+    //
+    // Milliseconds that are a multiple of 10 do not appear in the text of a date-time. Others print as
+    // ".Conversion failed remainder>0", after the records "string: conversion failed, remainder not zero,
+    // remainder=" and the last digit (deliberate). Nothing is refused.
+    operator std::string() const;
+
+private:
+    // Comparisons and text read the value as its kind says.
+    friend bool operator==(const Number& a, const Number& b);
+    friend bool operator<(const Number& a, const Number& b);
+    friend bool operator>(const Number& a, const Number& b);
+    friend void detail::append(detail::Text& text, const Number& number);
+
+    struct Tag { };
+
+    struct DateTimeFields {
+        long seconds;
+        ZQ::Uint16 milliseconds;
+        ZQ::Uint8 scope;
+    };
+    static constexpr ZQ::Uint8 defaultScope = 3;
+
+    // Every byte of the value is defined, also those that the kind does not use.
+    Number(Tag, KindType kind) noexcept : kind_(kind), value_ {}, nodeRef_ {0, 0} { }
+
+    template <class T>
+    T load() const noexcept
+    {
+        T content;
+        std::memcpy(&content, value_, sizeof content);
+        return content;
+    }
+
+    template <class T>
+    void store(const T& content) noexcept
+    {
+        std::memcpy(value_, &content, sizeof content);
+    }
+
+    // Field by field: a struct copied whole would bring its undefined padding along.
+    void storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept
+    {
+        std::memcpy(value_ + offsetof(DateTimeFields, seconds), &seconds, sizeof seconds);
+        std::memcpy(value_ + offsetof(DateTimeFields, milliseconds), &milliseconds, sizeof milliseconds);
+        std::memcpy(value_ + offsetof(DateTimeFields, scope), &scope, sizeof scope);
+    }
+
+    bool toBool() const;
+    ZQ::Uint32 toUint32(const char* function) const;
+    ZQ::Uint64 toUint64() const;
+    ZQ::Real64 toReal() const;
+    Version2 toVersion() const;
+    [[noreturn, gnu::cold]] sNodeRef refuseNodeRef() const;
+
+    static bool precedes(const Number& a, const Number& b);
+
+    KindType kind_;
+    // The kind's content at its start. Bytes, because setKind lets one kind's be read as another's.
+    alignas(ZQ::Uint64) alignas(DateTimeFields) unsigned char value_[sizeof(DateTimeFields)];
+    sNodeRef nodeRef_;
+};
+
+static_assert(std::is_trivially_copyable_v<Number>);
+static_assert(std::is_trivially_copyable_v<Version2>);
+static_assert(std::is_trivially_copyable_v<sNodeRef>);
+
+// Equality never fails. Numbers of different kinds are unequal. Signed numbers are all equal, and so are node
+// references, and the kinds without a value. Date-times are equal whatever their scope; a real NaN equals
+// nothing.
+bool operator==(const Number& a, const Number& b);
+bool operator!=(const Number& a, const Number& b);
+
+// Less-than and greater-than, within one kind. Kinds without a value, signed numbers and node references are
+// neither less nor greater. Infinity on the left is never less and always greater than what is not infinity,
+// of any kind; infinity on the right of another kind is refused.
+//
+//   refused                  logged                                              thrown:
+//   std::invalid_argument a kind is KIND_NAN       "<: invalid operation when kind is NaN" "Invalid operation
+//   when kind is
+//                            (">: ..." for greater)                               NaN"
+//   the kinds differ         "<: cannot compare two different kinds of number,   "Cannot compare two
+//   different
+//                             kind1=3, kind2=4" (">: ...")                        kinds of number"
+bool operator<(const Number& a, const Number& b);
+bool operator>(const Number& a, const Number& b);
+
+// a == b, or else a < b (a > b): equal numbers are never refused.
+bool operator<=(const Number& a, const Number& b);
+bool operator>=(const Number& a, const Number& b);
+
+// Inserts std::string(number) as one text: width and fill apply to the whole of it.
+std::ostream& operator<<(std::ostream& out, const Number& number);
+
+}  // namespace gnu::visibility("default")]]IC
+
+#pragma pop_macro("major")
+#pragma pop_macro("minor")

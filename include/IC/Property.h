@@ -1,0 +1,259 @@
+#pragma once
+
+#include <iosfwd>
+#include <map>
+#include <string>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+#include "IC/EnumValue.h"
+#include "IC/Number.h"
+#include "ZQ/Types.h"
+
+namespace [[gnu::visibility("default")]] IC {
+
+using Buffer = std::vector<unsigned char>;
+using NumberArray = std::vector<Number>;
+using StringArray = std::vector<std::string>;
+
+// The value of a node's property: a text, a number, an enumerated value, bytes, an array of numbers or of
+// texts, or nothing yet; and a mark that says whether Node::setProperty may replace it.
+//
+// A value type: a copy is independent of its source. One object belongs to one thread at a time. Every
+// refusal but one (to EnumValue) writes a log record and a trace record (category "Vexilon.IC.Property",
+// level 6000) and then throws. Where memory runs out, std::bad_alloc is thrown and the value is as it was.
+//
+//   IC::PropertyValue model("DCS8000Z", true); // a read-only text
+//   std::string text = model;                  // DCS8000Z
+//   IC::PropertyValue speed(IC::Number(3600u));
+//   unsigned int rpm = speed;                  // 3600
+//   IC::Buffer bytes = IC::PropertyValue(IC::Buffer {0x0a, 0xff});
+//
+// Rules that look odd and are meant:
+// - PropertyValue(5) is an empty array of numbers: an integer, as a byte, is a kind code. Write
+//   PropertyValue(IC::Number(5)) for the number.
+// - Write `IC::Buffer b = value;`, not `IC::Buffer b(value);`: a vector can also be made from a size, and the
+//   second is ambiguous. The same holds for the arrays, Number and EnumValue.
+// - No operation here looks at the read-only mark; assignment replaces it.
+class PropertyValue {
+public:
+    enum KindType : ZQ::Uint32 {
+        KIND_UNKNOWN = 0,      // nothing
+        KIND_NUMBER = 1,       // a Number
+        KIND_STRING = 2,       // a std::string
+        KIND_BUFFER = 3,       // a Buffer
+        KIND_ENUMVALUE = 4,    // an EnumValue
+        KIND_NUMBERARRAY = 5,  // a NumberArray
+        KIND_STRINGARRAY = 6   // a StringArray
+    };
+
+    PropertyValue(const std::string& value, const bool& readOnly = false);
+    PropertyValue(std::string&& value, const bool& readOnly = false);
+    // Up to the terminating NUL. Throws std::logic_error for a null pointer.
+    PropertyValue(const char* value, const bool& readOnly = false);
+    PropertyValue(const Number& value, const bool& readOnly = false);
+    PropertyValue(const EnumValue& value, const bool& readOnly = false);
+    PropertyValue(const Buffer& value, const bool& readOnly = false);
+    PropertyValue(Buffer&& value, const bool& readOnly = false);
+    PropertyValue(const NumberArray& value, const bool& readOnly = false);
+    PropertyValue(NumberArray&& value, const bool& readOnly = false);
+    PropertyValue(const StringArray& value, const bool& readOnly = false);
+    PropertyValue(StringArray&& value, const bool& readOnly = false);
+
+    // The first value of the kind with this code: a Number of kind 0, an EnumValue of 0, or an empty text,
+    // buffer or array.
+    //
+    //   refused        logged, with the code                                    thrown
+    //   7 and above    "PropertyValue:initKind: invalid kind of property: "     PropertyValueInvalidKind
+    //                                                                           "Invalid kind of property"
+    PropertyValue(const unsigned char& kind, const bool& readOnly = false);
+
+    // The same. The code is cut to its low 8 bits first, so 257 is KIND_NUMBER (deliberate).
+    PropertyValue(const KindType& kind, const bool& readOnly = false);
+
+    // Flags, reals and other enumerations would silently become a kind code. Write Number(value) or
+    // EnumValue(value).
+    template <
+        class T,
+        class = std::enable_if_t<
+            std::is_same_v<
+                T,
+                bool> || std::is_floating_point_v<T> || (std::is_enum_v<T> && !std::is_same_v<T, KindType>)>>
+    PropertyValue(T, const bool& = false) = delete;
+
+    // A copy has the source's mark; assignment replaces the mark by the source's, whatever it was.
+    PropertyValue(const PropertyValue& source);
+    PropertyValue& operator=(const PropertyValue& source);
+
+    // Moves allocate nothing. The source is left with KIND_UNKNOWN and its mark.
+    PropertyValue(PropertyValue&& source) noexcept;
+    PropertyValue& operator=(PropertyValue&& source) noexcept;
+    void swap(PropertyValue& other) noexcept;
+    friend void swap(PropertyValue& a, PropertyValue& b) noexcept { a.swap(b); }
+
+    ~PropertyValue() { freeValue(); }
+
+    KindType getKind() const noexcept { return kind_; }
+    operator KindType() const noexcept { return kind_; }
+    bool readOnly() const noexcept { return readOnly_; }
+
+    // Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
+    // keeps the value.
+    //
+    //   refused        logged, thrown
+    //   7 and above    as by the constructor from a kind
+    //
+    // A refused code still costs the old value (deliberate): the kind stays, without an object. Give such a
+    // value another kind, or assign to it. Until then conversions to a native type refuse it as they refuse
+    // another kind, its text is "invalid", and it is neither less nor greater than any value of its kind.
+    void setKind(const unsigned char& kind);
+
+    // The conversions. A number converts as Number does, refusals included; an enumerated value answers as an
+    // unsigned 32-bit number. Containers are copied.
+    //
+    //   to                  takes                logged, with the kind
+    //   double              number, enumerated   "PropertyValue:Real64: can't return current value as a
+    //                                             Real64, kind="
+    //   unsigned long long  number, enumerated   "PropertyValue:Uint64: ... as a Uint64, kind="
+    //   unsigned int        number, enumerated   "PropertyValue::Uint32: ... as a Uint32, kind="
+    //   bool                number               "PropertyValue::bool: ... as a bool, kind="
+    //   Number              number               "PropertyValue:Number: ... as a Number, kind="
+    //   Version2            number               "PropertyValue:Version2: ... as a Version2, kind="
+    //   EnumValue           enumerated           nothing (deliberate)
+    //   Buffer              bytes                "PropertyValue:Buffer: ... as a Buffer, kind="
+    //   NumberArray         numbers              "PropertyValue:NumberArray: ... as a NumberArray, kind="
+    //   StringArray         texts                "PropertyValue:StringArray: ... as a StringArray, kind="
+    //
+    // Other kinds are refused with PropertyValueInvalidKind: "Can't return current value as a Number" for the
+    // first six, and "... as a EnumValue", "... as a Buffer", "... as a NumberArray", "... as a StringArray".
+    operator double() const
+    {
+        const Number* number = held<Number>(KIND_NUMBER);
+        return number != nullptr ? number->operator double() : toReal();
+    }
+    operator unsigned long long() const
+    {
+        const Number* number = held<Number>(KIND_NUMBER);
+        return number != nullptr ? number->operator unsigned long long() : toUint64();
+    }
+    operator unsigned int() const
+    {
+        const Number* number = held<Number>(KIND_NUMBER);
+        return number != nullptr ? number->operator unsigned int() : toUint32();
+    }
+    operator bool() const
+    {
+        const Number* number = held<Number>(KIND_NUMBER);
+        return number != nullptr ? number->operator bool() : refuseBool();
+    }
+    operator Number() const
+    {
+        const Number* number = held<Number>(KIND_NUMBER);
+        return number != nullptr ? *number : refuseNumber();
+    }
+    operator Version2() const
+    {
+        const Number* number = held<Number>(KIND_NUMBER);
+        return number != nullptr ? number->operator Version2() : refuseVersion();
+    }
+    operator EnumValue() const
+    {
+        const EnumValue* value = held<EnumValue>(KIND_ENUMVALUE);
+        return value != nullptr ? *value : refuseEnumValue();
+    }
+    operator Buffer() const
+    {
+        const Buffer* bytes = held<Buffer>(KIND_BUFFER);
+        return bytes != nullptr ? *bytes : refuseBuffer();
+    }
+    operator NumberArray() const
+    {
+        const NumberArray* numbers = held<NumberArray>(KIND_NUMBERARRAY);
+        return numbers != nullptr ? *numbers : refuseNumberArray();
+    }
+    operator StringArray() const
+    {
+        const StringArray* texts = held<StringArray>(KIND_STRINGARRAY);
+        return texts != nullptr ? *texts : refuseStringArray();
+    }
+
+    // `int x = value;` would silently be a flag. Write `int x = IC::Number(value's number)`.
+    operator int() const = delete;
+
+    // The text, as a fresh std::ostringstream writes it under the global locale; never refused.
+    //
+    //   nothing      unknown
+    //   text         the text itself
+    //   number       as Number
+    //   enumerated   as EnumValue
+    //   bytes        two hexadecimal digits a byte, and a blank after every fourth byte, also the last
+    //   numbers      {1, 2}
+    //   texts        {"a\"b", ""}: double quotes inside get a backslash, nothing else is escaped
+    operator std::string() const;
+
+private:
+    friend bool operator==(const PropertyValue& a, const PropertyValue& b);
+    friend bool operator<(const PropertyValue& a, const PropertyValue& b);
+    friend bool operator>(const PropertyValue& a, const PropertyValue& b);
+
+    // Null also for a value that a refused setKind left without an object.
+    template <class T>
+    const T* held(KindType kind) const noexcept
+    {
+        return kind_ == kind ? static_cast<const T*>(value_) : nullptr;
+    }
+
+    void initKind(const unsigned char& kind);
+    void freeValue() noexcept;
+    static bool precedes(const PropertyValue& a, const PropertyValue& b);
+
+    ZQ::Real64 toReal() const;
+    ZQ::Uint64 toUint64() const;
+    ZQ::Uint32 toUint32() const;
+    [[noreturn, gnu::cold]] bool refuseBool() const;
+    [[noreturn, gnu::cold]] Number refuseNumber() const;
+    [[noreturn, gnu::cold]] Version2 refuseVersion() const;
+    [[noreturn, gnu::cold]] static EnumValue refuseEnumValue();
+    [[noreturn, gnu::cold]] Buffer refuseBuffer() const;
+    [[noreturn, gnu::cold]] NumberArray refuseNumberArray() const;
+    [[noreturn, gnu::cold]] StringArray refuseStringArray() const;
+
+    void* value_ = nullptr;  // owns the one object of the kind's type
+    KindType kind_ = KIND_UNKNOWN;
+    bool readOnly_ = false;
+    [[maybe_unused]] ZQ::Uint32 reserved_ = 0;
+};
+
+// Equality never fails. Values of different kinds are unequal; the read-only mark is not compared. Numbers
+// and enumerated values compare as Number and EnumValue do, everything else by its bytes or elements.
+bool operator==(const PropertyValue& a, const PropertyValue& b);
+bool operator!=(const PropertyValue& a, const PropertyValue& b);
+
+// Within one kind: numbers and enumerated values as Number and EnumValue do, refusals included; the others
+// lexicographically, bytes unsigned. Nothing is neither less nor greater than nothing.
+//
+//   refused            logged                                              thrown: PropertyValueInvalidKind
+//   the kinds differ   "<: cannot compare two different kinds of           "Cannot compare two different
+//   kinds
+//                       properties, kind1=2, kind2=1" (">: ...")            of properties"
+bool operator<(const PropertyValue& a, const PropertyValue& b);
+bool operator>(const PropertyValue& a, const PropertyValue& b);
+
+// a == b, or else a < b (a > b): equal values are never refused.
+bool operator<=(const PropertyValue& a, const PropertyValue& b);
+bool operator>=(const PropertyValue& a, const PropertyValue& b);
+
+// The byte as two lower-case hexadecimal digits.
+std::string pB(unsigned char byte);
+
+// Inserts std::string(value) as one text: width and fill apply to the whole of it.
+std::ostream& operator<<(std::ostream& out, const PropertyValue& value);
+
+// "7 = " and the value, piece by piece; the number follows the stream's own settings.
+std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, PropertyValue>& property);
+
+// "[1 = abc], [7 = {1, 2}]" in the order of the numbers, piece by piece. An empty map writes nothing.
+std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties);
+
+}  // namespace gnu::visibility("default")]]IC

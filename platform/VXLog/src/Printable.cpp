@@ -1,0 +1,71 @@
+#include "Printable.h"
+
+#include <cstddef>
+
+namespace VXLog {
+
+namespace {
+
+// The length of the printable UTF-8 character at the start of `text`, or 0 where there is none.
+std::size_t printableLength(std::string_view text)
+{
+    const auto byte = [text](std::size_t i) {
+        return static_cast<unsigned char>(text[i]);
+    };
+    if (byte(0) < 0x80)
+        return byte(0) >= 0x20 && byte(0) != 0x7F ? 1 : 0;
+
+    const std::size_t length = byte(0) >= 0xF0 ? 4 : byte(0) >= 0xE0 ? 3 : 2;
+    if (byte(0) < 0xC2 || byte(0) > 0xF4 || text.size() < length)
+        return 0;
+    unsigned int character = byte(0) & (0xFFu >> (length + 1));
+    for (std::size_t i = 1; i < length; ++i) {
+        if ((byte(i) & 0xC0) != 0x80)
+            return 0;
+        character = character << 6 | (byte(i) & 0x3Fu);
+    }
+    const bool tooLong = (length == 3 && character < 0x800) || (length == 4 && character < 0x10000);
+    const bool surrogate = character >= 0xD800 && character <= 0xDFFF;
+    const bool control = character < 0xA0 || character == 0x2028 || character == 0x2029;
+    return tooLong || surrogate || control || character > 0x10FFFF ? 0 : length;
+}
+
+void addEscaped(std::string& out, unsigned char byte)
+{
+    constexpr char digits[] = "0123456789abcdef";
+    switch (byte) {
+    case '\n':
+        out += "\\n";
+        return;
+    case '\r':
+        out += "\\r";
+        return;
+    case '\t':
+        out += "\\t";
+        return;
+    default:
+        out += "\\x";
+        out += digits[byte >> 4];
+        out += digits[byte & 0x0F];
+    }
+}
+
+}  // namespace
+
+std::string printable(std::string_view text)
+{
+    std::string out;
+    while (!text.empty()) {
+        const std::size_t length = printableLength(text);
+        if (text.front() == '\\')
+            out += "\\\\";
+        else if (length != 0)
+            out += text.substr(0, length);
+        else
+            addEscaped(out, static_cast<unsigned char>(text.front()));
+        text.remove_prefix(length != 0 ? length : 1);
+    }
+    return out;
+}
+
+}  // namespace VXLog

@@ -1,0 +1,73 @@
+#include "VXLog/VXLogger.h"
+
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+#include <mutex>
+#include <utility>
+
+#include "Printable.h"
+#include "VXLog/RecordSink.h"
+#include "ZQ/DateTime.h"
+
+namespace VXLog {
+
+namespace {
+
+void writeLine(const Record& record)
+{
+    const bool trace = record.kind == Record::Kind::trace;
+    if (trace && std::getenv("VXLOG_TRACE") == nullptr)
+        return;
+    std::string line = ZQ::DateTime::now();
+    line += ' ' + std::to_string(record.level) + (trace ? " trace " : " ");
+    line += printable(record.logger) + ' ' + printable(record.file) + ':' + std::to_string(record.line) + ' '
+        + printable(record.function) + ": " + printable(record.message) + '\n';
+    // In one call, so that the lines of several threads do not mix.
+    std::fwrite(line.data(), 1, line.size(), stderr);
+}
+
+// The sink of the program. It is shared with the calls under way, which go on when it is replaced.
+struct Current {
+    std::mutex mutex;
+    std::shared_ptr<const RecordSink> sink = std::make_shared<const RecordSink>(writeLine);
+};
+
+// Ready before the objects of the program, and there until the last of them is gone.
+[[gnu::init_priority(101)]] Current current;
+
+void pass(const Record& record)
+{
+    std::shared_ptr<const RecordSink> sink;
+    {
+        const std::lock_guard<std::mutex> lock(current.mutex);
+        sink = current.sink;
+    }
+    (*sink)(record);
+}
+
+}  // namespace
+
+RecordSink setRecordSink(RecordSink sink)
+{
+    auto next = std::make_shared<const RecordSink>(sink ? std::move(sink) : RecordSink(writeLine));
+    {
+        const std::lock_guard<std::mutex> lock(current.mutex);
+        current.sink.swap(next);
+    }
+    return *next;
+}
+
+void VXLogger::logLevelMessage(const char* function, const char* file, int line, const std::string& logger,
+                               int level, char* data, int a, int b, const std::string& message)
+{
+    pass({Record::Kind::log, function, file, line, logger, level, data, a, b, message});
+}
+
+void VXLogger::traceLevelMessage(const char* function, const char* file, int line, const std::string& logger,
+                                 int level, char* data, int a, int b, const std::string& message)
+{
+    pass({Record::Kind::trace, function, file, line, logger, level, data, a, b, message});
+}
+
+}  // namespace VXLog

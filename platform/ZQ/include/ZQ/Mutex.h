@@ -1,0 +1,28 @@
+#pragma once
+
+#include <mutex>
+
+namespace [[gnu::visibility("default")]] ZQ {
+
+// A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as often.
+// Every operation may be called from any thread.
+class Mutex {
+public:
+    Mutex();
+    ~Mutex();
+    Mutex(const Mutex&) = delete;
+    Mutex& operator=(const Mutex&) = delete;
+
+    // Waits at most `timeoutMilliseconds`, 0 not at all, 0xFFFFFFFF for ever. Returns whether the calling
+    // thread now holds the mutex (once more). Throws std::system_error where the system refuses the lock,
+    // such as for a depth of nesting that it cannot count.
+    bool lock(unsigned int timeoutMilliseconds);
+
+    // Gives back one lock. The calling thread must hold the mutex.
+    void unlock();
+
+private:
+    std::recursive_timed_mutex mutex_;
+};
+
+}  // namespace gnu::visibility("default")]]ZQ

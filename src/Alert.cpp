@@ -1,0 +1,90 @@
+#include "IC/Alert.h"
+
+#include <ostream>
+#include <stdexcept>
+#include <utility>
+
+#include "detail/Failure.h"
+#include "detail/Text.h"
+
+namespace IC {
+
+[[gnu::init_priority(101)]] static const std::string loggerAlert = "Vexilon.IC.Alert";
+
+namespace {
+
+detail::Where here(const char* function, int line = __builtin_LINE())
+{
+    return {function, "Alert", line, loggerAlert};
+}
+
+}  // namespace
+
+Alert::Alert(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
+             std::vector<std::string> nodePaths, unsigned int status, std::string message)
+{
+    init(timeStamp, severity, alertClass, std::move(nodePaths), status, std::move(message));
+}
+
+Alert::Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
+             unsigned int status, std::string message)
+{
+    ZQ::DateTime now = ZQ::DateTime::now();
+    init(now, severity, alertClass, std::move(nodePaths), status, std::move(message));
+}
+
+void Alert::init(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
+                 std::vector<std::string> nodePaths, unsigned int status, std::string message)
+{
+    if (severity > SEVERITY_LARGEST)
+        detail::fail<std::invalid_argument>(here("init"), "Invalid severity type",
+                                            "init: Invalid severity type ", severity);
+    severity_ = static_cast<SeverityType>(severity);
+    if (alertClass > CLASS_LARGEST)
+        detail::fail<std::invalid_argument>(here("init"), "Invalid class type", "init: Invalid class type ",
+                                            alertClass);
+    alertClass_ = static_cast<ClassType>(alertClass);
+    if (status > Node::STATUS_LARGEST)
+        detail::fail<std::invalid_argument>(here("init"), "Invalid status type", "init: Invalid status type ",
+                                            status);
+    status_ = static_cast<Node::StatusType>(status);
+    nodePaths_ = std::move(nodePaths);
+    message_ = std::move(message);
+    timeStamp_ = timeStamp;
+}
+
+std::string Alert::hexstring(const std::string& text) const
+{
+    detail::Text hex;
+    hex.addHex(text);
+    return hex.take();
+}
+
+Alert::operator std::string() const
+{
+    detail::Text text;
+    text.add("Alert ");
+    text.add(static_cast<unsigned int>(severity_));
+    text.add("; ");
+    text.add(static_cast<unsigned int>(alertClass_));
+    text.add("; ");
+    text.add(static_cast<unsigned int>(status_));
+    text.add("; ");
+    text.add(message_);
+    text.add("; ");
+    text.addStreamed(timeStamp_);
+    text.add("; { ");
+    for (const std::string& path : nodePaths_) {
+        text.addHex(path);
+        text.add(' ');
+    }
+    text.add('}');
+    return text.take();
+}
+
+std::ostream& operator<<(std::ostream& out, const Alert& alert)
+{
+    return out << std::string(alert);
+}
+
+}  // namespace IC

@@ -1,0 +1,76 @@
+#include "IC/Error.h"
+
+#include <ostream>
+#include <stdexcept>
+
+#include "detail/Failure.h"
+#include "detail/Text.h"
+
+namespace IC {
+
+[[gnu::init_priority(101)]] static const std::string loggerError = "Vexilon.IC.Error";
+
+namespace {
+
+detail::Where here(const char* function, int line = __builtin_LINE())
+{
+    return {function, "Error", line, loggerError};
+}
+
+}  // namespace
+
+Error::Error(const Number& value, unsigned char status) : value_(value)
+{
+    initStatus(status);
+}
+
+Error::Error(unsigned char status, const Number& value, const std::string& message)
+    : value_(value),
+      message_(message)
+{
+    initStatus(status);
+}
+
+Error::Error(const char* message, unsigned char status)
+    : value_(Number::KIND_UNKNOWN),
+      message_(detail::checked(message))
+{
+    initStatus(status);
+}
+
+Error::Error(const std::string& message, unsigned char status)
+    : value_(Number::KIND_UNKNOWN),
+      message_(message)
+{
+    initStatus(status);
+}
+
+void Error::initStatus(unsigned char status)
+{
+    if (status > STATUS_READ_ONLY)
+        detail::fail<std::invalid_argument>(here("initStatus"), "Invalid error status",
+                                            "initstatus: Invalid error status=", status);
+    status_ = static_cast<StatusType>(status);
+}
+
+Error::operator std::string() const
+{
+    detail::Text text;
+    text.add(static_cast<unsigned int>(status_));
+    if (value_.getKind() != Number::KIND_UNKNOWN) {
+        text.add(" - ");
+        append(text, value_);
+    }
+    if (!message_.empty()) {
+        text.add(" - ");
+        text.add(message_);
+    }
+    return text.take();
+}
+
+std::ostream& operator<<(std::ostream& out, const Error& error)
+{
+    return out << std::string(error);
+}
+
+}  // namespace IC

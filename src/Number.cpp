@@ -1,0 +1,479 @@
+#include "IC/Number.h"
+
+#include <algorithm>
+#include <cmath>
+#include <ctime>
+#include <limits>
+#include <ostream>
+#include <stdexcept>
+
+#include "detail/Failure.h"
+#include "detail/Text.h"
+
+namespace IC {
+
+// Ready before the objects of the program, whose constructors may already refuse or print a number.
+[[gnu::init_priority(101)]] static const std::string loggerNumber = "Vexilon.IC.Number";
+
+[[gnu::init_priority(101)]] const std::string pst[75] = {"Unknown",
+                                                         "Chassis",
+                                                         "BIOS",
+                                                         "Firmware",
+                                                         "CPU",
+                                                         "USB Controller",
+                                                         "USB Port",
+                                                         "Serial Port",
+                                                         "Parallel Port",
+                                                         "Video",
+                                                         "Floppy Drive",
+                                                         "Hard Drive",
+                                                         "Network Port",
+                                                         "BMC",
+                                                         "Tolk",
+                                                         "SMBIOS",
+                                                         "VPD",
+                                                         "OS",
+                                                         "RAM",
+                                                         "DIMM",
+                                                         "Fan",
+                                                         "Voltage Sensor",
+                                                         "Temperature Sensor",
+                                                         "Intrusion",
+                                                         "PFA",
+                                                         "Power Supply",
+                                                         "Blue Light",
+                                                         "Front Panel",
+                                                         "Back Panel",
+                                                         "Network IP Configuration",
+                                                         "System",
+                                                         "Cache",
+                                                         "Memory Array",
+                                                         "Memory Device",
+                                                         "IPMI",
+                                                         "Log",
+                                                         "Glimtrace",
+                                                         "Service Processor",
+                                                         "OsHw",
+                                                         "OsSw",
+                                                         "Computer",
+                                                         "Planar",
+                                                         "CPU Core",
+                                                         "Application",
+                                                         "Driver",
+                                                         "Partition",
+                                                         "User",
+                                                         "LogEntry",
+                                                         "PFASensor",
+                                                         "Network Controller",
+                                                         "Disk Controller",
+                                                         "Group",
+                                                         "Pellion Alert Config",
+                                                         "Diagnostics",
+                                                         "SMBIOS Data",
+                                                         "SMBIOS Table",
+                                                         "Network Teaming",
+                                                         "ScalablePartition",
+                                                         "ScalableSystem",
+                                                         "ROOT",
+                                                         "ModularChassis",
+                                                         "SlotGroup",
+                                                         "Slot",
+                                                         "CMM",
+                                                         "IO Module",
+                                                         "CoolingDomain",
+                                                         "PowerDomain",
+                                                         "Chassis MidPlane Card",
+                                                         "ModularGroup",
+                                                         "AlertIndication",
+                                                         "Connector",
+                                                         "BMCUser",
+                                                         "Drive Slot Sensor",
+                                                         "LAN End Point",
+                                                         "invalid"};
+
+namespace {
+
+detail::Where here(const char* function, int line = __builtin_LINE())
+{
+    return {function, "Number", line, loggerNumber};
+}
+
+constexpr ZQ::Uint8 largestKind = Number::KIND_NODEREF;
+constexpr ZQ::Uint32 noSensor = 74;
+
+// The real without its fraction. It is refused unless it is from 0 to below `limit`; a NaN passes.
+double integralPart(const double& real, double limit, const detail::Where& where, const char* literal,
+                    const char* tooLarge, const char* negative)
+{
+    double integral = 0.0;
+    std::modf(real, &integral);
+    if (integral >= limit)
+        detail::fail<std::out_of_range>(where, tooLarge, literal, real);
+    if (integral < 0.0)
+        detail::fail<std::out_of_range>(where, negative, literal, real);
+    return integral;
+}
+
+constexpr char outOfRange32[] = "Uint32: number out of range: ";
+constexpr char outOfRange64[] = "Uint64: number out of range: ";
+constexpr char tooLarge32[] = "The number is too large to convert to a 32-bit integer";
+constexpr char tooLarge64[] = "The number is too large to convert to a 64-bit integer";
+constexpr char negative32[] = "A negative number cannot convert to an unsigned 32-bit integer";
+constexpr char negative64[] = "A negative number cannot convert to an unsigned 64-bit integer";
+
+}  // namespace
+
+Number::Number(const ZQ::DateTime& value) : Number(Tag(), KIND_DATETIME)
+{
+    const auto scope = static_cast<ZQ::Uint8>(value.getScope());
+    const long seconds = value;
+    storeDateTime(seconds, static_cast<ZQ::Uint16>(value.getMillisecond()), scope);
+}
+
+Number::Number(const unsigned char& code) : Number(Tag(), static_cast<KindType>(code))
+{
+    if (code > largestKind)
+        detail::fail<std::invalid_argument>(here("Number"), "Invalid kind of number",
+                                            "Number: wrong kind of number: ", code);
+    initKind(static_cast<KindType>(code));
+}
+
+Number::Number(const KindType& kind) : Number(Tag(), kind)
+{
+    initKind(kind);
+}
+
+void Number::initKind(const KindType& kind)
+{
+    kind_ = kind;
+    switch (kind) {
+    case KIND_UNKNOWN:
+    case KIND_BOOL:
+    case KIND_NAN:
+    case KIND_INFINITY:
+        store(ZQ::Uint8 {0});
+        return;
+    case KIND_UINT32:
+        store(ZQ::Uint32 {0});
+        return;
+    case KIND_UINT64:
+        store(ZQ::Uint64 {0});
+        return;
+    case KIND_REAL:
+        store(ZQ::Real64 {0.0});
+        return;
+    case KIND_VERSION:
+        store(Version2 {0, 0});
+        return;
+    case KIND_DATETIME:
+        storeDateTime(std::time(nullptr), 0, defaultScope);
+        return;
+    case KIND_INT:
+    case KIND_NODEREF:
+        break;
+    }
+    detail::fail<std::invalid_argument>(here("initKind"), "Invalid kind of number",
+                                        "initkind: invalid kind of number ", kind);
+}
+
+void Number::setKind(const unsigned char& code)
+{
+    if (code > largestKind)
+        detail::fail<std::invalid_argument>(here("setKind"), "Invalid kind", "setKind: invalid kind ", code);
+    kind_ = static_cast<KindType>(code);
+}
+
+bool Number::toBool() const
+{
+    switch (kind_) {
+    case KIND_UINT32:
+        return load<ZQ::Uint32>() != 0;
+    case KIND_UINT64:
+        return load<ZQ::Uint64>() != 0;
+    case KIND_REAL:
+        return load<ZQ::Real64>() != 0.0;
+    default:
+        detail::fail<std::out_of_range>(here("operator bool"), "Can't return current value as a Boolean",
+                                        "bool: Can't return current value as a Boolean, kind=", kind_);
+    }
+}
+
+// For both 32-bit conversions: the signed one differs only in its name and in taking KIND_INT.
+ZQ::Uint32 Number::toUint32(const char* function) const
+{
+    switch (kind_) {
+    case KIND_BOOL:
+        return load<ZQ::Uint8>() != 0 ? 1 : 0;
+    case KIND_UINT32:
+        return load<ZQ::Uint32>();
+    case KIND_UINT64: {
+        const auto value = load<ZQ::Uint64>();
+        if (value > std::numeric_limits<ZQ::Uint32>::max())
+            detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32, value);
+        return static_cast<ZQ::Uint32>(value);
+    }
+    case KIND_REAL: {
+        const auto integral =
+            integralPart(load<ZQ::Real64>(), 0x1p32, here(function), outOfRange32, tooLarge32, negative32);
+        // Without the test the result for a NaN would be the processor's or the compiler's choice.
+        return std::isnan(integral) ? 0 : static_cast<ZQ::Uint32>(integral);
+    }
+    default:
+        detail::fail<std::out_of_range>(
+            here(function), "Can't return current value as a 32-bit integer",
+            "Uint32: Can't return current value as a 32-bit integer, kind=", kind_);
+    }
+}
+
+ZQ::Uint64 Number::toUint64() const
+{
+    switch (kind_) {
+    case KIND_BOOL:
+        return load<ZQ::Uint8>() != 0 ? 1 : 0;
+    case KIND_UINT32:
+        return load<ZQ::Uint32>();
+    case KIND_REAL: {
+        // 2^64 is written as a power of two, since the largest 64-bit integer is no double.
+        const auto integral = integralPart(load<ZQ::Real64>(), 0x1p64, here("operator ZQ::Uint64"),
+                                           outOfRange64, tooLarge64, negative64);
+        return std::isnan(integral) ? ZQ::Uint64 {1} << 63 : static_cast<ZQ::Uint64>(integral);
+    }
+    default:
+        detail::fail<std::out_of_range>(
+            here("operator ZQ::Uint64"), "Can't return current value as a 64-bit integer",
+            "Uint64: Can't return current value as a 64-bit integer, kind=", kind_);
+    }
+}
+
+ZQ::Real64 Number::toReal() const
+{
+    switch (kind_) {
+    case KIND_BOOL:
+        return load<ZQ::Uint8>() != 0 ? 1.0 : 0.0;
+    case KIND_UINT32:
+        return load<ZQ::Uint32>();
+    case KIND_UINT64:
+        return static_cast<ZQ::Real64>(load<ZQ::Uint64>());
+    case KIND_NAN:
+        return std::numeric_limits<ZQ::Real64>::quiet_NaN();
+    case KIND_INFINITY:
+        return std::numeric_limits<ZQ::Real64>::infinity();
+    case KIND_VERSION: {
+        const auto version = load<Version2>();
+        const double scale = version.minor <= 9 ? 10.0 : version.minor <= 99 ? 100.0 : 1000.0;
+        return version.major + version.minor / scale;
+    }
+    default:
+        detail::fail<std::out_of_range>(here("operator ZQ::Real64"), "Can't return current value as a Real",
+                                        "Real: Can't return current value as a Real, kind=", kind_);
+    }
+}
+
+Version2 Number::toVersion() const
+{
+    constexpr ZQ::Uint32 largestMajor = std::numeric_limits<ZQ::Uint8>::max();
+    constexpr char tooLarge[] = "The number is too large to convert to a version";
+    constexpr char literal[] = "Version: Number too large for version: ";
+    switch (kind_) {
+    case KIND_UINT32: {
+        const auto value = load<ZQ::Uint32>();
+        if (value > largestMajor)
+            detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal, value);
+        return {static_cast<ZQ::Uint8>(value), 0};
+    }
+    case KIND_UINT64: {
+        const auto value = load<ZQ::Uint64>();
+        if (value > largestMajor)
+            detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal, value);
+        return {static_cast<ZQ::Uint8>(value), 0};
+    }
+    default:
+        detail::fail<std::out_of_range>(here("operator IC::Version2"),
+                                        "Can't return current value as a Version",
+                                        "Version: Can't return current value as a Version, kind=", kind_);
+    }
+}
+
+Number::operator ZQ::DateTime() const
+{
+    const auto content = load<DateTimeFields>();
+    if (kind_ != KIND_DATETIME || content.scope < 1 || content.scope > 3)
+        detail::fail<std::out_of_range>(here("operator ZQ::DateTime"),
+                                        "Can't return current value as a DateTime",
+                                        "DateTime: Can't return current value as a DateTime, kind=", kind_);
+    ZQ::DateTime time(content.seconds, content.scope);
+    time.setMillisecond(content.milliseconds);
+    return time;
+}
+
+sNodeRef Number::refuseNodeRef() const
+{
+    detail::fail<std::out_of_range>(here("operator IC::NodeRef"), "Can't return current value as pair",
+                                    "NodeRef: Can't return current value as a pair, kind=", kind_);
+}
+
+Number::operator std::string() const
+{
+    return detail::textOf(*this);
+}
+
+bool operator==(const Number& a, const Number& b)
+{
+    if (a.kind_ != b.kind_)
+        return false;
+    switch (a.kind_) {
+    case Number::KIND_BOOL:
+        return a.load<ZQ::Uint8>() == b.load<ZQ::Uint8>();
+    case Number::KIND_UINT32:
+        return a.load<ZQ::Uint32>() == b.load<ZQ::Uint32>();
+    case Number::KIND_UINT64:
+        return a.load<ZQ::Uint64>() == b.load<ZQ::Uint64>();
+    case Number::KIND_REAL:
+        return a.load<ZQ::Real64>() == b.load<ZQ::Real64>();
+    case Number::KIND_VERSION: {
+        const auto x = a.load<Version2>();
+        const auto y = b.load<Version2>();
+        return x.major == y.major && x.minor == y.minor;
+    }
+    case Number::KIND_DATETIME: {
+        const auto x = a.load<Number::DateTimeFields>();
+        const auto y = b.load<Number::DateTimeFields>();
+        return x.seconds == y.seconds && x.milliseconds == y.milliseconds;
+    }
+    default:
+        return true;
+    }
+}
+
+bool operator!=(const Number& a, const Number& b)
+{
+    return !(a == b);
+}
+
+bool Number::precedes(const Number& a, const Number& b)
+{
+    switch (a.kind_) {
+    case KIND_BOOL:
+        return a.load<ZQ::Uint8>() < b.load<ZQ::Uint8>();
+    case KIND_UINT32:
+        return a.load<ZQ::Uint32>() < b.load<ZQ::Uint32>();
+    case KIND_UINT64:
+        return a.load<ZQ::Uint64>() < b.load<ZQ::Uint64>();
+    case KIND_REAL:
+        return a.load<ZQ::Real64>() < b.load<ZQ::Real64>();
+    case KIND_VERSION: {
+        const auto x = a.load<Version2>();
+        const auto y = b.load<Version2>();
+        return x.major != y.major ? x.major < y.major : x.minor < y.minor;
+    }
+    case KIND_DATETIME: {
+        const auto x = a.load<DateTimeFields>();
+        const auto y = b.load<DateTimeFields>();
+        return x.seconds != y.seconds ? x.seconds < y.seconds : x.milliseconds < y.milliseconds;
+    }
+    default:
+        return false;
+    }
+}
+
+bool operator<(const Number& a, const Number& b)
+{
+    if (a.kind_ == Number::KIND_NAN || b.kind_ == Number::KIND_NAN)
+        detail::fail<std::invalid_argument>(here("operator<"), "Invalid operation when kind is NaN",
+                                            "<: invalid operation when kind is NaN");
+    if (a.kind_ == Number::KIND_INFINITY)
+        return false;
+    if (a.kind_ != b.kind_)
+        detail::fail<std::invalid_argument>(
+            here("operator<"), "Cannot compare two different kinds of number",
+            "<: cannot compare two different kinds of number, kind1=", a.kind_, ", kind2=", b.kind_);
+    return Number::precedes(a, b);
+}
+
+bool operator>(const Number& a, const Number& b)
+{
+    if (a.kind_ == Number::KIND_NAN || b.kind_ == Number::KIND_NAN)
+        detail::fail<std::invalid_argument>(here("operator>"), "Invalid operation when kind is NaN",
+                                            ">: invalid operation when kind is NaN");
+    if (a.kind_ == Number::KIND_INFINITY)
+        return b.kind_ != Number::KIND_INFINITY;
+    if (a.kind_ != b.kind_)
+        detail::fail<std::invalid_argument>(
+            here("operator>"), "Cannot compare two different kinds of number",
+            ">: cannot compare two different kinds of number, kind1=", a.kind_, ", kind2=", b.kind_);
+    return Number::precedes(b, a);
+}
+
+bool operator<=(const Number& a, const Number& b)
+{
+    return a == b || a < b;
+}
+
+bool operator>=(const Number& a, const Number& b)
+{
+    return a == b || a > b;
+}
+
+std::ostream& operator<<(std::ostream& out, const Number& number)
+{
+    return out << std::string(number);
+}
+
+void detail::append(Text& text, const Number& number)
+{
+    switch (number.kind_) {
+    case Number::KIND_UNKNOWN:
+        text.add("unknown");
+        return;
+    case Number::KIND_BOOL:
+        text.add(number.load<ZQ::Uint8>() != 0 ? "true" : "false");
+        return;
+    case Number::KIND_INT:
+        text.add(number.load<int>());
+        return;
+    case Number::KIND_UINT32:
+        text.add(number.load<ZQ::Uint32>());
+        return;
+    case Number::KIND_UINT64:
+        text.add(number.load<ZQ::Uint64>());
+        return;
+    case Number::KIND_REAL:
+        text.add(number.load<ZQ::Real64>());
+        return;
+    case Number::KIND_NAN:
+        text.add("not a number");
+        return;
+    case Number::KIND_INFINITY:
+        text.add("infinity");
+        return;
+    case Number::KIND_VERSION: {
+        const auto version = number.load<Version2>();
+        text.add(static_cast<unsigned int>(version.major));
+        text.add('.');
+        text.add(static_cast<unsigned int>(version.minor));
+        return;
+    }
+    case Number::KIND_DATETIME: {
+        const auto content = number.load<Number::DateTimeFields>();
+        const ZQ::DateTime time(content.seconds, content.scope);
+        // Each of the three digits is taken from the remainder of the one before it, so only the last digit
+        // of the milliseconds counts. The agent's logs rely on it.
+        const unsigned int remainder = content.milliseconds % 10u;
+        if (remainder != 0)
+            record(here("operator std::string"), failureLevel,
+                   "string: conversion failed, remainder not zero, remainder=", remainder);
+        text.add(std::string(time));
+        if (remainder != 0)
+            text.add(".Conversion failed remainder>0");
+        return;
+    }
+    case Number::KIND_NODEREF:
+        text.add(pst[std::min(number.nodeRef_.type, noSensor)]);
+        text.add(':');
+        text.add(number.nodeRef_.id);
+        return;
+    }
+    text.add("invalid");
+}
+
+}  // namespace IC

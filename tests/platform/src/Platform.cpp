@@ -1,0 +1,119 @@
+#include "observe/Platform.h"
+
+#include "Observed.h"
+
+namespace observe {
+
+Observed& observed()
+{
+    // Never destroyed: objects of the test program may outlive any order of destruction.
+    static auto* const only = new Observed;
+    return *only;
+}
+
+namespace {
+
+// Reads or changes something while no other thread does.
+template <class Action>
+auto guarded(Action action)
+{
+    const std::lock_guard<std::mutex> lock(observed().mutex);
+    return action(observed());
+}
+
+}  // namespace
+
+void count(int Observed::*counter, int change)
+{
+    guarded([&](Observed& all) { all.*counter += change; });
+}
+
+std::pair<long, unsigned int> readClock()
+{
+    return guarded([](Observed& all) {
+        ++all.state.clockReadings;
+        return std::make_pair(all.state.clockSeconds, all.state.clockMilliseconds);
+    });
+}
+
+void reached(Call call)
+{
+    guarded([&](Observed& all) {
+        State& state = all.state;
+        if (state.callsUntilThrow == 0 || (state.throwingCall != Call::any && state.throwingCall != call))
+            return;
+        if (--state.callsUntilThrow == 0) {
+            state.thrown = true;
+            throw Thrown();
+        }
+    });
+}
+
+void reset()
+{
+    guarded([](Observed& all) { all.state = State(); });
+}
+
+std::vector<Record> records()
+{
+    return guarded([](Observed& all) { return all.state.records; });
+}
+
+void onRecord(std::function<void(const Record&)> action)
+{
+    guarded([&](Observed& all) { all.state.action = std::move(action); });
+}
+
+std::vector<LockCall> lockCalls()
+{
+    return guarded([](Observed& all) { return all.state.lockCalls; });
+}
+
+int locksHeld()
+{
+    return guarded([](Observed& all) { return all.locksHeld; });
+}
+
+void setLockResult(bool obtained)
+{
+    guarded([&](Observed& all) { all.state.lockResult = obtained; });
+}
+
+void setClock(long seconds, unsigned int milliseconds)
+{
+    guarded([&](Observed& all) {
+        all.state.clockSeconds = seconds;
+        all.state.clockMilliseconds = milliseconds;
+    });
+}
+
+int clockReadings()
+{
+    return guarded([](Observed& all) { return all.state.clockReadings; });
+}
+
+int buffersAlive()
+{
+    return guarded([](Observed& all) { return all.buffersAlive; });
+}
+
+int dateTimesAlive()
+{
+    return guarded([](Observed& all) { return all.dateTimesAlive; });
+}
+
+void throwAt(Call call, int nth)
+{
+    guarded([&](Observed& all) {
+        all.state.throwingCall = call;
+        all.state.callsUntilThrow = nth;
+        all.state.thrown = false;
+    });
+}
+
+bool thrown()
+{
+    return guarded([](Observed& all) { return all.state.thrown; });
+}
+
+}  // namespace observe
