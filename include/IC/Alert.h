@@ -17,7 +17,8 @@ namespace [[gnu::visibility("default")]] IC {
 //
 //   IC::Alert alert(2, 1, {"/fan/1"}, 5, "Fan failed");
 //   std::cout << alert;                        // Alert 2; 1; 5; Fan failed; <time>; { 2f66616e2f31 }
-class Alert {
+class [[gnu::visibility("default")]] Alert
+{
 public:
     // The codes are numbers without names; these are the first and the last.
     enum SeverityType : ZQ::Uint8 { SEVERITY_SMALLEST = 0, SEVERITY_LARGEST = 3 };
@@ -31,26 +32,53 @@ public:
     //   status above 85           "init: Invalid status type "         "Invalid status type"
     //
     // The records have the category "Vexilon.IC.Alert" and the level 6000.
-    Alert(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
+    Alert(ZQ::DateTime & timeStamp, unsigned char severity, unsigned char alertClass,
           std::vector<std::string> nodePaths, unsigned int status, std::string message);
 
     // An event now. The clock is read before the codes are checked.
     Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
           unsigned int status, std::string message);
 
-    ZQ::DateTime getTimeStamp() const { return timeStamp_; }
+    ZQ::DateTime getTimeStamp() const
+    {
+        return timeStamp_;
+    }
 
-    SeverityType getSeverity() const noexcept { return severity_; }
-    operator SeverityType() const noexcept { return severity_; }
+    SeverityType getSeverity() const noexcept
+    {
+        return severity_;
+    }
+    operator SeverityType() const noexcept
+    {
+        return severity_;
+    }
 
-    ClassType getClass() const noexcept { return alertClass_; }
-    operator ClassType() const noexcept { return alertClass_; }
+    ClassType getClass() const noexcept
+    {
+        return alertClass_;
+    }
+    operator ClassType() const noexcept
+    {
+        return alertClass_;
+    }
 
-    Node::StatusType getStatus() const noexcept { return status_; }
-    operator Node::StatusType() const noexcept { return status_; }
+    Node::StatusType getStatus() const noexcept
+    {
+        return status_;
+    }
+    operator Node::StatusType() const noexcept
+    {
+        return status_;
+    }
 
-    std::vector<std::string> getNodePaths() const { return nodePaths_; }
-    std::string getMessage() const { return message_; }
+    std::vector<std::string> getNodePaths() const
+    {
+        return nodePaths_;
+    }
+    std::string getMessage() const
+    {
+        return message_;
+    }
 
     // Two lower-case hexadecimal digits for each byte of the text, NUL bytes included.
     std::string hexstring(const std::string& text) const;
@@ -61,7 +89,7 @@ public:
     operator std::string() const;
 
 private:
-    void init(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
+    void init(ZQ::DateTime & timeStamp, unsigned char severity, unsigned char alertClass,
               std::vector<std::string> nodePaths, unsigned int status, std::string message);
 
     ZQ::DateTime timeStamp_;

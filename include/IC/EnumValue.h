@@ -16,7 +16,8 @@ namespace [[gnu::visibility("default")]] IC {
 //   IC::EnumValue state(7u);
 //   unsigned char code = state;                // 7
 //   std::cout << state;                        // 7
-class EnumValue {
+class [[gnu::visibility("default")]] EnumValue
+{
 public:
     EnumValue() noexcept : value_(0) { }
     EnumValue(const unsigned char& value) noexcept : value_(value) { }
@@ -30,7 +31,10 @@ public:
     //                                                       integer"
     //   above 255      "Uint8: number out of range: "      "The number is too large to convert to an 8-bit
     //                                                       integer"
-    operator unsigned int() const noexcept { return value_; }
+    operator unsigned int() const noexcept
+    {
+        return value_;
+    }
     operator unsigned short() const
     {
         return value_ <= 0xFFFFu ? static_cast<unsigned short>(value_) : refuseUint16();

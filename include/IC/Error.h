@@ -16,7 +16,8 @@ namespace [[gnu::visibility("default")]] IC {
 //   std::cout << error;                        // 5 - no such property
 //
 // Mind the order of the arguments: the constructor of three takes the status first, the others last.
-class Error {
+class [[gnu::visibility("default")]] Error
+{
 public:
     // 1 to 4 and 6 to 15 are valid as well; their meaning is the caller's.
     enum StatusType : ZQ::Uint8 {
@@ -37,14 +38,32 @@ public:
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
 
-    StatusType getStatus() const noexcept { return status_; }
-    operator StatusType() const noexcept { return status_; }
-    operator unsigned char() const noexcept { return status_; }
+    StatusType getStatus() const noexcept
+    {
+        return status_;
+    }
+    operator StatusType() const noexcept
+    {
+        return status_;
+    }
+    operator unsigned char() const noexcept
+    {
+        return status_;
+    }
 
-    Number getValue() const noexcept { return value_; }
-    operator Number() const noexcept { return value_; }
+    Number getValue() const noexcept
+    {
+        return value_;
+    }
+    operator Number() const noexcept
+    {
+        return value_;
+    }
 
-    std::string getMessage() const { return message_; }
+    std::string getMessage() const
+    {
+        return message_;
+    }
 
     // The status; " - " and the number unless its kind is KIND_UNKNOWN; " - " and the message unless it is
     // empty: "0", "5 - 17", "5 - no such property". As a fresh std::ostringstream writes it under the global

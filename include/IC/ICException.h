@@ -5,7 +5,8 @@
 namespace [[gnu::visibility("default")]] IC {
 
 // The root of the library's own exceptions. It has no base: handlers of std::exception do not see it.
-class ICException {
+class [[gnu::visibility("default")]] ICException
+{
 public:
     explicit ICException(const std::string& text = std::string());
     ICException(const ICException&) = default;
@@ -22,7 +23,8 @@ protected:
 // Thrown by PropertyValue: an unknown kind, or a value that is not of the kind asked for.
 //
 // The base is private on purpose: `catch (IC::ICException&)` does not catch it; catch it by its own name.
-class PropertyValueInvalidKind : private ICException {
+class [[gnu::visibility("default")]] PropertyValueInvalidKind : private ICException
+{
 public:
     explicit PropertyValueInvalidKind(const std::string& text);
     PropertyValueInvalidKind(const PropertyValueInvalidKind&) = default;
@@ -33,7 +35,8 @@ public:
 };
 
 // Thrown by Node for a sensor code above 73. The base is private on purpose, as above.
-class NodeInvalidSensor : private ICException {
+class [[gnu::visibility("default")]] NodeInvalidSensor : private ICException
+{
 public:
     explicit NodeInvalidSensor(const std::string& text);
     NodeInvalidSensor(const NodeInvalidSensor&) = default;

@@ -28,7 +28,8 @@ namespace [[gnu::visibility("default")]] IC {
 //           properties.insert({1u, IC::PropertyValue(IC::Number(3600u))});
 //       }
 //   };
-class Node {
+class [[gnu::visibility("default")]] Node
+{
 public:
     // The display names are in `pst`.
     enum SensorType : ZQ::Uint32 {
@@ -157,10 +158,22 @@ public:
     // it, which is called under the lock. As a fresh std::ostringstream writes it under the global locale.
     virtual operator std::string() const;
 
-    SensorType getSensor() const noexcept { return sensor_; }
-    operator SensorType() const noexcept { return sensor_; }
-    std::string getPath() const { return path; }
-    std::string getParent() const { return parent; }
+    SensorType getSensor() const noexcept
+    {
+        return sensor_;
+    }
+    operator SensorType() const noexcept
+    {
+        return sensor_;
+    }
+    std::string getPath() const
+    {
+        return path;
+    }
+    std::string getParent() const
+    {
+        return parent;
+    }
 
     // The status of this very object, under the lock, also where a derived class overrides getStatus.
     operator StatusType() const;

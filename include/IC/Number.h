@@ -58,7 +58,8 @@ using NodeRef = sNodeRef;
 // - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
 // - A signed number converts to int and to nothing else; a negative real converts to no integer.
 // - Two signed numbers are always equal and never ordered; so are two node references.
-class Number {
+class [[gnu::visibility("default")]] Number
+{
 public:
     enum KindType : ZQ::Uint32 {
         KIND_UNKNOWN = 0,   // no value
@@ -74,14 +75,35 @@ public:
         KIND_NODEREF = 10   // an sNodeRef
     };
 
-    Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL) { store(static_cast<ZQ::Uint8>(value)); }
-    Number(const int& value) noexcept : Number(Tag(), KIND_INT) { store(value); }
-    Number(const unsigned int& value) noexcept : Number(Tag(), KIND_UINT32) { store(value); }
-    Number(const unsigned long long& value) noexcept : Number(Tag(), KIND_UINT64) { store(value); }
+    Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL)
+    {
+        store(static_cast<ZQ::Uint8>(value));
+    }
+    Number(const int& value) noexcept : Number(Tag(), KIND_INT)
+    {
+        store(value);
+    }
+    Number(const unsigned int& value) noexcept : Number(Tag(), KIND_UINT32)
+    {
+        store(value);
+    }
+    Number(const unsigned long long& value) noexcept : Number(Tag(), KIND_UINT64)
+    {
+        store(value);
+    }
     // The kind is KIND_REAL for a NaN and for infinities too.
-    Number(const double& value) noexcept : Number(Tag(), KIND_REAL) { store(value); }
-    Number(const Version2& value) noexcept : Number(Tag(), KIND_VERSION) { store(value); }
-    Number(const sNodeRef& value) noexcept : Number(Tag(), KIND_NODEREF) { nodeRef_ = value; }
+    Number(const double& value) noexcept : Number(Tag(), KIND_REAL)
+    {
+        store(value);
+    }
+    Number(const Version2& value) noexcept : Number(Tag(), KIND_VERSION)
+    {
+        store(value);
+    }
+    Number(const sNodeRef& value) noexcept : Number(Tag(), KIND_NODEREF)
+    {
+        nodeRef_ = value;
+    }
 
     // A date-time of scope 3. Seconds since the epoch.
     Number(long seconds, unsigned short milliseconds) noexcept : Number(Tag(), KIND_DATETIME)
@@ -107,8 +129,14 @@ public:
     Number(T*) = delete;
     Number(std::nullptr_t) = delete;
 
-    KindType getKind() const noexcept { return kind_; }
-    operator KindType() const noexcept { return kind_; }
+    KindType getKind() const noexcept
+    {
+        return kind_;
+    }
+    operator KindType() const noexcept
+    {
+        return kind_;
+    }
 
     // Stores the kind and gives the value that kind's first content: 0, 0.0, version 0.0, or the current time
     // in whole seconds with scope 3. For the kinds 0, 1, 6 and 7 the flag byte is cleared and the rest is
@@ -167,7 +195,10 @@ public:
     //                    "Uint64: number out of range: "                     "... an unsigned 64-bit integer"
     //
     // A real NaN passes both range checks: it gives 0 for the 32-bit integers and 2^63 for the 64-bit one.
-    operator bool() const { return kind_ == KIND_BOOL ? load<ZQ::Uint8>() != 0 : toBool(); }
+    operator bool() const
+    {
+        return kind_ == KIND_BOOL ? load<ZQ::Uint8>() != 0 : toBool();
+    }
     operator int() const
     {
         return kind_ == KIND_INT ? load<int>() : static_cast<int>(toUint32("operator int"));
@@ -176,11 +207,23 @@ public:
     {
         return kind_ == KIND_UINT32 ? load<ZQ::Uint32>() : toUint32("operator ZQ::Uint32");
     }
-    operator unsigned long long() const { return kind_ == KIND_UINT64 ? load<ZQ::Uint64>() : toUint64(); }
-    operator double() const { return kind_ == KIND_REAL ? load<ZQ::Real64>() : toReal(); }
-    operator Version2() const { return kind_ == KIND_VERSION ? load<Version2>() : toVersion(); }
+    operator unsigned long long() const
+    {
+        return kind_ == KIND_UINT64 ? load<ZQ::Uint64>() : toUint64();
+    }
+    operator double() const
+    {
+        return kind_ == KIND_REAL ? load<ZQ::Real64>() : toReal();
+    }
+    operator Version2() const
+    {
+        return kind_ == KIND_VERSION ? load<Version2>() : toVersion();
+    }
     operator ZQ::DateTime() const;
-    operator sNodeRef() const { return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef(); }
+    operator sNodeRef() const
+    {
+        return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef();
+    }
 
     // The text, as a fresh std::ostringstream writes it under the global locale: "unknown", "true", decimal
     // digits, a real with six significant digits, "not a number", "infinity", "2.15", a date-time,
@@ -196,7 +239,7 @@ private:
     friend bool operator==(const Number& a, const Number& b);
     friend bool operator<(const Number& a, const Number& b);
     friend bool operator>(const Number& a, const Number& b);
-    friend void detail::append(detail::Text& text, const Number& number);
+    friend void detail::append(detail::Text & text, const Number& number);
 
     struct Tag { };
 

@@ -36,7 +36,8 @@ using StringArray = std::vector<std::string>;
 // - Write `IC::Buffer b = value;`, not `IC::Buffer b(value);`: a vector can also be made from a size, and the
 //   second is ambiguous. The same holds for the arrays, Number and EnumValue.
 // - No operation here looks at the read-only mark; assignment replaces it.
-class PropertyValue {
+class [[gnu::visibility("default")]] PropertyValue
+{
 public:
     enum KindType : ZQ::Uint32 {
         KIND_UNKNOWN = 0,      // nothing
@@ -49,17 +50,17 @@ public:
     };
 
     PropertyValue(const std::string& value, const bool& readOnly = false);
-    PropertyValue(std::string&& value, const bool& readOnly = false);
+    PropertyValue(std::string && value, const bool& readOnly = false);
     // Up to the terminating NUL. Throws std::logic_error for a null pointer.
     PropertyValue(const char* value, const bool& readOnly = false);
     PropertyValue(const Number& value, const bool& readOnly = false);
     PropertyValue(const EnumValue& value, const bool& readOnly = false);
     PropertyValue(const Buffer& value, const bool& readOnly = false);
-    PropertyValue(Buffer&& value, const bool& readOnly = false);
+    PropertyValue(Buffer && value, const bool& readOnly = false);
     PropertyValue(const NumberArray& value, const bool& readOnly = false);
-    PropertyValue(NumberArray&& value, const bool& readOnly = false);
+    PropertyValue(NumberArray && value, const bool& readOnly = false);
     PropertyValue(const StringArray& value, const bool& readOnly = false);
-    PropertyValue(StringArray&& value, const bool& readOnly = false);
+    PropertyValue(StringArray && value, const bool& readOnly = false);
 
     // The first value of the kind with this code: a Number of kind 0, an EnumValue of 0, or an empty text,
     // buffer or array.
@@ -87,16 +88,31 @@ public:
     PropertyValue& operator=(const PropertyValue& source);
 
     // Moves allocate nothing. The source is left with KIND_UNKNOWN and its mark.
-    PropertyValue(PropertyValue&& source) noexcept;
+    PropertyValue(PropertyValue && source) noexcept;
     PropertyValue& operator=(PropertyValue&& source) noexcept;
-    void swap(PropertyValue& other) noexcept;
-    friend void swap(PropertyValue& a, PropertyValue& b) noexcept { a.swap(b); }
+    void swap(PropertyValue & other) noexcept;
+    friend void swap(PropertyValue & a, PropertyValue & b) noexcept
+    {
+        a.swap(b);
+    }
 
-    ~PropertyValue() { freeValue(); }
+    ~PropertyValue()
+    {
+        freeValue();
+    }
 
-    KindType getKind() const noexcept { return kind_; }
-    operator KindType() const noexcept { return kind_; }
-    bool readOnly() const noexcept { return readOnly_; }
+    KindType getKind() const noexcept
+    {
+        return kind_;
+    }
+    operator KindType() const noexcept
+    {
+        return kind_;
+    }
+    bool readOnly() const noexcept
+    {
+        return readOnly_;
+    }
 
     // Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
     // keeps the value.

@@ -6,7 +6,8 @@ namespace [[gnu::visibility("default")]] VXLog {
 
 // Writes records: each call hands one to the current sink (RecordSink.h), on the calling thread. Any thread
 // may call at any time. What the sink throws reaches the caller.
-class VXLogger {
+class [[gnu::visibility("default")]] VXLogger
+{
 public:
     // `function` and `file` name the place in the source together with `line`; `logger` is the category.
     // `data`, `a` and `b` are handed on untouched.

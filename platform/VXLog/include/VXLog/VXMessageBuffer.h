@@ -10,7 +10,8 @@ namespace [[gnu::visibility("default")]] VXLog {
 //
 // Numbers are written in the classic locale, so that a record reads the same in every program. Where memory
 // runs out, the insertion throws std::bad_alloc; a text is never cut short. One buffer belongs to one thread.
-class VXMessageBuffer {
+class [[gnu::visibility("default")]] VXMessageBuffer
+{
 public:
     VXMessageBuffer();
     ~VXMessageBuffer();
@@ -26,8 +27,8 @@ public:
 
     // What was composed since the last call of str. The argument is what the last insertion returned. The
     // reference is good until the next call of str or the end of the buffer.
-    const std::string& str(std::ostream& last);
-    const std::string& str(VXMessageBuffer& last);
+    const std::string& str(std::ostream & last);
+    const std::string& str(VXMessageBuffer & last);
 
 private:
     const std::string& take();

@@ -14,7 +14,8 @@ namespace [[gnu::visibility("default")]] ZQ {
 //   ZQ::DateTime time(1234567890, 3);
 //   time.setMillisecond(123);
 //   std::cout << time;                         // 2009-02-13T23:31:30.123Z
-class DateTime {
+class [[gnu::visibility("default")]] DateTime
+{
 public:
     // The epoch: 0 seconds, 0 milliseconds, scope 3.
     DateTime();

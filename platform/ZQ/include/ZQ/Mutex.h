@@ -6,7 +6,8 @@ namespace [[gnu::visibility("default")]] ZQ {
 
 // A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as often.
 // Every operation may be called from any thread.
-class Mutex {
+class [[gnu::visibility("default")]] Mutex
+{
 public:
     Mutex();
     ~Mutex();
