@@ -7,7 +7,6 @@
 #include "detail/Failure.h"
 #include "detail/Text.h"
 
-// The agent's log configuration knows this category string by its namespace.
 namespace IC_NODE {
 
 [[gnu::init_priority(101)]] static const std::string loggerNode = "Vexilon.IC.Node";

@@ -102,11 +102,12 @@ constexpr ZQ::Uint8 largestKind = Number::KIND_NODEREF;
 constexpr ZQ::Uint32 noSensor = 74;
 
 // The real without its fraction. It is refused unless it is from 0 to below `limit`; a NaN passes.
-double integralPart(const double& real, double limit, const detail::Where& where, const char* literal,
+template <class Real>
+double integralPart(const Real& real, double limit, const detail::Where& where, const char* literal,
                     const char* tooLarge, const char* negative)
 {
     double integral = 0.0;
-    std::modf(real, &integral);
+    std::modf(real(), &integral);
     if (integral >= limit)
         detail::fail<std::out_of_range>(where, tooLarge, literal, real);
     if (integral < 0.0)
@@ -209,12 +210,12 @@ ZQ::Uint32 Number::toUint32(const char* function) const
     case KIND_UINT64: {
         const auto value = load<ZQ::Uint64>();
         if (value > std::numeric_limits<ZQ::Uint32>::max())
-            detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32, value);
+            detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32, reading<ZQ::Uint64>());
         return static_cast<ZQ::Uint32>(value);
     }
     case KIND_REAL: {
         const auto integral =
-            integralPart(load<ZQ::Real64>(), 0x1p32, here(function), outOfRange32, tooLarge32, negative32);
+            integralPart(reading<ZQ::Real64>(), 0x1p32, here(function), outOfRange32, tooLarge32, negative32);
         // Without the test the result for a NaN would be the processor's or the compiler's choice.
         return std::isnan(integral) ? 0 : static_cast<ZQ::Uint32>(integral);
     }
@@ -234,7 +235,7 @@ ZQ::Uint64 Number::toUint64() const
         return load<ZQ::Uint32>();
     case KIND_REAL: {
         // 2^64 is written as a power of two, since the largest 64-bit integer is no double.
-        const auto integral = integralPart(load<ZQ::Real64>(), 0x1p64, here("operator ZQ::Uint64"),
+        const auto integral = integralPart(reading<ZQ::Real64>(), 0x1p64, here("operator ZQ::Uint64"),
                                            outOfRange64, tooLarge64, negative64);
         return std::isnan(integral) ? ZQ::Uint64 {1} << 63 : static_cast<ZQ::Uint64>(integral);
     }
@@ -278,13 +279,15 @@ Version2 Number::toVersion() const
     case KIND_UINT32: {
         const auto value = load<ZQ::Uint32>();
         if (value > largestMajor)
-            detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal, value);
+            detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal,
+                                            reading<ZQ::Uint32>());
         return {static_cast<ZQ::Uint8>(value), 0};
     }
     case KIND_UINT64: {
         const auto value = load<ZQ::Uint64>();
         if (value > largestMajor)
-            detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal, value);
+            detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal,
+                                            reading<ZQ::Uint64>());
         return {static_cast<ZQ::Uint8>(value), 0};
     }
     default:

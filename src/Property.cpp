@@ -316,7 +316,7 @@ void PropertyValue::setKind(const unsigned char& kind)
 
 ZQ::Real64 PropertyValue::toReal() const
 {
-    if (const EnumValue* value = held<EnumValue>(KIND_ENUMVALUE))
+    if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
         return value->operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Real64"), notANumber,
@@ -325,7 +325,7 @@ ZQ::Real64 PropertyValue::toReal() const
 
 ZQ::Uint64 PropertyValue::toUint64() const
 {
-    if (const EnumValue* value = held<EnumValue>(KIND_ENUMVALUE))
+    if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
         return value->operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint64"), notANumber,
@@ -334,7 +334,7 @@ ZQ::Uint64 PropertyValue::toUint64() const
 
 ZQ::Uint32 PropertyValue::toUint32() const
 {
-    if (const EnumValue* value = held<EnumValue>(KIND_ENUMVALUE))
+    if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
         return value->operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint32"), notANumber,

@@ -8,7 +8,9 @@
 #include "ZQ/DateTime.h"
 #include "ZQ/Types.h"
 
-namespace [[gnu::visibility("default")]] IC {
+#pragma GCC visibility push(default)
+
+namespace IC {
 
 // One event that the agent raises: when, how severe, of which class, with which node status, about which
 // nodes, and a text.
@@ -17,68 +19,45 @@ namespace [[gnu::visibility("default")]] IC {
 //
 //   IC::Alert alert(2, 1, {"/fan/1"}, 5, "Fan failed");
 //   std::cout << alert;                        // Alert 2; 1; 5; Fan failed; <time>; { 2f66616e2f31 }
-class [[gnu::visibility("default")]] Alert
-{
+class __attribute__((visibility("default"))) Alert {
 public:
     // The codes are numbers without names; these are the first and the last.
     enum SeverityType : ZQ::Uint8 { SEVERITY_SMALLEST = 0, SEVERITY_LARGEST = 3 };
     enum ClassType : ZQ::Uint8 { CLASS_SMALLEST = 0, CLASS_LARGEST = 5 };
 
-    // An event at `timeStamp`.
+    // An event at `timeStamp`. Codes out of range are refused with std::invalid_argument, the first in this
+    // order: what is logged (category "Vexilon.IC.Alert", level 6000), with the code, and below it what the
+    // exception says.
     //
-    //   refused, in this order    logged, with the code                thrown: std::invalid_argument
-    //   severity above 3          "init: Invalid severity type "       "Invalid severity type"
-    //   class above 5             "init: Invalid class type "          "Invalid class type"
-    //   status above 85           "init: Invalid status type "         "Invalid status type"
-    //
-    // The records have the category "Vexilon.IC.Alert" and the level 6000.
-    Alert(ZQ::DateTime & timeStamp, unsigned char severity, unsigned char alertClass,
+    //   severity above 3
+    //     "init: Invalid severity type "
+    //       "Invalid severity type"
+    //   class above 5
+    //     "init: Invalid class type "
+    //       "Invalid class type"
+    //   status above 85
+    //     "init: Invalid status type "
+    //       "Invalid status type"
+    Alert(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
           std::vector<std::string> nodePaths, unsigned int status, std::string message);
 
     // An event now. The clock is read before the codes are checked.
     Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
           unsigned int status, std::string message);
 
-    ZQ::DateTime getTimeStamp() const
-    {
-        return timeStamp_;
-    }
+    ZQ::DateTime getTimeStamp() const { return timeStamp_; }
 
-    SeverityType getSeverity() const noexcept
-    {
-        return severity_;
-    }
-    operator SeverityType() const noexcept
-    {
-        return severity_;
-    }
+    SeverityType getSeverity() const noexcept { return severity_; }
+    operator SeverityType() const noexcept { return severity_; }
 
-    ClassType getClass() const noexcept
-    {
-        return alertClass_;
-    }
-    operator ClassType() const noexcept
-    {
-        return alertClass_;
-    }
+    ClassType getClass() const noexcept { return alertClass_; }
+    operator ClassType() const noexcept { return alertClass_; }
 
-    Node::StatusType getStatus() const noexcept
-    {
-        return status_;
-    }
-    operator Node::StatusType() const noexcept
-    {
-        return status_;
-    }
+    Node::StatusType getStatus() const noexcept { return status_; }
+    operator Node::StatusType() const noexcept { return status_; }
 
-    std::vector<std::string> getNodePaths() const
-    {
-        return nodePaths_;
-    }
-    std::string getMessage() const
-    {
-        return message_;
-    }
+    std::vector<std::string> getNodePaths() const { return nodePaths_; }
+    std::string getMessage() const { return message_; }
 
     // Two lower-case hexadecimal digits for each byte of the text, NUL bytes included.
     std::string hexstring(const std::string& text) const;
@@ -89,7 +68,7 @@ public:
     operator std::string() const;
 
 private:
-    void init(ZQ::DateTime & timeStamp, unsigned char severity, unsigned char alertClass,
+    void init(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
               std::vector<std::string> nodePaths, unsigned int status, std::string message);
 
     ZQ::DateTime timeStamp_;
@@ -103,4 +82,6 @@ private:
 // Inserts std::string(alert) as one text: width and fill apply to the whole of it.
 std::ostream& operator<<(std::ostream& out, const Alert& alert);
 
-}  // namespace gnu::visibility("default")]]IC
+}  // namespace IC
+
+#pragma GCC visibility pop

@@ -6,7 +6,9 @@
 
 #include "ZQ/Types.h"
 
-namespace [[gnu::visibility("default")]] IC {
+#pragma GCC visibility push(default)
+
+namespace IC {
 
 // One member of some enumeration as a plain unsigned number; it does not know which enumeration.
 //
@@ -16,25 +18,21 @@ namespace [[gnu::visibility("default")]] IC {
 //   IC::EnumValue state(7u);
 //   unsigned char code = state;                // 7
 //   std::cout << state;                        // 7
-class [[gnu::visibility("default")]] EnumValue
-{
+class __attribute__((visibility("default"))) EnumValue {
 public:
     EnumValue() noexcept : value_(0) { }
     EnumValue(const unsigned char& value) noexcept : value_(value) { }
     EnumValue(const unsigned short& value) noexcept : value_(value) { }
     EnumValue(const unsigned int& value) noexcept : value_(value) { }
 
-    // The value at the width asked for; nothing is cut off.
+    // The value at the width asked for; nothing is cut off. What is too large is refused with
+    // std::out_of_range: what is logged, with the value, and below it what the exception says.
     //
-    //   refused        logged, with the value              thrown: std::out_of_range
-    //   above 65535    "Uint16: number out of range: "     "The number is too large to convert to a 16-bit
-    //                                                       integer"
-    //   above 255      "Uint8: number out of range: "      "The number is too large to convert to an 8-bit
-    //                                                       integer"
-    operator unsigned int() const noexcept
-    {
-        return value_;
-    }
+    //     "Uint16: number out of range: "
+    //       "The number is too large to convert to a 16-bit integer"
+    //     "Uint8: number out of range: "
+    //       "The number is too large to convert to an 8-bit integer"
+    operator unsigned int() const noexcept { return value_; }
     operator unsigned short() const
     {
         return value_ <= 0xFFFFu ? static_cast<unsigned short>(value_) : refuseUint16();
@@ -67,4 +65,6 @@ bool operator>=(const EnumValue& a, const EnumValue& b);
 // Inserts std::string(value) as one text: width and fill apply to the whole of it.
 std::ostream& operator<<(std::ostream& out, const EnumValue& value);
 
-}  // namespace gnu::visibility("default")]]IC
+}  // namespace IC
+
+#pragma GCC visibility pop

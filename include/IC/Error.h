@@ -6,7 +6,9 @@
 #include "IC/Number.h"
 #include "ZQ/Types.h"
 
-namespace [[gnu::visibility("default")]] IC {
+#pragma GCC visibility push(default)
+
+namespace IC {
 
 // How an operation went, without an exception: a status, perhaps a number that goes with it, perhaps a text.
 //
@@ -16,8 +18,7 @@ namespace [[gnu::visibility("default")]] IC {
 //   std::cout << error;                        // 5 - no such property
 //
 // Mind the order of the arguments: the constructor of three takes the status first, the others last.
-class [[gnu::visibility("default")]] Error
-{
+class __attribute__((visibility("default"))) Error {
 public:
     // 1 to 4 and 6 to 15 are valid as well; their meaning is the caller's.
     enum StatusType : ZQ::Uint8 {
@@ -27,43 +28,24 @@ public:
     };
 
     // Without a number the value is of kind Number::KIND_UNKNOWN; without a text the message is empty.
-    // A null `message` throws std::logic_error.
+    // A null `message` throws std::logic_error. A status above 16 is refused with std::invalid_argument: what is
+    // logged (category "Vexilon.IC.Error", level 6000), with the status, and below it what the exception says.
     //
-    //   refused            logged, with the status                  thrown: std::invalid_argument
-    //   status above 16    "initstatus: Invalid error status="      "Invalid error status"
-    //
-    // The records have the category "Vexilon.IC.Error" and the level 6000.
+    //     "initstatus: Invalid error status="
+    //       "Invalid error status"
     Error(const Number& value, unsigned char status);
     Error(unsigned char status, const Number& value, const std::string& message);
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
 
-    StatusType getStatus() const noexcept
-    {
-        return status_;
-    }
-    operator StatusType() const noexcept
-    {
-        return status_;
-    }
-    operator unsigned char() const noexcept
-    {
-        return status_;
-    }
+    StatusType getStatus() const noexcept { return status_; }
+    operator StatusType() const noexcept { return status_; }
+    operator unsigned char() const noexcept { return status_; }
 
-    Number getValue() const noexcept
-    {
-        return value_;
-    }
-    operator Number() const noexcept
-    {
-        return value_;
-    }
+    Number getValue() const noexcept { return value_; }
+    operator Number() const noexcept { return value_; }
 
-    std::string getMessage() const
-    {
-        return message_;
-    }
+    std::string getMessage() const { return message_; }
 
     // The status; " - " and the number unless its kind is KIND_UNKNOWN; " - " and the message unless it is
     // empty: "0", "5 - 17", "5 - no such property". As a fresh std::ostringstream writes it under the global
@@ -81,4 +63,6 @@ private:
 // Inserts std::string(error) as one text: width and fill apply to the whole of it.
 std::ostream& operator<<(std::ostream& out, const Error& error);
 
-}  // namespace gnu::visibility("default")]]IC
+}  // namespace IC
+
+#pragma GCC visibility pop

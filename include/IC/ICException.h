@@ -2,11 +2,12 @@
 
 #include <string>
 
-namespace [[gnu::visibility("default")]] IC {
+#pragma GCC visibility push(default)
+
+namespace IC {
 
 // The root of the library's own exceptions. It has no base: handlers of std::exception do not see it.
-class [[gnu::visibility("default")]] ICException
-{
+class __attribute__((visibility("default"))) ICException {
 public:
     explicit ICException(const std::string& text = std::string());
     ICException(const ICException&) = default;
@@ -23,8 +24,7 @@ protected:
 // Thrown by PropertyValue: an unknown kind, or a value that is not of the kind asked for.
 //
 // The base is private on purpose: `catch (IC::ICException&)` does not catch it; catch it by its own name.
-class [[gnu::visibility("default")]] PropertyValueInvalidKind : private ICException
-{
+class __attribute__((visibility("default"))) PropertyValueInvalidKind : private ICException {
 public:
     explicit PropertyValueInvalidKind(const std::string& text);
     PropertyValueInvalidKind(const PropertyValueInvalidKind&) = default;
@@ -35,8 +35,7 @@ public:
 };
 
 // Thrown by Node for a sensor code above 73. The base is private on purpose, as above.
-class [[gnu::visibility("default")]] NodeInvalidSensor : private ICException
-{
+class __attribute__((visibility("default"))) NodeInvalidSensor : private ICException {
 public:
     explicit NodeInvalidSensor(const std::string& text);
     NodeInvalidSensor(const NodeInvalidSensor&) = default;
@@ -46,4 +45,6 @@ public:
     using ICException::what;
 };
 
-}  // namespace gnu::visibility("default")]]IC
+}  // namespace IC
+
+#pragma GCC visibility pop

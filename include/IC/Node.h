@@ -9,7 +9,9 @@
 #include "ZQ/Mutex.h"
 #include "ZQ/Types.h"
 
-namespace [[gnu::visibility("default")]] IC {
+#pragma GCC visibility push(default)
+
+namespace IC {
 
 // A managed object: one component of the machine, with a sensor type, a status, a description, its own path
 // and its parent's, and numbered properties.
@@ -28,8 +30,7 @@ namespace [[gnu::visibility("default")]] IC {
 //           properties.insert({1u, IC::PropertyValue(IC::Number(3600u))});
 //       }
 //   };
-class [[gnu::visibility("default")]] Node
-{
+class __attribute__((visibility("default"))) Node {
 public:
     // The display names are in `pst`.
     enum SensorType : ZQ::Uint32 {
@@ -117,13 +118,12 @@ public:
     // A node of sensor type 0 with the description "UNKNOWN SENSOR NODE CREATED BY DEFAULT CONSTRUCTOR".
     Node();
 
-    // A node of the given sensor type with an empty description.
+    // A node of the given sensor type with an empty description. A code above 73 is refused with
+    // NodeInvalidSensor: what is logged (category "Vexilon.IC.Node", level 6000), with the code, and below it
+    // what the exception says.
     //
-    //   refused            logged, with the code                      thrown: NodeInvalidSensor
-    //   sensor above 73    "Node: Sensor value out of range: "        "74 is not a valid sensor. The largest
-    //                                                                  possible sensor is 73"
-    //
-    // The records have the category "Vexilon.IC.Node" and the level 6000.
+    //     "Node: Sensor value out of range: "
+    //       "74 is not a valid sensor. The largest possible sensor is 73"
     explicit Node(unsigned int sensor);
 
     Node(const Node&) = delete;
@@ -158,22 +158,10 @@ public:
     // it, which is called under the lock. As a fresh std::ostringstream writes it under the global locale.
     virtual operator std::string() const;
 
-    SensorType getSensor() const noexcept
-    {
-        return sensor_;
-    }
-    operator SensorType() const noexcept
-    {
-        return sensor_;
-    }
-    std::string getPath() const
-    {
-        return path;
-    }
-    std::string getParent() const
-    {
-        return parent;
-    }
+    SensorType getSensor() const noexcept { return sensor_; }
+    operator SensorType() const noexcept { return sensor_; }
+    std::string getPath() const { return path; }
+    std::string getParent() const { return parent; }
 
     // The status of this very object, under the lock, also where a derived class overrides getStatus.
     operator StatusType() const;
@@ -210,4 +198,6 @@ bool operator>=(const Node& a, const Node& b);
 // Inserts the node's text, as its class writes it, as one text: width and fill apply to the whole of it.
 std::ostream& operator<<(std::ostream& out, const Node& node);
 
-}  // namespace gnu::visibility("default")]]IC
+}  // namespace IC
+
+#pragma GCC visibility pop

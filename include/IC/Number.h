@@ -23,7 +23,9 @@ class Text;
 void append(Text& text, const Number& number);
 }  // namespace IC::detail
 
-namespace [[gnu::visibility("default")]] IC {
+#pragma GCC visibility push(default)
+
+namespace IC {
 
 // The display names of the sensor types, indexed by Node::SensorType. Entry 74, "invalid", is no sensor type.
 // Programs hold a copy of the table, so its size never changes.
@@ -58,8 +60,7 @@ using NodeRef = sNodeRef;
 // - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
 // - A signed number converts to int and to nothing else; a negative real converts to no integer.
 // - Two signed numbers are always equal and never ordered; so are two node references.
-class [[gnu::visibility("default")]] Number
-{
+class __attribute__((visibility("default"))) Number {
 public:
     enum KindType : ZQ::Uint32 {
         KIND_UNKNOWN = 0,   // no value
@@ -75,35 +76,14 @@ public:
         KIND_NODEREF = 10   // an sNodeRef
     };
 
-    Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL)
-    {
-        store(static_cast<ZQ::Uint8>(value));
-    }
-    Number(const int& value) noexcept : Number(Tag(), KIND_INT)
-    {
-        store(value);
-    }
-    Number(const unsigned int& value) noexcept : Number(Tag(), KIND_UINT32)
-    {
-        store(value);
-    }
-    Number(const unsigned long long& value) noexcept : Number(Tag(), KIND_UINT64)
-    {
-        store(value);
-    }
+    Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL) { store(static_cast<ZQ::Uint8>(value)); }
+    Number(const int& value) noexcept : Number(Tag(), KIND_INT) { store(value); }
+    Number(const unsigned int& value) noexcept : Number(Tag(), KIND_UINT32) { store(value); }
+    Number(const unsigned long long& value) noexcept : Number(Tag(), KIND_UINT64) { store(value); }
     // The kind is KIND_REAL for a NaN and for infinities too.
-    Number(const double& value) noexcept : Number(Tag(), KIND_REAL)
-    {
-        store(value);
-    }
-    Number(const Version2& value) noexcept : Number(Tag(), KIND_VERSION)
-    {
-        store(value);
-    }
-    Number(const sNodeRef& value) noexcept : Number(Tag(), KIND_NODEREF)
-    {
-        nodeRef_ = value;
-    }
+    Number(const double& value) noexcept : Number(Tag(), KIND_REAL) { store(value); }
+    Number(const Version2& value) noexcept : Number(Tag(), KIND_VERSION) { store(value); }
+    Number(const sNodeRef& value) noexcept : Number(Tag(), KIND_NODEREF) { nodeRef_ = value; }
 
     // A date-time of scope 3. Seconds since the epoch.
     Number(long seconds, unsigned short milliseconds) noexcept : Number(Tag(), KIND_DATETIME)
@@ -114,11 +94,12 @@ public:
     // A date-time; the scope is cut to 8 bits and the milliseconds to 16.
     Number(const ZQ::DateTime& value);
 
-    // A number of the kind with this code, with the content that initKind gives.
+    // A number of the kind with this code, with the content that initKind gives. Codes of 11 and above are
+    // refused with std::invalid_argument: what is logged, with the code, and below it what the exception says;
+    // 2 and 10 are refused by initKind.
     //
-    //   refused                logged, with the code                 thrown
-    //   11 and above           "Number: wrong kind of number: "      std::invalid_argument
-    //   2, 10                  as by initKind                        "Invalid kind of number"
+    //     "Number: wrong kind of number: "
+    //       "Invalid kind of number"
     Number(const unsigned char& code);
 
     // The same; every refusal is initKind's.
@@ -129,22 +110,15 @@ public:
     Number(T*) = delete;
     Number(std::nullptr_t) = delete;
 
-    KindType getKind() const noexcept
-    {
-        return kind_;
-    }
-    operator KindType() const noexcept
-    {
-        return kind_;
-    }
+    KindType getKind() const noexcept { return kind_; }
+    operator KindType() const noexcept { return kind_; }
 
     // Stores the kind and gives the value that kind's first content: 0, 0.0, version 0.0, or the current time
-    // in whole seconds with scope 3. For the kinds 0, 1, 6 and 7 the flag byte is cleared and the rest is
-    // kept.
+    // in whole seconds with scope 3. For the kinds 0, 1, 6 and 7 the flag byte is cleared and the rest is kept.
+    // The kinds 2, 10, and 11 and above are refused with std::invalid_argument:
     //
-    //   refused                logged, with the kind                 thrown
-    //   2, 10, 11 and above    "initkind: invalid kind of number "   std::invalid_argument
-    //                                                                "Invalid kind of number"
+    //     "initkind: invalid kind of number ", and the kind
+    //       "Invalid kind of number"
     //
     // The refused kind stays stored (deliberate). A kind of 11 or more then behaves like KIND_UNKNOWN in
     // conversions and comparisons, and its text is "invalid".
@@ -152,22 +126,19 @@ public:
 
     // Replaces the kind and keeps the bytes of the value as they lie in storage: a reinterpretation, no
     // conversion. All kinds from 0 to 10 are taken. A flag byte above 1 made this way converts to true, 1 and
-    // 1.0, and prints "true".
+    // 1.0, and prints "true". Codes of 11 and above are refused with std::invalid_argument, and nothing changes:
     //
-    //   refused                logged, with the code                 thrown
-    //   11 and above           "setKind: invalid kind "              std::invalid_argument "Invalid kind"
-    //
-    // A refused call changes nothing.
+    //     "setKind: invalid kind ", and the code
+    //       "Invalid kind"
     void setKind(const unsigned char& code);
 
     // The conversions. Each takes the kinds in its row and refuses the others with std::out_of_range. A real
     // is cut toward zero and refused where the target cannot hold it; nothing is saturated.
     //
     //   to                  takes
-    //   bool                flag, uint32, uint64, real (not 0; NaN is true)
-    //   int                 flag, int; uint32 and uint64 below 2^32 and reals from 0 to below 2^32, the low
-    //   32
-    //                       bits of which are taken as signed; the refusals speak of an unsigned integer
+    //   bool                flag; uint32, uint64 and real, whether not 0 (NaN is true)
+    //   int                 flag, int; uint32, and uint64 and reals from 0 to below 2^32, of which the low 32
+    //                       bits are taken as signed; its refusals are those of unsigned int
     //   unsigned int        flag, uint32; uint64 and reals below 2^32
     //   unsigned long long  flag, uint32, uint64; reals below 2^64
     //   double              flag, uint32, uint64, real, NaN, infinity; a version as major.minor (2.15)
@@ -175,30 +146,35 @@ public:
     //   ZQ::DateTime        date-time of scope 1 to 3
     //   sNodeRef            node reference
     //
-    //   refused          logged                                              thrown: std::out_of_range
-    //   the kind         "bool: Can't return current value as a Boolean,     "Can't return current value as a
-    //                     kind=", and the kind                                Boolean"
-    //                    "Uint32: ... as a 32-bit integer, kind=" (and int)  "... as a 32-bit integer"
-    //                    "Uint64: ... as a 64-bit integer, kind="            "... as a 64-bit integer"
-    //                    "Real: ... as a Real, kind="                        "... as a Real"
-    //                    "Version: ... as a Version, kind="                  "... as a Version"
-    //                    "DateTime: ... as a DateTime, kind="                "... as a DateTime"
-    //                    "NodeRef: ... as a pair, kind="                     "... as pair"
-    //   too large        "Uint32: number out of range: ", and the value      "The number is too large to
-    //   convert
-    //                                                                         to a 32-bit integer"
-    //                    "Uint64: number out of range: "                     "... to a 64-bit integer"
-    //                    "Version: Number too large for version: "           "... to a version"
-    //   below 0          "Uint32: number out of range: "                     "A negative number cannot
-    //   convert to
-    //                                                                         an unsigned 32-bit integer"
-    //                    "Uint64: number out of range: "                     "... an unsigned 64-bit integer"
-    //
     // A real NaN passes both range checks: it gives 0 for the 32-bit integers and 2^63 for the 64-bit one.
-    operator bool() const
-    {
-        return kind_ == KIND_BOOL ? load<ZQ::Uint8>() != 0 : toBool();
-    }
+    //
+    // The refusals: what is logged, and below it what the exception says.
+    //
+    //   another kind, which is logged behind the text
+    //     "bool: Can't return current value as a Boolean, kind="
+    //       "Can't return current value as a Boolean"
+    //     "Uint32: Can't return current value as a 32-bit integer, kind="
+    //       "Can't return current value as a 32-bit integer"
+    //     "Uint64: Can't return current value as a 64-bit integer, kind="
+    //       "Can't return current value as a 64-bit integer"
+    //     "Real: Can't return current value as a Real, kind="
+    //       "Can't return current value as a Real"
+    //     "Version: Can't return current value as a Version, kind="
+    //       "Can't return current value as a Version"
+    //     "DateTime: Can't return current value as a DateTime, kind="
+    //       "Can't return current value as a DateTime"
+    //     "NodeRef: Can't return current value as a pair, kind="
+    //       "Can't return current value as pair"
+    //   too large, or below 0; the value is logged behind the text
+    //     "Uint32: number out of range: "
+    //       "The number is too large to convert to a 32-bit integer"
+    //       "A negative number cannot convert to an unsigned 32-bit integer"
+    //     "Uint64: number out of range: "
+    //       "The number is too large to convert to a 64-bit integer"
+    //       "A negative number cannot convert to an unsigned 64-bit integer"
+    //     "Version: Number too large for version: "
+    //       "The number is too large to convert to a version"
+    operator bool() const { return kind_ == KIND_BOOL ? load<ZQ::Uint8>() != 0 : toBool(); }
     operator int() const
     {
         return kind_ == KIND_INT ? load<int>() : static_cast<int>(toUint32("operator int"));
@@ -207,23 +183,11 @@ public:
     {
         return kind_ == KIND_UINT32 ? load<ZQ::Uint32>() : toUint32("operator ZQ::Uint32");
     }
-    operator unsigned long long() const
-    {
-        return kind_ == KIND_UINT64 ? load<ZQ::Uint64>() : toUint64();
-    }
-    operator double() const
-    {
-        return kind_ == KIND_REAL ? load<ZQ::Real64>() : toReal();
-    }
-    operator Version2() const
-    {
-        return kind_ == KIND_VERSION ? load<Version2>() : toVersion();
-    }
+    operator unsigned long long() const { return kind_ == KIND_UINT64 ? load<ZQ::Uint64>() : toUint64(); }
+    operator double() const { return kind_ == KIND_REAL ? load<ZQ::Real64>() : toReal(); }
+    operator Version2() const { return kind_ == KIND_VERSION ? load<Version2>() : toVersion(); }
     operator ZQ::DateTime() const;
-    operator sNodeRef() const
-    {
-        return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef();
-    }
+    operator sNodeRef() const { return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef(); }
 
     // The text, as a fresh std::ostringstream writes it under the global locale: "unknown", "true", decimal
     // digits, a real with six significant digits, "not a number", "infinity", "2.15", a date-time,
@@ -239,7 +203,7 @@ private:
     friend bool operator==(const Number& a, const Number& b);
     friend bool operator<(const Number& a, const Number& b);
     friend bool operator>(const Number& a, const Number& b);
-    friend void detail::append(detail::Text & text, const Number& number);
+    friend void detail::append(detail::Text& text, const Number& number);
 
     struct Tag { };
 
@@ -259,6 +223,13 @@ private:
         T content;
         std::memcpy(&content, value_, sizeof content);
         return content;
+    }
+
+    // The content as a record reads it, anew each time.
+    template <class T>
+    auto reading() const noexcept
+    {
+        return [this] { return load<T>(); };
     }
 
     template <class T>
@@ -304,13 +275,15 @@ bool operator!=(const Number& a, const Number& b);
 // neither less nor greater. Infinity on the left is never less and always greater than what is not infinity,
 // of any kind; infinity on the right of another kind is refused.
 //
-//   refused                  logged                                              thrown:
-//   std::invalid_argument a kind is KIND_NAN       "<: invalid operation when kind is NaN" "Invalid operation
-//   when kind is
-//                            (">: ..." for greater)                               NaN"
-//   the kinds differ         "<: cannot compare two different kinds of number,   "Cannot compare two
-//   different
-//                             kind1=3, kind2=4" (">: ...")                        kinds of number"
+// The refusals, with std::invalid_argument: what is logged (for > it begins with ">"), and below it what the
+// exception says.
+//
+//   one of the kinds is KIND_NAN
+//     "<: invalid operation when kind is NaN"
+//       "Invalid operation when kind is NaN"
+//   the kinds differ
+//     "<: cannot compare two different kinds of number, kind1=3, kind2=4"
+//       "Cannot compare two different kinds of number"
 bool operator<(const Number& a, const Number& b);
 bool operator>(const Number& a, const Number& b);
 
@@ -321,7 +294,9 @@ bool operator>=(const Number& a, const Number& b);
 // Inserts std::string(number) as one text: width and fill apply to the whole of it.
 std::ostream& operator<<(std::ostream& out, const Number& number);
 
-}  // namespace gnu::visibility("default")]]IC
+}  // namespace IC
+
+#pragma GCC visibility pop
 
 #pragma pop_macro("major")
 #pragma pop_macro("minor")

@@ -11,7 +11,9 @@
 #include "IC/Number.h"
 #include "ZQ/Types.h"
 
-namespace [[gnu::visibility("default")]] IC {
+#pragma GCC visibility push(default)
+
+namespace IC {
 
 using Buffer = std::vector<unsigned char>;
 using NumberArray = std::vector<Number>;
@@ -36,8 +38,7 @@ using StringArray = std::vector<std::string>;
 // - Write `IC::Buffer b = value;`, not `IC::Buffer b(value);`: a vector can also be made from a size, and the
 //   second is ambiguous. The same holds for the arrays, Number and EnumValue.
 // - No operation here looks at the read-only mark; assignment replaces it.
-class [[gnu::visibility("default")]] PropertyValue
-{
+class __attribute__((visibility("default"))) PropertyValue {
 public:
     enum KindType : ZQ::Uint32 {
         KIND_UNKNOWN = 0,      // nothing
@@ -50,24 +51,24 @@ public:
     };
 
     PropertyValue(const std::string& value, const bool& readOnly = false);
-    PropertyValue(std::string && value, const bool& readOnly = false);
+    PropertyValue(std::string&& value, const bool& readOnly = false);
     // Up to the terminating NUL. Throws std::logic_error for a null pointer.
     PropertyValue(const char* value, const bool& readOnly = false);
     PropertyValue(const Number& value, const bool& readOnly = false);
     PropertyValue(const EnumValue& value, const bool& readOnly = false);
     PropertyValue(const Buffer& value, const bool& readOnly = false);
-    PropertyValue(Buffer && value, const bool& readOnly = false);
+    PropertyValue(Buffer&& value, const bool& readOnly = false);
     PropertyValue(const NumberArray& value, const bool& readOnly = false);
-    PropertyValue(NumberArray && value, const bool& readOnly = false);
+    PropertyValue(NumberArray&& value, const bool& readOnly = false);
     PropertyValue(const StringArray& value, const bool& readOnly = false);
-    PropertyValue(StringArray && value, const bool& readOnly = false);
+    PropertyValue(StringArray&& value, const bool& readOnly = false);
 
     // The first value of the kind with this code: a Number of kind 0, an EnumValue of 0, or an empty text,
-    // buffer or array.
+    // buffer or array. Codes of 7 and above are refused with PropertyValueInvalidKind: what is logged, with the
+    // code, and below it what the exception says.
     //
-    //   refused        logged, with the code                                    thrown
-    //   7 and above    "PropertyValue:initKind: invalid kind of property: "     PropertyValueInvalidKind
-    //                                                                           "Invalid kind of property"
+    //     "PropertyValue:initKind: invalid kind of property: "
+    //       "Invalid kind of property"
     PropertyValue(const unsigned char& kind, const bool& readOnly = false);
 
     // The same. The code is cut to its low 8 bits first, so 257 is KIND_NUMBER (deliberate).
@@ -75,12 +76,11 @@ public:
 
     // Flags, reals and other enumerations would silently become a kind code. Write Number(value) or
     // EnumValue(value).
-    template <
-        class T,
-        class = std::enable_if_t<
-            std::is_same_v<
-                T,
-                bool> || std::is_floating_point_v<T> || (std::is_enum_v<T> && !std::is_same_v<T, KindType>)>>
+    template <class T>
+    static constexpr bool notAKind =
+        std::disjunction_v<std::is_same<T, bool>, std::is_floating_point<T>,
+                           std::conjunction<std::is_enum<T>, std::negation<std::is_same<T, KindType>>>>;
+    template <class T, std::enable_if_t<notAKind<T>, int> = 0>
     PropertyValue(T, const bool& = false) = delete;
 
     // A copy has the source's mark; assignment replaces the mark by the source's, whatever it was.
@@ -88,37 +88,19 @@ public:
     PropertyValue& operator=(const PropertyValue& source);
 
     // Moves allocate nothing. The source is left with KIND_UNKNOWN and its mark.
-    PropertyValue(PropertyValue && source) noexcept;
+    PropertyValue(PropertyValue&& source) noexcept;
     PropertyValue& operator=(PropertyValue&& source) noexcept;
-    void swap(PropertyValue & other) noexcept;
-    friend void swap(PropertyValue & a, PropertyValue & b) noexcept
-    {
-        a.swap(b);
-    }
+    void swap(PropertyValue& other) noexcept;
+    friend void swap(PropertyValue& a, PropertyValue& b) noexcept { a.swap(b); }
 
-    ~PropertyValue()
-    {
-        freeValue();
-    }
+    ~PropertyValue() { freeValue(); }
 
-    KindType getKind() const noexcept
-    {
-        return kind_;
-    }
-    operator KindType() const noexcept
-    {
-        return kind_;
-    }
-    bool readOnly() const noexcept
-    {
-        return readOnly_;
-    }
+    KindType getKind() const noexcept { return kind_; }
+    operator KindType() const noexcept { return kind_; }
+    bool readOnly() const noexcept { return readOnly_; }
 
     // Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
-    // keeps the value.
-    //
-    //   refused        logged, thrown
-    //   7 and above    as by the constructor from a kind
+    // keeps the value. Codes of 7 and above are refused as by the constructor from a kind.
     //
     // A refused code still costs the old value (deliberate): the kind stays, without an object. Give such a
     // value another kind, or assign to it. Until then conversions to a native type refuse it as they refuse
@@ -126,75 +108,91 @@ public:
     void setKind(const unsigned char& kind);
 
     // The conversions. A number converts as Number does, refusals included; an enumerated value answers as an
-    // unsigned 32-bit number. Containers are copied.
+    // unsigned 32-bit number. Containers are copied. Other kinds are refused with PropertyValueInvalidKind: what
+    // is logged, with the kind, and below it what the exception says.
     //
-    //   to                  takes                logged, with the kind
-    //   double              number, enumerated   "PropertyValue:Real64: can't return current value as a
-    //                                             Real64, kind="
-    //   unsigned long long  number, enumerated   "PropertyValue:Uint64: ... as a Uint64, kind="
-    //   unsigned int        number, enumerated   "PropertyValue::Uint32: ... as a Uint32, kind="
-    //   bool                number               "PropertyValue::bool: ... as a bool, kind="
-    //   Number              number               "PropertyValue:Number: ... as a Number, kind="
-    //   Version2            number               "PropertyValue:Version2: ... as a Version2, kind="
-    //   EnumValue           enumerated           nothing (deliberate)
-    //   Buffer              bytes                "PropertyValue:Buffer: ... as a Buffer, kind="
-    //   NumberArray         numbers              "PropertyValue:NumberArray: ... as a NumberArray, kind="
-    //   StringArray         texts                "PropertyValue:StringArray: ... as a StringArray, kind="
-    //
-    // Other kinds are refused with PropertyValueInvalidKind: "Can't return current value as a Number" for the
-    // first six, and "... as a EnumValue", "... as a Buffer", "... as a NumberArray", "... as a StringArray".
+    //   to double, from a number or an enumerated value
+    //     "PropertyValue:Real64: can't return current value as a Real64, kind="
+    //       "Can't return current value as a Number"
+    //   to unsigned long long, from a number or an enumerated value
+    //     "PropertyValue:Uint64: can't return current value as a Uint64, kind="
+    //       "Can't return current value as a Number"
+    //   to unsigned int, from a number or an enumerated value
+    //     "PropertyValue::Uint32: can't return current value as a Uint32, kind="
+    //       "Can't return current value as a Number"
+    //   to bool, from a number
+    //     "PropertyValue::bool: can't return current value as a bool, kind="
+    //       "Can't return current value as a Number"
+    //   to Number, from a number
+    //     "PropertyValue:Number: can't return current value as a Number, kind="
+    //       "Can't return current value as a Number"
+    //   to Version2, from a number
+    //     "PropertyValue:Version2: can't return current value as a Version2, kind="
+    //       "Can't return current value as a Number"
+    //   to EnumValue, from an enumerated value
+    //     nothing is logged (deliberate)
+    //       "Can't return current value as a EnumValue"
+    //   to Buffer, from bytes
+    //     "PropertyValue:Buffer: can't return current value as a Buffer, kind="
+    //       "Can't return current value as a Buffer"
+    //   to NumberArray, from numbers
+    //     "PropertyValue:NumberArray: can't return current value as a NumberArray, kind="
+    //       "Can't return current value as a NumberArray"
+    //   to StringArray, from texts
+    //     "PropertyValue:StringArray: can't return current value as a StringArray, kind="
+    //       "Can't return current value as a StringArray"
     operator double() const
     {
-        const Number* number = held<Number>(KIND_NUMBER);
+        const auto* number = held<Number>(KIND_NUMBER);
         return number != nullptr ? number->operator double() : toReal();
     }
     operator unsigned long long() const
     {
-        const Number* number = held<Number>(KIND_NUMBER);
+        const auto* number = held<Number>(KIND_NUMBER);
         return number != nullptr ? number->operator unsigned long long() : toUint64();
     }
     operator unsigned int() const
     {
-        const Number* number = held<Number>(KIND_NUMBER);
+        const auto* number = held<Number>(KIND_NUMBER);
         return number != nullptr ? number->operator unsigned int() : toUint32();
     }
     operator bool() const
     {
-        const Number* number = held<Number>(KIND_NUMBER);
+        const auto* number = held<Number>(KIND_NUMBER);
         return number != nullptr ? number->operator bool() : refuseBool();
     }
     operator Number() const
     {
-        const Number* number = held<Number>(KIND_NUMBER);
+        const auto* number = held<Number>(KIND_NUMBER);
         return number != nullptr ? *number : refuseNumber();
     }
     operator Version2() const
     {
-        const Number* number = held<Number>(KIND_NUMBER);
+        const auto* number = held<Number>(KIND_NUMBER);
         return number != nullptr ? number->operator Version2() : refuseVersion();
     }
     operator EnumValue() const
     {
-        const EnumValue* value = held<EnumValue>(KIND_ENUMVALUE);
+        const auto* value = held<EnumValue>(KIND_ENUMVALUE);
         return value != nullptr ? *value : refuseEnumValue();
     }
     operator Buffer() const
     {
-        const Buffer* bytes = held<Buffer>(KIND_BUFFER);
+        const auto* bytes = held<Buffer>(KIND_BUFFER);
         return bytes != nullptr ? *bytes : refuseBuffer();
     }
     operator NumberArray() const
     {
-        const NumberArray* numbers = held<NumberArray>(KIND_NUMBERARRAY);
+        const auto* numbers = held<NumberArray>(KIND_NUMBERARRAY);
         return numbers != nullptr ? *numbers : refuseNumberArray();
     }
     operator StringArray() const
     {
-        const StringArray* texts = held<StringArray>(KIND_STRINGARRAY);
+        const auto* texts = held<StringArray>(KIND_STRINGARRAY);
         return texts != nullptr ? *texts : refuseStringArray();
     }
 
-    // `int x = value;` would silently be a flag. Write `int x = IC::Number(value's number)`.
+    // `int x = value;` would silently be a flag. Write `int x = value.operator IC::Number();`.
     operator int() const = delete;
 
     // The text, as a fresh std::ostringstream writes it under the global locale; never refused.
@@ -247,12 +245,12 @@ bool operator==(const PropertyValue& a, const PropertyValue& b);
 bool operator!=(const PropertyValue& a, const PropertyValue& b);
 
 // Within one kind: numbers and enumerated values as Number and EnumValue do, refusals included; the others
-// lexicographically, bytes unsigned. Nothing is neither less nor greater than nothing.
+// lexicographically, bytes unsigned. Nothing is neither less nor greater than nothing. Different kinds are
+// refused with PropertyValueInvalidKind: what is logged (for > it begins with ">"), and below it what the
+// exception says.
 //
-//   refused            logged                                              thrown: PropertyValueInvalidKind
-//   the kinds differ   "<: cannot compare two different kinds of           "Cannot compare two different
-//   kinds
-//                       properties, kind1=2, kind2=1" (">: ...")            of properties"
+//     "<: cannot compare two different kinds of properties, kind1=2, kind2=1"
+//       "Cannot compare two different kinds of properties"
 bool operator<(const PropertyValue& a, const PropertyValue& b);
 bool operator>(const PropertyValue& a, const PropertyValue& b);
 
@@ -272,4 +270,6 @@ std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, Proper
 // "[1 = abc], [7 = {1, 2}]" in the order of the numbers, piece by piece. An empty map writes nothing.
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties);
 
-}  // namespace gnu::visibility("default")]]IC
+}  // namespace IC
+
+#pragma GCC visibility pop

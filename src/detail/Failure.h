@@ -23,11 +23,14 @@ struct Where {
     const std::string& category;
 };
 
-// Codes are written as numbers; those of one byte would print as characters.
+// Codes are written as numbers; those of one byte would print as characters. A function is asked for its
+// value.
 template <class T>
 decltype(auto) readable(const T& piece)
 {
-    if constexpr (std::is_enum_v<T> || std::is_same_v<T, unsigned char>)
+    if constexpr (std::is_invocable_v<T>)
+        return piece();
+    else if constexpr (std::is_enum_v<T> || std::is_same_v<T, unsigned char>)
         return static_cast<unsigned int>(piece);
     else
         return (piece);
@@ -39,7 +42,7 @@ const std::string& compose(VXLog::VXMessageBuffer& buffer, const char* literal, 
     return buffer.str(((buffer << literal) << ... << readable(pieces)));
 }
 
-// Writes both records. The pieces are read afresh for the second.
+// Writes both records. The pieces are held by reference and read afresh for the second.
 template <class... Pieces>
 void record(const Where& where, int level, const char* literal, const Pieces&... pieces)
 {

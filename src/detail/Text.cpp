@@ -1,6 +1,7 @@
 #include "detail/Text.h"
 
 #include <charconv>
+#include <cstdlib>
 #include <stdexcept>
 
 namespace IC::detail {
@@ -16,7 +17,7 @@ constexpr char digits[] = "0123456789abcdef";
 template <class T, class... Format>
 void Text::addNumber(T number, Format... format)
 {
-    if (locale() != std::locale::classic()) {
+    if (!classic()) {
         addStreamed(number);
         return;
     }
@@ -27,7 +28,13 @@ void Text::addNumber(T number, Format... format)
 
 void Text::add(int number)
 {
-    addNumber(number);
+    if (!classic()) {
+        addStreamed(number);
+        return;
+    }
+    if (number < 0)
+        text_ += '-';
+    add(static_cast<unsigned int>(std::abs(static_cast<long long>(number))));
 }
 
 void Text::add(unsigned int number)
@@ -60,8 +67,14 @@ void Text::addHex(std::string_view bytes)
 const std::locale& Text::locale()
 {
     if (!locale_)
-        locale_.emplace();
+        classic_ = locale_.emplace() == std::locale::classic();
     return *locale_;
+}
+
+bool Text::classic()
+{
+    locale();
+    return classic_;
 }
 
 const char* checked(const char* text)

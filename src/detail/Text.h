@@ -45,12 +45,14 @@ public:
 
 private:
     const std::locale& locale();
+    bool classic();
 
     template <class T, class... Format>
     void addNumber(T number, Format... format);
 
     std::string text_;
-    std::optional<std::locale> locale_;
+    std::optional<std::locale> locale_;  // the global one, once it has been asked for
+    bool classic_ = false;
 };
 
 // The text forms that containers write too.

@@ -9,9 +9,7 @@ namespace {
 // The length of the printable UTF-8 character at the start of `text`, or 0 where there is none.
 std::size_t printableLength(std::string_view text)
 {
-    const auto byte = [text](std::size_t i) {
-        return static_cast<unsigned char>(text[i]);
-    };
+    const auto byte = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };
     if (byte(0) < 0x80)
         return byte(0) >= 0x20 && byte(0) != 0x7F ? 1 : 0;
 

@@ -23,8 +23,8 @@ void writeLine(const Record& record)
     line += ' ' + std::to_string(record.level) + (trace ? " trace " : " ");
     line += printable(record.logger) + ' ' + printable(record.file) + ':' + std::to_string(record.line) + ' '
         + printable(record.function) + ": " + printable(record.message) + '\n';
-    // In one call, so that the lines of several threads do not mix.
-    std::fwrite(line.data(), 1, line.size(), stderr);
+    // In one call, so that the lines of several threads do not mix. There is nobody to tell of a failure.
+    static_cast<void>(std::fwrite(line.data(), 1, line.size(), stderr));
 }
 
 // The sink of the program. It is shared with the calls under way, which go on when it is replaced.

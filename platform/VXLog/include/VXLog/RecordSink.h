@@ -3,7 +3,9 @@
 #include <functional>
 #include <string>
 
-namespace [[gnu::visibility("default")]] VXLog {
+#pragma GCC visibility push(default)
+
+namespace VXLog {
 
 // One record on its way to a sink: the nine arguments of the logging call and which call it was.
 // It refers to the caller's texts and is good only during the call of the sink, so it cannot be copied;
@@ -43,4 +45,6 @@ using RecordSink = std::function<void(const Record&)>;
 // the level, only while the environment variable VXLOG_TRACE is set.
 RecordSink setRecordSink(RecordSink sink);
 
-}  // namespace gnu::visibility("default")]]VXLog
+}  // namespace VXLog
+
+#pragma GCC visibility pop

@@ -2,12 +2,13 @@
 
 #include <string>
 
-namespace [[gnu::visibility("default")]] VXLog {
+#pragma GCC visibility push(default)
+
+namespace VXLog {
 
 // Writes records: each call hands one to the current sink (RecordSink.h), on the calling thread. Any thread
 // may call at any time. What the sink throws reaches the caller.
-class [[gnu::visibility("default")]] VXLogger
-{
+class __attribute__((visibility("default"))) VXLogger {
 public:
     // `function` and `file` name the place in the source together with `line`; `logger` is the category.
     // `data`, `a` and `b` are handed on untouched.
@@ -19,4 +20,6 @@ public:
                                   int level, char* data, int a, int b, const std::string& message);
 };
 
-}  // namespace gnu::visibility("default")]]VXLog
+}  // namespace VXLog
+
+#pragma GCC visibility pop

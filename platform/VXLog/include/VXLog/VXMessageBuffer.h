@@ -4,14 +4,15 @@
 #include <sstream>
 #include <string>
 
-namespace [[gnu::visibility("default")]] VXLog {
+#pragma GCC visibility push(default)
+
+namespace VXLog {
 
 // Composes the text of a record: pieces go in with <<, the text comes out with str.
 //
 // Numbers are written in the classic locale, so that a record reads the same in every program. Where memory
 // runs out, the insertion throws std::bad_alloc; a text is never cut short. One buffer belongs to one thread.
-class [[gnu::visibility("default")]] VXMessageBuffer
-{
+class __attribute__((visibility("default"))) VXMessageBuffer {
 public:
     VXMessageBuffer();
     ~VXMessageBuffer();
@@ -27,8 +28,8 @@ public:
 
     // What was composed since the last call of str. The argument is what the last insertion returned. The
     // reference is good until the next call of str or the end of the buffer.
-    const std::string& str(std::ostream & last);
-    const std::string& str(VXMessageBuffer & last);
+    const std::string& str(std::ostream& last);
+    const std::string& str(VXMessageBuffer& last);
 
 private:
     const std::string& take();
@@ -44,4 +45,6 @@ std::ostream& operator<<(VXMessageBuffer& buffer, const T& piece)
     return static_cast<std::ostream&>(buffer) << piece;
 }
 
-}  // namespace gnu::visibility("default")]]VXLog
+}  // namespace VXLog
+
+#pragma GCC visibility pop

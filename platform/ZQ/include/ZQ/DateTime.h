@@ -3,7 +3,9 @@
 #include <iosfwd>
 #include <string>
 
-namespace [[gnu::visibility("default")]] ZQ {
+#pragma GCC visibility push(default)
+
+namespace ZQ {
 
 // A point in time: seconds since the epoch (UTC), milliseconds beside them, and a scope code.
 //
@@ -14,8 +16,7 @@ namespace [[gnu::visibility("default")]] ZQ {
 //   ZQ::DateTime time(1234567890, 3);
 //   time.setMillisecond(123);
 //   std::cout << time;                         // 2009-02-13T23:31:30.123Z
-class [[gnu::visibility("default")]] DateTime
-{
+class __attribute__((visibility("default"))) DateTime {
 public:
     // The epoch: 0 seconds, 0 milliseconds, scope 3.
     DateTime();
@@ -51,4 +52,6 @@ private:
 // Inserts std::string(time) as one text.
 std::ostream& operator<<(std::ostream& out, const DateTime& time);
 
-}  // namespace gnu::visibility("default")]]ZQ
+}  // namespace ZQ
+
+#pragma GCC visibility pop

@@ -2,12 +2,13 @@
 
 #include <mutex>
 
-namespace [[gnu::visibility("default")]] ZQ {
+#pragma GCC visibility push(default)
+
+namespace ZQ {
 
 // A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as often.
 // Every operation may be called from any thread.
-class [[gnu::visibility("default")]] Mutex
-{
+class __attribute__((visibility("default"))) Mutex {
 public:
     Mutex();
     ~Mutex();
@@ -26,4 +27,6 @@ private:
     std::recursive_timed_mutex mutex_;
 };
 
-}  // namespace gnu::visibility("default")]]ZQ
+}  // namespace ZQ
+
+#pragma GCC visibility pop

@@ -1,0 +1,141 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdlib>
+#include <new>
+#include <sstream>
+#include <string>
+
+#include <gtest/gtest.h>
+
+// Lets memory run out on purpose, and counts. It replaces the global operator new, so one source of a program
+// includes it. Everything here is about the calling thread alone.
+//
+// The observer allocates too. Where it must not fail (in unlock, which no caller expects to throw), the test
+// first gives its lists room by using them.
+namespace allocation {
+
+inline thread_local long allowedNow = -1;  // how many more allocations succeed; below 0: all
+inline thread_local long madeSoFar = 0;
+inline thread_local long aliveNow = 0;
+inline thread_local void (*onRelease)() = nullptr;  // called before each release of memory
+
+// Runs the operation with memory for so many allocations; every later one throws std::bad_alloc. Whether the
+// operation returned: false means that std::bad_alloc left it, other exceptions pass.
+template <class Operation>
+bool completesWith(long allowed, Operation operation)
+{
+    struct Limit {
+        explicit Limit(long count) { allowedNow = count; }
+        ~Limit() { allowedNow = -1; }
+    };
+    try {
+        const Limit limit(allowed);
+        operation();
+    } catch (const std::bad_alloc&) {
+        return false;
+    }
+    return true;
+}
+
+// How many allocations the operation makes.
+template <class Operation>
+long countOf(Operation operation)
+{
+    const long before = madeSoFar;
+    operation();
+    return madeSoFar - before;
+}
+
+// Expects the text form to throw std::bad_alloc or to be whole, whatever memory there is, and a stream to be
+// whole or bad.
+template <class Value>
+void expectTextWholeOrNotAtAll(const Value& value, const std::string& whole)
+{
+    long allowed = 0;
+    std::string text;
+    while (!completesWith(allowed, [&] { text = value.operator std::string(); }))
+        ASSERT_LT(++allowed, 1000);
+    EXPECT_EQ(text, whole) << "with memory for " << allowed << " allocations";
+    EXPECT_GT(allowed, 0) << "the text is too short to need memory";
+
+    for (allowed = 0;; ++allowed) {
+        ASSERT_LT(allowed, 1000);
+        std::ostringstream out;
+        const bool completed = completesWith(allowed, [&] { out << value; });
+        if (completed && out.good()) {
+            EXPECT_EQ(out.str(), whole) << "with memory for " << allowed << " allocations";
+            return;
+        }
+    }
+}
+
+}  // namespace allocation
+
+void* operator new(std::size_t size)
+{
+    if (allocation::allowedNow == 0)
+        throw std::bad_alloc();
+    void* const memory = std::malloc(size == 0 ? 1 : size);
+    if (memory == nullptr)
+        throw std::bad_alloc();
+    if (allocation::allowedNow > 0)
+        --allocation::allowedNow;
+    ++allocation::madeSoFar;
+    ++allocation::aliveNow;
+    return memory;
+}
+
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept
+{
+    try {
+        return ::operator new(size);
+    } catch (const std::bad_alloc&) {
+        return nullptr;
+    }
+}
+
+void* operator new[](std::size_t size)
+{
+    return ::operator new(size);
+}
+
+void* operator new[](std::size_t size, const std::nothrow_t& none) noexcept
+{
+    return ::operator new(size, none);
+}
+
+void operator delete(void* memory) noexcept
+{
+    if (memory == nullptr)
+        return;
+    if (allocation::onRelease != nullptr)
+        allocation::onRelease();
+    --allocation::aliveNow;
+    std::free(memory);
+}
+
+void operator delete(void* memory, std::size_t) noexcept
+{
+    ::operator delete(memory);
+}
+
+void operator delete(void* memory, const std::nothrow_t&) noexcept
+{
+    ::operator delete(memory);
+}
+
+void operator delete[](void* memory) noexcept
+{
+    ::operator delete(memory);
+}
+
+void operator delete[](void* memory, std::size_t) noexcept
+{
+    ::operator delete(memory);
+}
+
+void operator delete[](void* memory, const std::nothrow_t&) noexcept
+{
+    ::operator delete(memory);
+}

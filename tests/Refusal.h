@@ -1,0 +1,105 @@
+#pragma once
+
+#include <cstddef>
+#include <exception>
+#include <string>
+#include <typeinfo>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "observe/Platform.h"
+
+// What the tests of every class expect of a refusal: a log record, the same record again at trace level, and
+// then the exception.
+//
+// Including this header is enough for observe::reset() to run before each test, and for a check after each
+// test that no message buffer lives on and no lock is held.
+//
+//   expectRefusal<std::out_of_range>([&] { return static_cast<bool>(number); },
+//                                    "operator bool", "Number", "Vexilon.IC.Number",         // where
+//                                    "bool: Can't return current value as a Boolean, kind=2",  // logged
+//                                    "Can't return current value as a Boolean");               // what()
+//
+// A test file wraps this in a helper of its own that fills in file and category. That the object is unchanged
+// is for the caller to check. The line in the records is returned (0 when there was no record).
+//
+// expectRecordPair checks two neighbours among the records, for operations that write several pairs or that
+// write without throwing:
+//
+//   const auto records = observe::records();
+//   ASSERT_EQ(records.size(), 4u);
+//   expectRecordPair(records, 0, "setProperty", "Node", "Vexilon.IC.Node", 3000, "setProperty: 7 true");
+//   expectRecordPair(records, 2, "setProperty", "Node", "Vexilon.IC.Node", 6000, "setProperty: 7 read-only");
+
+// Expects records[first] to be a log record and records[first + 1] its trace record, with these fields, and
+// null, 0 and 0 in between. Returns their line.
+inline int expectRecordPair(const std::vector<observe::Record>& records, std::size_t first,
+                            const std::string& function, const std::string& file, const std::string& category,
+                            int level, const std::string& message)
+{
+    if (records.size() < first + 2) {
+        ADD_FAILURE() << "no records " << first << " and " << first + 1 << " for: " << message;
+        return 0;
+    }
+    for (const bool trace : {false, true}) {
+        SCOPED_TRACE(trace ? "trace record" : "log record");
+        const observe::Record& record = records[first + (trace ? 1 : 0)];
+        EXPECT_EQ(record.trace, trace);
+        EXPECT_EQ(record.function, function);
+        EXPECT_EQ(record.file, file);
+        EXPECT_GT(record.line, 0);
+        EXPECT_EQ(record.logger, category);
+        EXPECT_EQ(record.level, level);
+        EXPECT_EQ(record.data, nullptr);
+        EXPECT_EQ(record.a, 0);
+        EXPECT_EQ(record.b, 0);
+        EXPECT_EQ(record.message, message);
+    }
+    EXPECT_EQ(records[first].line, records[first + 1].line);
+    return records[first].line;
+}
+
+// Expects the operation to write exactly one such pair of level 6000 and to throw exactly this exception: a
+// class derived from it will not do.
+template <class Exception, class Operation>
+int expectRefusal(Operation operation, const std::string& function, const std::string& file,
+                  const std::string& category, const std::string& logged, const std::string& sentence)
+{
+    const std::size_t before = observe::records().size();
+    try {
+        static_cast<void>(operation());
+        ADD_FAILURE() << "nothing was thrown; expected: " << sentence;
+    } catch (const Exception& exception) {
+        EXPECT_TRUE(typeid(exception) == typeid(Exception)) << typeid(exception).name();
+        EXPECT_EQ(std::string(exception.what()), sentence);
+    } catch (const std::exception& other) {
+        ADD_FAILURE() << "another exception was thrown: " << typeid(other).name() << ": " << other.what();
+    } catch (...) {
+        ADD_FAILURE() << "another exception was thrown; expected: " << sentence;
+    }
+    const std::vector<observe::Record> records = observe::records();
+    EXPECT_EQ(records.size(), before + 2) << "records written by the refusal: " << records.size() - before;
+    return expectRecordPair(records, before, function, file, category, 6000, logged);
+}
+
+class ObserveEachTest : public testing::EmptyTestEventListener {
+public:
+    // Appended before main runs; GoogleTest owns and deletes it.
+    static bool append()
+    {
+        testing::UnitTest::GetInstance()->listeners().Append(new ObserveEachTest);
+        return true;
+    }
+
+private:
+    void OnTestStart(const testing::TestInfo&) override { observe::reset(); }
+
+    void OnTestEnd(const testing::TestInfo&) override
+    {
+        EXPECT_EQ(observe::buffersAlive(), 0);
+        EXPECT_EQ(observe::locksHeld(), 0);
+    }
+};
+
+inline const bool everyTestIsObserved = ObserveEachTest::append();

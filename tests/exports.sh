@@ -1,0 +1,28 @@
+#!/bin/sh
+# Fails unless the library given exports its public names and nothing else.
+set -eu
+library=$1
+[ -f "$library" ] || { echo "no library $library" >&2; exit 1; }
+
+exported=$(nm --dynamic --defined-only --demangle --format=posix "$library" | sed 's/ [A-Za-z] [0-9a-f]* *[0-9a-f]*$//')
+status=0
+
+# What must not be there: other namespaces, and the library's own inside.
+foreign=$(echo "$exported" | grep -vE '^((typeinfo|typeinfo name|vtable) for )?IC::' || true)
+inside=$(echo "$exported" | grep -E 'IC::detail|logger' || true)
+if [ -n "$foreign$inside" ]; then
+    echo "exported, but not public:" "$foreign" "$inside" >&2
+    status=1
+fi
+
+# What must be there, once for each kind of name.
+for name in 'IC::pst' 'IC::pB' 'IC::Number::setKind' 'IC::EnumValue::operator std::' 'IC::PropertyValue::setKind' \
+    'IC::Error::Error' 'IC::Alert::hexstring' 'IC::Node::Node' 'IC::operator<<' 'IC::operator==' \
+    'typeinfo for IC::ICException' 'typeinfo for IC::PropertyValueInvalidKind' \
+    'typeinfo for IC::NodeInvalidSensor' 'typeinfo for IC::Node' 'vtable for IC::Node'; do
+    if ! echo "$exported" | grep -qF "$name"; then
+        echo "not exported: $name" >&2
+        status=1
+    fi
+done
+exit $status

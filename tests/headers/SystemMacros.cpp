@@ -1,0 +1,13 @@
+// Systems define these, as functions or as names; the header leaves them as they were.
+#define major(device) static_cast<int>((device) >> 8)
+#define minor 17
+
+#include "IC/Number.h"
+
+static_assert(major(0x1234) == 0x12);
+static_assert(minor == 17);
+#undef major
+#undef minor
+
+static_assert(IC::Version2 {1, 2}.major == 1);
+static_assert(IC::Version2 {1, 2}.minor == 2);

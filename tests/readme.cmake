@@ -1,0 +1,13 @@
+# The README shows the program as it is in examples/ and what it prints, and the program prints it.
+#
+#   README, SOURCE, PROGRAM    the page, the program's source, the program built from it
+file(READ ${README} readme)
+file(READ ${SOURCE} source)
+execute_process(COMMAND ${PROGRAM} OUTPUT_VARIABLE output ERROR_QUIET COMMAND_ERROR_IS_FATAL ANY)
+
+foreach(shown "```cpp\n${source}```" "```text\n${output}```")
+    string(FIND "${readme}" "${shown}" position)
+    if(position EQUAL -1)
+        message(FATAL_ERROR "${README} does not show\n${shown}")
+    endif()
+endforeach()
