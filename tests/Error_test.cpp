@@ -61,22 +61,11 @@ struct Constructor {
 std::vector<Constructor> constructors()
 {
     return {
-        {"number, status",
-         [](unsigned char status) {
-             return Error(Number(17u), status);
-         }},
+        {"number, status", [](unsigned char status) { return Error(Number(17u), status); }},
         {"status, number, message",
-         [](unsigned char status) {
-             return Error(status, Number(17u), std::string("a message"));
-         }},
-        {"characters, status",
-         [](unsigned char status) {
-             return Error("a message", status);
-         }},
-        {"string, status",
-         [](unsigned char status) {
-             return Error(std::string("a message"), status);
-         }},
+         [](unsigned char status) { return Error(status, Number(17u), std::string("a message")); }},
+        {"characters, status", [](unsigned char status) { return Error("a message", status); }},
+        {"string, status", [](unsigned char status) { return Error(std::string("a message"), status); }},
     };
 }
 
