@@ -72,7 +72,8 @@ void expectTextWholeOrNotAtAll(const Value& value, const std::string& whole)
 
 }  // namespace allocation
 
-void* operator new(std::size_t size)
+// Never inlined: the compiler would see free() on what came from operator new, and warn.
+[[gnu::noinline]] void* operator new(std::size_t size)
 {
     if (allocation::allowedNow == 0)
         throw std::bad_alloc();
@@ -105,7 +106,7 @@ void* operator new[](std::size_t size, const std::nothrow_t& none) noexcept
     return ::operator new(size, none);
 }
 
-void operator delete(void* memory) noexcept
+[[gnu::noinline]] void operator delete(void* memory) noexcept
 {
     if (memory == nullptr)
         return;

@@ -521,6 +521,7 @@ TEST(NumberInitKind, ARefusedKindStaysStoredAndTheValueIsKept)
         observe::onRecord([&](const observe::Record&) { EXPECT_EQ(number.getKind(), row.code); });
         expectNumberRefusal<std::invalid_argument>([&] { number.initKind(kind(row.code)); }, "initKind",
                                                    row.logged, "Invalid kind of number");
+        observe::onRecord(nullptr);
         EXPECT_EQ(number.getKind(), row.code);
         EXPECT_EQ(to<unsigned int>(withKind(number, 3)), 7u);
         EXPECT_EQ(parts(to<sNodeRef>(withKind(number, 10))), parts(sNodeRef {0, 0}));

@@ -185,8 +185,6 @@ TEST(Mutex, IsReEntrantAndHeldUntilUnlockedAsOften)
     };
     EXPECT_TRUE(mutex.lock(0xFFFFFFFF));
     EXPECT_TRUE(mutex.lock(0));
-    EXPECT_TRUE(mutex.lock(10));
-    mutex.unlock();
     mutex.unlock();
     EXPECT_FALSE(freeForAnother());
     mutex.unlock();
@@ -197,6 +195,10 @@ TEST(Mutex, GivesUpAfterTheTimeOut)
 {
     ZQ::Mutex mutex;
     ASSERT_TRUE(mutex.lock(0xFFFFFFFF));
+#ifndef __SANITIZE_THREAD__  // ThreadSanitizer does not see a lock with a time-out, only its unlock
+    ASSERT_TRUE(mutex.lock(10));
+    mutex.unlock();
+#endif
     std::thread([&mutex] {
         const auto start = std::chrono::steady_clock::now();
         EXPECT_FALSE(mutex.lock(50));

@@ -77,7 +77,7 @@ DateTime::operator long() const
 DateTime::operator std::string() const
 {
     if (seconds_ < firstSecond || seconds_ > lastSecond)
-        return "@" + std::to_string(seconds_);
+        return std::string("@").append(std::to_string(seconds_));
 
     // Counted from the year 400 before year 0, so that nothing below is negative.
     constexpr long long daysToMarch = 146097 - 60;

@@ -15,6 +15,8 @@ Mutex::~Mutex() = default;
 
 bool Mutex::lock(unsigned int timeoutMilliseconds)
 {
+    if (timeoutMilliseconds == 0)
+        return mutex_.try_lock();
     if (timeoutMilliseconds != forEver)
         return mutex_.try_lock_for(std::chrono::milliseconds(timeoutMilliseconds));
     mutex_.lock();

@@ -1,0 +1,82 @@
+// Runs a program as a user would: what it wrote, where, and how it ended.
+#pragma once
+
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string>
+#include <vector>
+
+// A folder that goes with the test.
+class Folder {
+public:
+    Folder()
+    {
+        std::string name = (std::filesystem::temp_directory_path() / "inventoryXXXXXX").string();
+        if (mkdtemp(name.data()) == nullptr)
+            throw std::runtime_error("no temporary folder");
+        path_ = name;
+    }
+    ~Folder() { std::filesystem::remove_all(path_); }
+    Folder(const Folder&) = delete;
+    Folder& operator=(const Folder&) = delete;
+
+    std::string path(const std::string& name) const { return (path_ / name).string(); }
+
+    std::string write(const std::string& name, const std::string& text) const
+    {
+        std::ofstream file(path_ / name, std::ios::binary);
+        if (!(file << text).flush())
+            throw std::runtime_error("cannot write " + path(name));
+        return path(name);
+    }
+
+private:
+    std::filesystem::path path_;
+};
+
+inline std::string contentOf(const std::string& name)
+{
+    std::ifstream file(name, std::ios::binary);
+    if (!file)
+        throw std::runtime_error("cannot read " + name);
+    std::stringstream content;
+    content << file.rdbuf();
+    return content.str();
+}
+
+struct Outcome {
+    int status;
+    std::string out;
+    std::string err;
+};
+
+inline Outcome runProgram(const std::vector<std::string>& words)
+{
+    const Folder folder;
+    std::string command;
+    for (const std::string& word : words) {
+        command += '\'';
+        for (const char character : word)
+            command += character == '\'' ? "'\\''" : std::string(1, character);
+        command += "' ";
+    }
+    command += ">'" + folder.path("out") + "' 2>'" + folder.path("err") + "'";
+    const int status = std::system(command.c_str());
+    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentOf(folder.path("out")),
+            contentOf(folder.path("err"))};
+}
+
+inline std::vector<std::string> linesOf(const std::string& text)
+{
+    std::vector<std::string> lines;
+    std::istringstream stream(text);
+    for (std::string line; std::getline(stream, line);)
+        lines.push_back(line);
+    return lines;
+}
