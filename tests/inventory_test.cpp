@@ -378,7 +378,6 @@ TEST(InventoryNodes, HoldEveryKindOfValue)
                 static_cast<double>(static_cast<long>(ZQ::DateTime::now())), 60);
     EXPECT_THAT(property(machine, KEY_OTHER_FACTS).operator IC::StringArray(),
                 testing::Contains("HostName=here"));
-    EXPECT_THAT(property(machine, KEY_SOURCES).operator IC::StringArray(), ElementsAre("Synthetic"));
     EXPECT_EQ(property(machine, KEY_USABLE), IC::PropertyValue(IC::Number(true)));
 
     EXPECT_EQ(std::string(property(nodeAt(inventory, "/machine/planar"), KEY_ASSET_TAG)), "N/A");
@@ -550,6 +549,18 @@ TEST(InventoryExports, WithMissingAttributesAreRead)
     expectSound(inventory);
     EXPECT_EQ(std::string(property(nodeAt(inventory, "/machine/display-ffff:ff:1f.7"), KEY_LINK_SPEED)),
               "not a number");
+}
+
+TEST(InventoryExports, MayHoldCodesThatHwlocDoesNotKnow)
+{
+    for (const char* code : {"-1", "6", "77", "99999999999", "block"}) {
+        SCOPED_TRACE(code);
+        std::string xml = synthetic("pack:1 l2:1 core:1 pu:1");
+        replace(xml, "cache_type=\"0\"", std::string("cache_type=\"") + code + "\"");
+        xml.insert(xml.rfind("</object>"),
+                   std::string("<object type=\"OSDev\" name=\"x\" osdev_type=\"") + code + "\"/>");
+        expectSound(readExport(xml));
+    }
 }
 
 TEST(InventoryExports, MayHoldThousandsOfObjectsAndNestDeeply)

@@ -1,0 +1,255 @@
+// What each node class takes from its object, and the names of the properties.
+#include "nodes.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <iterator>
+
+#include "mapping.h"
+#include "values.h"
+
+namespace inventory {
+
+namespace {
+
+// clang-format off
+const char* const keyNames[] = {
+    "this node", "parent node", "name", "label (the operator's own)", "number given by the system",
+    "the system may use it", "subtype", "other facts", "read at", "version of the source", "maker", "model",
+    "revision", "version", "released", "serial number", "asset tag", "part number", "UUID", "location",
+    "chassis type (as DMI counts: 17 main server, 23 rack mount)", "CPUs", "cores", "hardware threads",
+    "numbers of the hardware threads", "frequency, at most, MHz", "capacity (1024: fastest core)",
+    "size in bytes", "level", "cache kind (0 unified, 1 data, 2 instructions)", "line size in bytes",
+    "ways (-1: fully associative)", "inclusive", "page sizes in bytes", "numbers of pages", "PCI address",
+    "PCI class", "PCI maker and device", "link speed, GB/s", "sector size in bytes", "device number",
+    "address", "port", "port state (as InfiniBand counts: 4 active)", "port local id", "port global id",
+    "node GUID", "reading", "unit", "lower limit", "lower critical limit", "upper limit",
+    "upper critical limit", "alarm", "fault", "chip"};
+// clang-format on
+static_assert(std::size(keyNames) == KEY_LAST);
+
+// The library takes unsigned long long, which hwloc's 64-bit type is not on every machine.
+IC::Number number64(hwloc_uint64_t number)
+{
+    return ZQ::Uint64 {number};
+}
+
+IC::Number number32(int number)
+{
+    return static_cast<ZQ::Uint32>(std::max(number, 0));
+}
+
+IC::Number now()
+{
+    // Whole seconds: the text of a date-time is made for those.
+    return {static_cast<long>(ZQ::DateTime::now()), 0};
+}
+
+}  // namespace
+
+const char* nameOf(unsigned int key)
+{
+    return key >= 1 && key <= KEY_LAST ? keyNames[key - 1] : "";
+}
+
+Component::Component(const Site& site) : Node(site.sensor)
+{
+    path = site.path;
+    parent = site.parent;
+    put(KEY_SELF, IC::Number(site.self));
+    if (!parent.empty())
+        put(KEY_PARENT, IC::Number(site.above));
+    put(KEY_LABEL, std::string(), false);  // for the operator to write
+
+    const hwloc_obj_t object = site.object;
+    if (object == nullptr)
+        return;
+    const bool ofMachine = object->type == HWLOC_OBJ_MACHINE;
+    addFacts(object->infos, object->infos_count, ofMachine);
+    if (ofMachine && site.sensor != SENSOR_COMPUTER)
+        return;  // the rest is about the machine, not about a part of it
+    if (object->name != nullptr)
+        put(KEY_NAME, std::string(object->name));
+    if (object->subtype != nullptr)
+        put(KEY_SUBTYPE, std::string(object->subtype));
+    if (object->os_index != HWLOC_UNKNOWN_INDEX)
+        put(KEY_INDEX, IC::Number(object->os_index));
+
+    const bool isMemory = hwloc_obj_type_is_memory(object->type) != 0;
+    const auto all = isMemory ? object->complete_nodeset : object->complete_cpuset;
+    if (all != nullptr && hwloc_bitmap_iszero(all) == 0) {
+        const auto allowed = isMemory ? hwloc_topology_get_allowed_nodeset(site.topology)
+                                      : hwloc_topology_get_allowed_cpuset(site.topology);
+        const bool usable = hwloc_bitmap_intersects(all, allowed) != 0;
+        put(KEY_USABLE, IC::Number(usable));
+        become(usable ? STATUS_FINE : STATUS_NOT_USABLE);
+    }
+    const int weight = object->cpuset == nullptr ? -1 : hwloc_bitmap_weight(object->cpuset);
+    if (weight < 0)
+        return;  // also a set without end, which no machine has
+    IC::NumberArray threads;
+    for (int thread = -1; (thread = hwloc_bitmap_next(object->cpuset, thread)) != -1;)
+        threads.push_back(number32(thread));
+    put(KEY_THREADS, number32(weight));
+    put(KEY_CPU_SET, threads);
+}
+
+void Component::addFacts(const hwloc_info_s* facts, unsigned int number, bool ofMachine)
+{
+    IC::StringArray others;
+    if (const auto found = properties.find(KEY_OTHER_FACTS); found != properties.end())
+        others = found->second;
+    for (unsigned int i = 0; i < number; ++i) {
+        const Fact fact = factOf(facts[i]);
+        if (ofMachine && fact.part != getSensor())
+            continue;
+        if (fact.key == KEY_OTHER_FACTS || !properties.insert({fact.key, fact.value}).second)
+            others.push_back(std::string(facts[i].name) + '=' + facts[i].value);  // or told twice
+    }
+    if (!others.empty())
+        put(KEY_OTHER_FACTS, others);
+}
+
+std::string Component::words(Key key) const
+{
+    const auto found = properties.find(key);
+    return found == properties.end() ? "" : told(std::string(found->second));
+}
+
+void Component::describe(const std::vector<std::string>& pieces)
+{
+    for (const std::string& piece : pieces)
+        if (!piece.empty())
+            description += (description.empty() ? "" : ", ") + piece;
+}
+
+std::string Component::product() const
+{
+    const std::string maker = words(KEY_MAKER);
+    const std::string model = words(KEY_MODEL);
+    // Some models begin with the maker's name.
+    return maker.empty() || model.compare(0, maker.size(), maker) == 0 ? model : told(maker + ' ' + model);
+}
+
+std::string Component::size() const
+{
+    const auto found = properties.find(KEY_SIZE);
+    const ZQ::Uint64 bytes = found == properties.end() ? 0 : found->second.operator ZQ::Uint64();
+    return bytes == 0 ? "" : sizeInWords(bytes);
+}
+
+Machine::Machine(const Site& site) : Component(site)
+{
+    put(KEY_READ_AT, now());
+    put(KEY_SIZE, number64(site.object->total_memory));
+    put(KEY_CPUS, number32(hwloc_get_nbobjs_by_type(site.topology, HWLOC_OBJ_PACKAGE)));
+    put(KEY_CORES, number32(hwloc_get_nbobjs_by_type(site.topology, HWLOC_OBJ_CORE)));
+    describe({product(), "CPUs: " + words(KEY_CPUS), "cores: " + words(KEY_CORES), "memory: " + size()});
+}
+
+MachinePart::MachinePart(const Site& site) : Component(site)
+{
+    if (const auto number = version(words(KEY_REVISION)))
+        put(KEY_VERSION, IC::Number(*number));
+    describe({told(product() + ' ' + words(KEY_REVISION)), words(KEY_RELEASED).substr(0, 10)});  // the day
+}
+
+Processor::Processor(const Site& site) : Component(site)
+{
+    put(KEY_CORES,
+        number32(hwloc_get_nbobjs_inside_cpuset_by_type(site.topology, site.object->cpuset, HWLOC_OBJ_CORE)));
+    describe({words(KEY_MODEL), "cores: " + words(KEY_CORES)});
+}
+
+Core::Core(const Site& site) : Component(site)
+{
+    // Facts of all the cores of its kind.
+    hwloc_info_s* facts = nullptr;
+    unsigned int number = 0;
+    const int kind = hwloc_cpukinds_get_by_cpuset(site.topology, site.object->cpuset, 0);
+    if (kind >= 0)
+        hwloc_cpukinds_get_info(site.topology, static_cast<unsigned int>(kind), nullptr, nullptr, &number,
+                                &facts, 0);
+    addFacts(facts, number, false);
+    const auto allowed = hwloc_topology_get_allowed_cpuset(site.topology);
+    if (status == STATUS_INITIAL && hwloc_bitmap_isincluded(site.object->complete_cpuset, allowed) == 0)
+        become(STATUS_PARTLY_USABLE);
+    const std::string frequency = words(KEY_FREQUENCY);
+    describe({"number " + words(KEY_INDEX), "threads: " + words(KEY_THREADS),
+              frequency.empty() ? "" : frequency + " MHz"});
+}
+
+Cache::Cache(const Site& site) : Component(site)
+{
+    const auto& cache = site.object->attr->cache;
+    const unsigned int kind = codeOf(cache.type);
+    put(KEY_SIZE, number64(cache.size));
+    put(KEY_LEVEL, IC::Number(cache.depth));
+    put(KEY_CACHE_KIND, IC::EnumValue(kind));
+    put(KEY_LINE_SIZE, IC::Number(cache.linesize));
+    put(KEY_WAYS, IC::Number(cache.associativity));
+    describe({size(),
+              kind == HWLOC_OBJ_CACHE_DATA              ? "data"
+                  : kind == HWLOC_OBJ_CACHE_INSTRUCTION ? "instructions"
+                                                        : ""});
+}
+
+MemoryArray::MemoryArray(const Site& site) : Component(site)
+{
+    const auto& memory = site.object->attr->numanode;
+    IC::NumberArray sizes;
+    IC::NumberArray counts;
+    for (unsigned int i = 0; i < memory.page_types_len; ++i) {
+        sizes.push_back(number64(memory.page_types[i].size));
+        counts.push_back(number64(memory.page_types[i].count));
+    }
+    put(KEY_SIZE, number64(memory.local_memory));
+    put(KEY_PAGE_SIZES, sizes);
+    put(KEY_PAGE_COUNTS, counts);
+    describe({size()});
+}
+
+MemoryModule::MemoryModule(const Site& site) : Component(site)
+{
+    if (size().empty())
+        become(STATUS_SIZE_UNKNOWN);
+    describe({words(KEY_PART_NUMBER), size()});
+}
+
+PciDevice::PciDevice(const Site& site) : Component(site)
+{
+    const auto& device = site.object->attr->pcidev;
+    char ids[16];
+    std::snprintf(ids, sizeof ids, "%04hx:%04hx", device.vendor_id, device.device_id);
+    const double speed = device.linkspeed;
+    put(KEY_PCI_ADDRESS, pciAddress(site.object));
+    put(KEY_PCI_CLASS, IC::EnumValue(device.class_id));
+    put(KEY_PCI_DEVICE, std::string(ids));
+    put(KEY_LINK_SPEED,
+        speed > 0 && std::isfinite(speed) ? IC::Number(speed) : IC::Number(IC::Number::KIND_NAN));
+    describe({product().empty() ? ids : product()});
+}
+
+std::string pciAddress(hwloc_obj_t object)
+{
+    const auto& device = object->attr->pcidev;
+    char text[24];
+    std::snprintf(text, sizeof text, "%04hx:%02hhx:%02hhx.%hhx", device.domain, device.bus, device.dev,
+                  device.func);
+    return text;
+}
+
+Slot::Slot(const Site& site, const std::string& name) : Component(site)
+{
+    put(KEY_LOCATION, name);
+}
+
+Device::Device(const Site& site) : Component(site)
+{
+    // As it was told: with colons it reads better than the property's text.
+    const char* address = hwloc_obj_get_info_by_name(site.object, "Address");
+    describe({product(), size(), address == nullptr ? "" : told(address)});
+}
+
+}  // namespace inventory

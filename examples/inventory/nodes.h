@@ -1,0 +1,99 @@
+// The node classes of the inventory, the numbers of their properties and what their status means.
+#pragma once
+
+#include <hwloc.h>
+
+#include <cstring>
+#include <string>
+#include <type_traits>
+#include <vector>
+
+#include "IC/Node.h"
+
+namespace inventory {
+
+// The numbers of the properties, from 1. The table of their names, in nodes.cpp, says what each holds.
+// clang-format off
+enum Key : unsigned int {
+    KEY_SELF = 1, KEY_PARENT, KEY_NAME, KEY_LABEL, KEY_INDEX, KEY_USABLE, KEY_SUBTYPE, KEY_OTHER_FACTS,
+    KEY_READ_AT, KEY_SOURCE_VERSION, KEY_MAKER, KEY_MODEL, KEY_REVISION, KEY_VERSION, KEY_RELEASED,
+    KEY_SERIAL_NUMBER, KEY_ASSET_TAG, KEY_PART_NUMBER, KEY_UUID, KEY_LOCATION, KEY_CHASSIS_TYPE, KEY_CPUS,
+    KEY_CORES, KEY_THREADS, KEY_CPU_SET, KEY_FREQUENCY, KEY_CAPACITY, KEY_SIZE, KEY_LEVEL, KEY_CACHE_KIND,
+    KEY_LINE_SIZE, KEY_WAYS, KEY_INCLUSIVE, KEY_PAGE_SIZES, KEY_PAGE_COUNTS, KEY_PCI_ADDRESS,
+    KEY_PCI_CLASS, KEY_PCI_DEVICE, KEY_LINK_SPEED, KEY_SECTOR_SIZE, KEY_DEVICE_NUMBER, KEY_ADDRESS,
+    KEY_PORT, KEY_PORT_STATE, KEY_PORT_LID, KEY_PORT_GID, KEY_NODE_GUID, KEY_READING, KEY_UNIT,
+    KEY_LOWER_LIMIT, KEY_LOWER_CRITICAL, KEY_UPPER_LIMIT, KEY_UPPER_CRITICAL, KEY_ALARM, KEY_FAULT,
+    KEY_CHIP, KEY_LAST = KEY_CHIP
+};
+
+// What a node's status says; above 0 something is not right.
+enum Status : unsigned int {
+    STATUS_FINE, STATUS_NOT_USABLE, STATUS_PARTLY_USABLE, STATUS_SIZE_UNKNOWN, STATUS_OUTSIDE_LIMITS,
+    STATUS_ALARM, STATUS_FAULT
+};
+// clang-format on
+
+const char* nameOf(unsigned int key);
+
+// What a node is made from.
+struct Site {
+    IC::Node::SensorType sensor = IC::Node::SENSOR_UNKNOWN;
+    std::string path;
+    std::string parent;
+    IC::NodeRef self {};  // how other nodes refer to this one, and to its parent
+    IC::NodeRef above {};
+    hwloc_topology_t topology = nullptr;
+    hwloc_obj_t object = nullptr;  // null for what hwloc does not know
+};
+
+// What all nodes here have in common, and what hwloc tells about any object: name, number, threads, whether
+// the system may use it, facts.
+class Component : public IC::Node {
+public:
+    explicit Component(const Site& site);
+
+protected:
+    template <class T>
+    void put(Key key, const T& value, bool readOnly = true)
+    {
+        // PropertyValue takes a bare number for the code of a kind.
+        static_assert(!std::is_arithmetic_v<T> && !std::is_enum_v<T>, "write IC::Number or IC::EnumValue");
+        properties.insert_or_assign(key, IC::PropertyValue(value, readOnly));
+    }
+    void become(Status newStatus) { status = static_cast<StatusType>(newStatus); }
+    void addFacts(const hwloc_info_s* facts, unsigned int count, bool ofMachine);
+    // Sets the description; pieces that say nothing are left out.
+    void describe(const std::vector<std::string>& pieces);
+
+    std::string words(Key key) const;  // the property's text, "" if there is none
+    std::string product() const;       // maker and model
+    std::string size() const;
+};
+
+// clang-format off
+struct Machine : Component { explicit Machine(const Site& site); };
+struct MachinePart : Component { explicit MachinePart(const Site& site); };  // chassis, planar, BIOS, system
+struct Processor : Component { explicit Processor(const Site& site); };      // also a die, a group of cores
+struct Core : Component { explicit Core(const Site& site); };
+struct Cache : Component { explicit Cache(const Site& site); };
+struct MemoryArray : Component { explicit MemoryArray(const Site& site); };
+struct MemoryModule : Component { explicit MemoryModule(const Site& site); };
+struct PciDevice : Component { explicit PciDevice(const Site& site); };
+struct Slot : Component { Slot(const Site& site, const std::string& name); };
+struct Device : Component { explicit Device(const Site& site); };  // as the operating system names it
+// clang-format on
+
+std::string pciAddress(hwloc_obj_t object);  // "0000:02:00.0"
+
+// The code in one of hwloc's enumerations. hwloc stores what an export says, also what the enumeration cannot
+// hold; read as what it is, such a value would be undefined behaviour.
+template <class Enumeration>
+unsigned int codeOf(const Enumeration& value)
+{
+    unsigned int code = 0;
+    static_assert(sizeof code == sizeof value);
+    std::memcpy(&code, &value, sizeof code);
+    return code;
+}
+
+}  // namespace inventory

@@ -1,0 +1,132 @@
+// How numbers, sizes, versions, dates and addresses are written in texts of others.
+#include "values.h"
+
+#include <charconv>
+#include <cmath>
+#include <cstdio>
+#include <ctime>
+
+namespace inventory {
+
+namespace {
+
+std::string_view trimmed(std::string_view text)
+{
+    constexpr std::string_view blanks = " \t\r\n";
+    const auto first = text.find_first_not_of(blanks);
+    return first == text.npos ? "" : text.substr(first, text.find_last_not_of(blanks) - first + 1);
+}
+
+// Takes a number off the front of the text.
+template <class T>
+std::optional<T> take(std::string_view& text, int base = 10)
+{
+    const auto digits = text.substr(0, text.find_first_not_of("0123456789abcdefABCDEF"));
+    T number = 0;
+    const auto [end, error] = std::from_chars(digits.data(), digits.data() + digits.size(), number, base);
+    if (error != std::errc())
+        return {};
+    text.remove_prefix(static_cast<std::size_t>(end - digits.data()));
+    return number;
+}
+
+}  // namespace
+
+std::optional<ZQ::Uint32> count(std::string_view text)
+{
+    text = trimmed(text);
+    const bool isHexadecimal = text.substr(0, 2) == "0x";
+    text.remove_prefix(isHexadecimal ? 2 : 0);
+    const auto number = take<ZQ::Uint32>(text, isHexadecimal ? 16 : 10);
+    return text.empty() ? number : std::nullopt;
+}
+
+std::optional<double> realNumber(std::string_view text)
+{
+    text = trimmed(text);
+    double number = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    if (error != std::errc() || end != text.data() + text.size() || !std::isfinite(number))
+        return {};
+    return number;
+}
+
+std::optional<ZQ::Uint64> sizeInBytes(std::string_view text)
+{
+    // Makers of memory count in powers of two, however they write the unit.
+    static const struct Unit {
+        std::string_view name;
+        unsigned int shift;
+    } units[] = {{"", 10},    {"B", 0},   {"kB", 10},  {"KB", 10}, {"KiB", 10}, {"MB", 20},
+                 {"MiB", 20}, {"GB", 30}, {"GiB", 30}, {"TB", 40}, {"TiB", 40}};
+    text = trimmed(text);
+    const auto number = take<ZQ::Uint64>(text);
+    for (const Unit& unit : units)
+        if (number && trimmed(text) == unit.name && *number <= ~ZQ::Uint64 {0} >> unit.shift)
+            return *number << unit.shift;
+    return {};
+}
+
+std::optional<IC::Version2> version(std::string_view text)
+{
+    const auto major = take<ZQ::Uint8>(text);
+    if (!major || text.empty() || text.front() != '.')
+        return {};
+    text.remove_prefix(1);
+    const auto minor = take<ZQ::Uint8>(text);
+    return minor ? std::optional(IC::Version2 {*major, *minor}) : std::nullopt;
+}
+
+std::optional<ZQ::DateTime> date(const std::string& text)
+{
+    std::tm day {};
+    const char* end = strptime(text.c_str(), "%m/%d/%Y", &day);
+    if (end == nullptr || *end != '\0')
+        return {};
+    constexpr unsigned int scope = 3;
+    return ZQ::DateTime(timegm(&day), scope);
+}
+
+std::optional<IC::Buffer> address(std::string_view text)
+{
+    IC::Buffer bytes;
+    while (!text.empty()) {
+        std::string_view pair = text.substr(0, 2);
+        const auto byte = take<ZQ::Uint8>(pair, 16);
+        if (!byte || !pair.empty() || text.size() < 2)
+            return {};
+        bytes.push_back(*byte);
+        text.remove_prefix(text.size() > 3 && text[2] == ':' ? 3 : 2);
+    }
+    return bytes.empty() ? std::nullopt : std::optional(bytes);
+}
+
+std::string told(std::string_view text)
+{
+    text = trimmed(text);
+    const bool nothing = text == "N/A" || text == "None" || text == "NONE";
+    return nothing ? std::string() : std::string(text);
+}
+
+std::string sizeInWords(ZQ::Uint64 bytes)
+{
+    static const char* const units[] = {"bytes", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"};
+    auto size = static_cast<double>(bytes);
+    std::size_t unit = 0;
+    for (; size >= 1024; ++unit)
+        size /= 1024;
+    char text[32];
+    std::snprintf(text, sizeof text, "%.4g %s", size, units[unit]);
+    return text;
+}
+
+std::string printable(std::string_view text)
+{
+    std::string out;
+    for (const char character : text)
+        out += character >= ' ' && character <= '~' ? std::string(1, character)
+                                                    : "\\x" + IC::pB(static_cast<unsigned char>(character));
+    return out;
+}
+
+}  // namespace inventory
