@@ -391,42 +391,17 @@ const struct {
     void (*operation)();
 } refusals[] = {
     {"Number: a literal alone", 7,
-     [] {
-         static_cast<void>(Number(Number::KIND_NAN) < Number(Number::KIND_NAN));
-     }},
-    {"Number: a code", 9,
-     [] {
-         static_cast<void>(Number(kindCode(11)));
-     }},
-    {"Number: two codes", 9,
-     [] {
-         static_cast<void>(Number(1u) > Number(1ull));
-     }},
-    {"Number: a 32-bit value", 9,
-     [] {
-         static_cast<void>(static_cast<IC::Version2>(Number(256u)));
-     }},
-    {"Number: a 64-bit value", 9,
-     [] {
-         static_cast<void>(static_cast<int>(Number(1ull << 32)));
-     }},
-    {"Number: a real", 9,
-     [] {
-         static_cast<void>(static_cast<unsigned int>(Number(-1.0)));
-     }},
-    {"EnumValue: a value", 9,
-     [] {
-         static_cast<void>(static_cast<unsigned short>(EnumValue(65536u)));
-     }},
+     [] { static_cast<void>(Number(Number::KIND_NAN) < Number(Number::KIND_NAN)); }},
+    {"Number: a code", 9, [] { static_cast<void>(Number(kindCode(11))); }},
+    {"Number: two codes", 9, [] { static_cast<void>(Number(1u) > Number(1ull)); }},
+    {"Number: a 32-bit value", 9, [] { static_cast<void>(static_cast<IC::Version2>(Number(256u))); }},
+    {"Number: a 64-bit value", 9, [] { static_cast<void>(static_cast<int>(Number(1ull << 32))); }},
+    {"Number: a real", 9, [] { static_cast<void>(static_cast<unsigned int>(Number(-1.0))); }},
+    {"EnumValue: a value", 9, [] { static_cast<void>(static_cast<unsigned short>(EnumValue(65536u))); }},
     {"PropertyValue: a code", 9, refuseProperty},
     {"PropertyValue: two codes", 9,
-     [] {
-         static_cast<void>(PropertyValue("text") < PropertyValue(Number(1)));
-     }},
-    {"Error: a code", 9,
-     [] {
-         static_cast<void>(Error("a text that the error holds already", 17));
-     }},
+     [] { static_cast<void>(PropertyValue("text") < PropertyValue(Number(1))); }},
+    {"Error: a code", 9, [] { static_cast<void>(Error("a text that the error holds already", 17)); }},
     {"Alert: a code", 9,
      [] {
          ZQ::DateTime time(1234567890, 3);

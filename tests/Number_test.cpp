@@ -1168,9 +1168,7 @@ void expectRising(const std::vector<Number>& numbers)
 TEST(NumberComparison, FlagsCompareTheirBytes)
 {
     expectRising({Number(false), Number(true)});
-    const auto flag = [](unsigned int content) {
-        return withKind(Number(Version2 {byte(content), 0}), 1);
-    };
+    const auto flag = [](unsigned int content) { return withKind(Number(Version2 {byte(content), 0}), 1); };
     expectRising({flag(0), flag(1), flag(2), flag(127), flag(128), flag(255)});
 }
 

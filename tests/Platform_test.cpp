@@ -352,9 +352,7 @@ TEST_F(Sink, MayWriteRecordsAndReplaceItself)
 TEST_F(Sink, MayBeReplacedWhileThreadsWriteRecords)
 {
     std::atomic<int> count {0};
-    const auto counting = [&count](const VXLog::Record&) {
-        ++count;
-    };
+    const auto counting = [&count](const VXLog::Record&) { ++count; };
     VXLog::setRecordSink(counting);
     std::vector<std::thread> threads;
     for (int i = 0; i < 4; ++i) {

@@ -30,9 +30,7 @@ bool Mutex::lock(unsigned int timeoutMilliseconds)
 {
     observe::reached(observe::Call::lock);
     std::unique_lock<std::mutex> guard(guard_);
-    const auto free = [this] {
-        return depth_ == 0 || owner_ == std::this_thread::get_id();
-    };
+    const auto free = [this] { return depth_ == 0 || owner_ == std::this_thread::get_id(); };
     if (timeoutMilliseconds == forEver)
         released_.wait(guard, free);
     else if (!released_.wait_for(guard, std::chrono::milliseconds(timeoutMilliseconds), free))
