@@ -24,7 +24,8 @@ int main()
     std::cout << "changing the model: " << fan.setProperty(Fan::MODEL, value) << '\n';
     try {
         fan.getProperty(Fan::MODEL, value);
-        speed = value;  // a text is no number
+        unsigned int model = value;  // a text is no number
+        std::cout << model << '\n';
     } catch (const IC::PropertyValueInvalidKind& refusal) {
         std::cout << refusal.what() << '\n';
     }

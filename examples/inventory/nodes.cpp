@@ -62,7 +62,7 @@ Component::Component(const Site& site) : Node(site.sensor)
         put(KEY_PARENT, IC::Number(site.above));
     put(KEY_LABEL, std::string(), false);  // for the operator to write
 
-    const hwloc_obj_t object = site.object;
+    const hwloc_obj* const object = site.object;
     if (object == nullptr)
         return;
     const bool ofMachine = object->type == HWLOC_OBJ_MACHINE;
@@ -77,10 +77,10 @@ Component::Component(const Site& site) : Node(site.sensor)
         put(KEY_INDEX, IC::Number(object->os_index));
 
     const bool isMemory = hwloc_obj_type_is_memory(object->type) != 0;
-    const auto all = isMemory ? object->complete_nodeset : object->complete_cpuset;
+    const auto* const all = isMemory ? object->complete_nodeset : object->complete_cpuset;
     if (all != nullptr && hwloc_bitmap_iszero(all) == 0) {
-        const auto allowed = isMemory ? hwloc_topology_get_allowed_nodeset(site.topology)
-                                      : hwloc_topology_get_allowed_cpuset(site.topology);
+        const auto* const allowed = isMemory ? hwloc_topology_get_allowed_nodeset(site.topology)
+                                             : hwloc_topology_get_allowed_cpuset(site.topology);
         const bool usable = hwloc_bitmap_intersects(all, allowed) != 0;
         put(KEY_USABLE, IC::Number(usable));
         become(usable ? STATUS_FINE : STATUS_NOT_USABLE);
@@ -172,7 +172,7 @@ Core::Core(const Site& site) : Component(site)
         hwloc_cpukinds_get_info(site.topology, static_cast<unsigned int>(kind), nullptr, nullptr, &number,
                                 &facts, 0);
     addFacts(facts, number, false);
-    const auto allowed = hwloc_topology_get_allowed_cpuset(site.topology);
+    const auto* const allowed = hwloc_topology_get_allowed_cpuset(site.topology);
     if (status == STATUS_INITIAL && hwloc_bitmap_isincluded(site.object->complete_cpuset, allowed) == 0)
         become(STATUS_PARTLY_USABLE);
     const std::string frequency = words(KEY_FREQUENCY);

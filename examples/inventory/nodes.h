@@ -61,7 +61,7 @@ protected:
         properties.insert_or_assign(key, IC::PropertyValue(value, readOnly));
     }
     void become(Status newStatus) { status = static_cast<StatusType>(newStatus); }
-    void addFacts(const hwloc_info_s* facts, unsigned int count, bool ofMachine);
+    void addFacts(const hwloc_info_s* facts, unsigned int number, bool ofMachine);
     // Sets the description; pieces that say nothing are left out.
     void describe(const std::vector<std::string>& pieces);
 

@@ -155,7 +155,7 @@ Site Inventory::site(const Site& parent, IC::Node::SensorType sensor, std::strin
     site.sensor = sensor;
     site.path = parent.path + '/';
     for (const char character : name.substr(0, longest)) {
-        const bool isPlain = plain.find(character) != plain.npos;
+        const bool isPlain = plain.find(character) != std::string_view::npos;
         site.path +=
             isPlain ? std::string(1, character) : '%' + IC::pB(static_cast<unsigned char>(character));
     }

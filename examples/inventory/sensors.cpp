@@ -72,7 +72,7 @@ public:
     // A changed limit is judged at once.
     IC::Error setProperty(const unsigned int& key, const IC::PropertyValue& value) override
     {
-        const IC::Error outcome = Component::setProperty(key, value);
+        IC::Error outcome = Component::setProperty(key, value);
         const Lock lock(mutex);
         judge();
         return outcome;

@@ -14,7 +14,8 @@ std::string_view trimmed(std::string_view text)
 {
     constexpr std::string_view blanks = " \t\r\n";
     const auto first = text.find_first_not_of(blanks);
-    return first == text.npos ? "" : text.substr(first, text.find_last_not_of(blanks) - first + 1);
+    return first == std::string_view::npos ? ""
+                                           : text.substr(first, text.find_last_not_of(blanks) - first + 1);
 }
 
 // Takes a number off the front of the text.
