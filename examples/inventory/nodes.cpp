@@ -145,7 +145,8 @@ Machine::Machine(const Site& site) : Component(site)
     put(KEY_SIZE, number64(site.object->total_memory));
     put(KEY_CPUS, number32(hwloc_get_nbobjs_by_type(site.topology, HWLOC_OBJ_PACKAGE)));
     put(KEY_CORES, number32(hwloc_get_nbobjs_by_type(site.topology, HWLOC_OBJ_CORE)));
-    describe({product(), "CPUs: " + words(KEY_CPUS), "cores: " + words(KEY_CORES), "memory: " + size()});
+    describe({product(), "CPUs: " + words(KEY_CPUS), "cores: " + words(KEY_CORES),
+              size().empty() ? "" : "memory: " + size()});
 }
 
 MachinePart::MachinePart(const Site& site) : Component(site)
