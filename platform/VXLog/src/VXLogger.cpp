@@ -36,14 +36,15 @@ struct Current {
 // Ready before the objects of the program, and there until the last of them is gone.
 [[gnu::init_priority(101)]] Current current;
 
+std::shared_ptr<const RecordSink> currentSink()
+{
+    const std::lock_guard<std::mutex> lock(current.mutex);
+    return current.sink;
+}
+
 void pass(const Record& record)
 {
-    std::shared_ptr<const RecordSink> sink;
-    {
-        const std::lock_guard<std::mutex> lock(current.mutex);
-        sink = current.sink;
-    }
-    (*sink)(record);
+    (*currentSink())(record);
 }
 
 }  // namespace
@@ -51,11 +52,15 @@ void pass(const Record& record)
 RecordSink setRecordSink(RecordSink sink)
 {
     auto next = std::make_shared<const RecordSink>(sink ? std::move(sink) : RecordSink(writeLine));
-    {
+    for (;;) {
+        const auto before = currentSink();
+        RecordSink copy = *before;  // outside the lock: it may throw, and it is the program's code
         const std::lock_guard<std::mutex> lock(current.mutex);
-        current.sink.swap(next);
+        if (current.sink == before) {
+            current.sink = std::move(next);
+            return copy;
+        }
     }
-    return *next;
 }
 
 void VXLogger::logLevelMessage(const char* function, const char* file, int line, const std::string& logger,
