@@ -1,0 +1,269 @@
+#pragma once
+
+#include <malloc.h>
+
+#include <initializer_list>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "Workloads.h"
+
+// The workloads on nodes. Each is written once, for a contender: a class with
+//
+//   name               its column
+//   Values             the contender that its properties come from
+//   Node               its node type
+//   make(count)        a node with so many properties, on the heap
+//   get, set           of a property; both say whether there is one
+//   all, status, text  of the node
+//   makeEmpty()        a value without content, to read a property into
+//   onlySets           whether only the change of a property is measured
+namespace benchmarks {
+
+constexpr unsigned int fewProperties = 3;
+constexpr unsigned int fewPropertiesNumber = 2;  // the key of a number among them
+
+template <class Contender>
+void timeGetSameKind(benchmark::State& state)
+{
+    const auto node = Contender::make(propertyCount);
+    auto value = Contender::Values::make(Contender::Values::native(content<Subject::number>(1)));
+    unsigned int key = aNumber;
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(key);
+        const bool found = Contender::get(*node, key, value);
+        benchmark::DoNotOptimize(found);
+        benchmark::DoNotOptimize(value);
+    }
+}
+
+template <class Contender>
+void timeGetAndRead(benchmark::State& state)
+{
+    const auto node = Contender::make(propertyCount);
+    unsigned int key = aNumber;
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(key);
+        auto value = Contender::makeEmpty();
+        const bool found = Contender::get(*node, key, value);
+        benchmark::DoNotOptimize(found);
+        const auto number = Contender::Values::template read<Subject::number>(value);
+        benchmark::DoNotOptimize(number);
+    }
+}
+
+template <class Contender>
+void timeGetMissing(benchmark::State& state)
+{
+    const auto node = Contender::make(propertyCount);
+    auto value = Contender::makeEmpty();
+    unsigned int key = noProperty;
+    if (Contender::get(*node, key, value))
+        state.SkipWithError("there is such a property");
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(key);
+        const bool found = Contender::get(*node, key, value);
+        benchmark::DoNotOptimize(found);
+    }
+}
+
+template <class Contender, Subject S>
+void timeSet(benchmark::State& state)
+{
+    const auto node = Contender::make(propertyCount);
+    const auto value = Contender::Values::make(Contender::Values::native(content<S>(1)));
+    unsigned int key = S == Subject::real ? aReal : aNumber;
+    if (!Contender::set(*node, key, value))
+        state.SkipWithError("there is no such property");
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(key);
+        const bool found = Contender::set(*node, key, value);
+        benchmark::DoNotOptimize(found);
+    }
+}
+
+template <class Contender>
+void timeSetMissing(benchmark::State& state)
+{
+    const auto node = Contender::make(propertyCount);
+    const auto value = Contender::Values::make(Contender::Values::native(content<Subject::number>(1)));
+    unsigned int key = noProperty;
+    if (Contender::set(*node, key, value))
+        state.SkipWithError("there is such a property");
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(key);
+        const bool found = Contender::set(*node, key, value);
+        benchmark::DoNotOptimize(found);
+    }
+}
+
+template <class Contender>
+void timeAllProperties(benchmark::State& state)
+{
+    const auto node = Contender::make(propertyCount);
+    beforeTiming();
+    for (auto _ : state) {
+        auto all = Contender::all(*node);
+        benchmark::DoNotOptimize(all);
+    }
+}
+
+template <class Contender>
+void timeStatus(benchmark::State& state)
+{
+    const auto node = Contender::make(fewProperties);
+    beforeTiming();
+    for (auto _ : state) {
+        const auto status = Contender::status(*node);
+        benchmark::DoNotOptimize(status);
+    }
+}
+
+template <class Contender>
+void timeNodeText(benchmark::State& state)
+{
+    const auto node = Contender::make(fewProperties);
+    if (Contender::text(*node) != "Node 2f636861737369732f66616e31 : 20, status = 0")
+        state.SkipWithError("the text is another one");
+    beforeTiming();
+    for (auto _ : state) {
+        auto text = Contender::text(*node);
+        benchmark::DoNotOptimize(text);
+    }
+}
+
+template <class Contender>
+void timeMakeNode(benchmark::State& state)
+{
+    beforeTiming();
+    for (auto _ : state) {
+        auto node = Contender::make(fewProperties);
+        benchmark::DoNotOptimize(node);
+    }
+}
+
+template <class Contender>
+std::vector<std::unique_ptr<typename Contender::Node>> makeNodes(std::size_t count)
+{
+    std::vector<std::unique_ptr<typename Contender::Node>> nodes;
+    nodes.reserve(count);
+    for (std::size_t i = 0; i < count; ++i)
+        nodes.push_back(Contender::make(fewProperties));
+    return nodes;
+}
+
+// Gives the heap back its order, which the workloads before have left in theirs. So many objects feel it.
+inline void tidyHeap()
+{
+    malloc_trim(0);
+}
+
+// The time is that of one node.
+template <class Contender>
+void timeMakeNodes(benchmark::State& state, std::size_t count)
+{
+    tidyHeap();
+    beforeTiming();
+    while (state.KeepRunningBatch(static_cast<benchmark::IterationCount>(count))) {
+        auto nodes = makeNodes<Contender>(count);
+        benchmark::DoNotOptimize(nodes);
+    }
+}
+
+template <class Contender>
+void timeReadNodes(benchmark::State& state, std::size_t count)
+{
+    tidyHeap();
+    const auto nodes = makeNodes<Contender>(count);
+    auto value = Contender::makeEmpty();
+    beforeTiming();
+    while (state.KeepRunningBatch(static_cast<benchmark::IterationCount>(count)))
+        for (const auto& node : nodes) {
+            const bool found = Contender::get(*node, fewPropertiesNumber, value);
+            benchmark::DoNotOptimize(found);
+            benchmark::DoNotOptimize(value);
+        }
+}
+
+// Two threads, one node. It lives as long as the program.
+template <class Contender>
+typename Contender::Node& sharedNode()
+{
+    static const auto node = Contender::make(propertyCount);
+    return *node;
+}
+
+template <class Contender>
+void timeSharedGet(benchmark::State& state)
+{
+    const auto& node = sharedNode<Contender>();
+    auto value = Contender::Values::make(Contender::Values::native(content<Subject::number>(1)));
+    beforeTiming();
+    for (auto _ : state) {
+        const bool found = Contender::get(node, aNumber, value);
+        benchmark::DoNotOptimize(found);
+    }
+}
+
+template <class Contender>
+void timeSharedSet(benchmark::State& state)
+{
+    auto& node = sharedNode<Contender>();
+    const auto value = Contender::Values::make(Contender::Values::native(content<Subject::number>(1)));
+    beforeTiming();
+    for (auto _ : state) {
+        const bool found = Contender::set(node, aNumber, value);
+        benchmark::DoNotOptimize(found);
+    }
+}
+
+template <class Contender>
+void addShared(const std::string& row, void (*function)(benchmark::State&))
+{
+    benchmark::RegisterBenchmark(benchmarkName("two-threads/" + row, Contender::name).c_str(), function)
+        ->Threads(2)
+        ->UseRealTime();
+}
+
+template <class Contender, class Function>
+void addNodes(const std::string& row, Function function)
+{
+    for (const auto count : std::initializer_list<std::size_t> {1000, 30000, 1000000}) {
+        const auto name = benchmarkName("nodes/" + row + '/' + std::to_string(count), Contender::name);
+        auto* added = benchmark::RegisterBenchmark(
+            name.c_str(), [function, count](benchmark::State& state) { function(state, count); });
+        if (count >= 100000)
+            added->Iterations(static_cast<benchmark::IterationCount>(count));  // once through all of them
+    }
+}
+
+template <class Contender>
+bool addNodeWorkloads()
+{
+    add<Contender>("node/set-number", timeSet<Contender, Subject::number>);
+    add<Contender>("node/set-real", timeSet<Contender, Subject::real>);
+    add<Contender>("node/set-missing", timeSetMissing<Contender>);
+    addShared<Contender>("set-number", timeSharedSet<Contender>);
+    if constexpr (!Contender::onlySets) {
+        add<Contender>("node/get-same-kind", timeGetSameKind<Contender>);
+        add<Contender>("node/get-and-read", timeGetAndRead<Contender>);
+        add<Contender>("node/get-missing", timeGetMissing<Contender>);
+        add<Contender>("node/all-properties", timeAllProperties<Contender>);
+        add<Contender>("node/status", timeStatus<Contender>);
+        add<Contender>("node/text", timeNodeText<Contender>);
+        add<Contender>("node/make", timeMakeNode<Contender>);
+        addShared<Contender>("get-number", timeSharedGet<Contender>);
+        addNodes<Contender>("make", timeMakeNodes<Contender>);
+        addNodes<Contender>("read", timeReadNodes<Contender>);
+        addBytes<Contender>("node", [](std::size_t) { return Contender::make(fewProperties); });
+    }
+    return true;
+}
+
+}  // namespace benchmarks

@@ -1,0 +1,479 @@
+#pragma once
+
+#include <malloc.h>
+
+#include <initializer_list>
+#include <map>
+#include <ostream>
+#include <sstream>
+#include <string>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+#include "Samples.h"
+#include "Timing.h"
+
+// The workloads on values. Each is written once, for a contender: a class with
+//
+//   name                 its column
+//   Value                its value type
+//   native(content)      the content as its users have it
+//   make(native)         a value
+//   read<S>(value)       the content again, as its users read it
+//   refused(value)       reads a text as a number and says whether that was refused
+//   equal, less          of two values
+//   text(value)          the text form
+//   stream(out, value)   the text form, written to a stream
+//   has(operation, S)    whether it has the operation at all; what it lacks is left out
+//   libraryForm          whether its texts are to be those of the library
+namespace benchmarks {
+
+enum class Operation { make, copy, move, assign, read, refuse, equal, less, text, stream };
+
+template <class Contender, Subject S>
+auto natives(std::size_t first = 0)
+{
+    std::vector<std::decay_t<decltype(Contender::native(content<S>(0)))>> all;
+    for (std::size_t i = 0; i < batchSize; ++i)
+        all.push_back(Contender::native(content<S>(first + i)));
+    return all;
+}
+
+template <class Contender, Subject S>
+auto values(std::size_t first = 0)
+{
+    std::vector<typename Contender::Value> all;
+    all.reserve(batchSize);
+    for (const auto& native : natives<Contender, S>(first))
+        all.push_back(Contender::make(native));
+    return all;
+}
+
+// Another kind of value than the subject's.
+template <class Contender, Subject S>
+auto valueOfAnotherKind()
+{
+    constexpr auto another = S == Subject::number ? Subject::text12 : Subject::number;
+    return Contender::make(Contender::native(content<another>(0)));
+}
+
+// A stream that is written over and over at the same place, so that it needs no new memory.
+class Target {
+public:
+    std::ostream& fromTheStart()
+    {
+        out_.seekp(0);
+        return out_;
+    }
+    bool empty() { return out_.str().empty(); }
+
+private:
+    std::ostringstream out_;
+};
+
+template <class Contender, Subject S>
+void timeMake(benchmark::State& state)
+{
+    const auto sources = natives<Contender, S>();
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (const auto& source : sources) {
+            auto value = Contender::make(source);
+            benchmark::DoNotOptimize(value);
+        }
+}
+
+template <class Contender, Subject S>
+void timeCopy(benchmark::State& state)
+{
+    const auto sources = values<Contender, S>();
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (const auto& source : sources) {
+            auto copy = source;
+            benchmark::DoNotOptimize(copy);
+        }
+}
+
+// Into a new value and back again.
+template <class Contender, Subject S>
+void timeMove(benchmark::State& state)
+{
+    auto sources = values<Contender, S>();
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (auto& source : sources) {
+            auto moved = std::move(source);
+            benchmark::DoNotOptimize(moved);
+            source = std::move(moved);
+            benchmark::DoNotOptimize(source);
+        }
+}
+
+template <class Contender, Subject S>
+void timeAssignSameKind(benchmark::State& state)
+{
+    const auto sources = values<Contender, S>();
+    auto targets = values<Contender, S>(batchSize);
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (std::size_t i = 0; i < batchSize; ++i) {
+            targets[i] = sources[i];
+            benchmark::DoNotOptimize(targets[i]);
+        }
+}
+
+// To another kind and back again.
+template <class Contender, Subject S>
+void timeAssignOtherKind(benchmark::State& state)
+{
+    const auto sources = values<Contender, S>();
+    const auto other = valueOfAnotherKind<Contender, S>();
+    auto targets = values<Contender, S>(batchSize);
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (std::size_t i = 0; i < batchSize; ++i) {
+            targets[i] = other;
+            benchmark::DoNotOptimize(targets[i]);
+            targets[i] = sources[i];
+            benchmark::DoNotOptimize(targets[i]);
+        }
+}
+
+template <class Contender, Subject S>
+void timeRead(benchmark::State& state)
+{
+    const auto sources = values<Contender, S>();
+    if (!Contender::same(Contender::template read<S>(sources.back()), content<S>(batchSize - 1)))
+        state.SkipWithError("what is read is not what was stored");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (const auto& source : sources) {
+            const auto native = Contender::template read<S>(source);
+            benchmark::DoNotOptimize(native);
+        }
+}
+
+template <class Contender>
+void timeRefusedRead(benchmark::State& state)
+{
+    const auto sources = values<Contender, Subject::text12>();
+    if (!Contender::refused(sources.front()))
+        state.SkipWithError("a text is read as a number");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (const auto& source : sources) {
+            const bool refused = Contender::refused(source);
+            benchmark::DoNotOptimize(refused);
+        }
+}
+
+template <class Contender, Subject S>
+void timeEqual(benchmark::State& state)
+{
+    const auto left = values<Contender, S>();
+    const auto right = values<Contender, S>();
+    if (!Contender::equal(left[0], right[0]) || Contender::equal(left[0], right[1]))
+        state.SkipWithError("equality is wrong");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (std::size_t i = 0; i < batchSize; ++i) {
+            const bool equal = Contender::equal(left[i], right[i]);
+            benchmark::DoNotOptimize(equal);
+        }
+}
+
+template <class Contender, Subject S>
+void timeLess(benchmark::State& state)
+{
+    const auto left = values<Contender, S>();
+    const auto right = values<Contender, S>(1);
+    if (!Contender::less(left[0], right[0]) || Contender::less(right[0], left[0]))
+        state.SkipWithError("less-than is wrong");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (std::size_t i = 0; i < batchSize; ++i) {
+            const bool less = Contender::less(left[i], right[i]);
+            benchmark::DoNotOptimize(less);
+        }
+}
+
+template <class Contender, Subject S>
+void timeText(benchmark::State& state)
+{
+    const auto sources = values<Contender, S>();
+    if (Contender::text(sources[0]) == Contender::text(sources[1]))
+        state.SkipWithError("different values have the same text");
+    if constexpr (Contender::libraryForm)
+        if (Contender::text(sources[0]) != textOf(content<S>(0)))
+            state.SkipWithError("the text is another one");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (const auto& source : sources) {
+            auto text = Contender::text(source);
+            benchmark::DoNotOptimize(text);
+        }
+}
+
+template <class Contender, Subject S>
+void timeStream(benchmark::State& state)
+{
+    const auto sources = values<Contender, S>();
+    Target target;
+    Contender::stream(target.fromTheStart(), sources.front());
+    if (target.empty())
+        state.SkipWithError("nothing is written");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize)) {
+        std::ostream& out = target.fromTheStart();
+        for (const auto& source : sources)
+            Contender::stream(out, source);
+    }
+}
+
+// A property map of 32, as a node may have it: 16 numbers, 4 reals, 8 short and 4 long texts.
+constexpr unsigned int propertyCount = 32;
+
+template <class Contender>
+auto makeProperty(unsigned int key)
+{
+    switch (key % 8) {
+    case 1:
+    case 5:
+        return Contender::make(Contender::native(content<Subject::text12>(key)));
+    case 3:
+        return Contender::make(Contender::native(content<Subject::text40>(key)));
+    case 6:
+        return Contender::make(Contender::native(content<Subject::real>(key)));
+    default:
+        return Contender::make(Contender::native(content<Subject::number>(key)));
+    }
+}
+
+// For nodes, which are to be timed and not the making of texts for them.
+template <class Contender>
+const typename Contender::Value& property(unsigned int key)
+{
+    static const auto all = [] {
+        std::vector<typename Contender::Value> made;
+        for (unsigned int each = 0; each < propertyCount; ++each)
+            made.push_back(makeProperty<Contender>(each));
+        return made;
+    }();
+    return all[key];
+}
+
+constexpr unsigned int aNumber = 16;  // keys of properties
+constexpr unsigned int aReal = 14;
+constexpr unsigned int noProperty = 1000;
+
+template <class Contender>
+using PropertyMap = std::map<unsigned int, typename Contender::Value>;
+
+template <class Contender>
+PropertyMap<Contender> properties()
+{
+    PropertyMap<Contender> map;
+    for (unsigned int key = 0; key < propertyCount; ++key)
+        map.emplace(key, makeProperty<Contender>(key));
+    return map;
+}
+
+template <class Contender>
+void timeMapCopy(benchmark::State& state)
+{
+    const auto map = properties<Contender>();
+    beforeTiming();
+    for (auto _ : state) {
+        auto copy = map;
+        benchmark::DoNotOptimize(copy);
+    }
+}
+
+template <class Contender>
+void timeMapFindAndRead(benchmark::State& state)
+{
+    auto map = properties<Contender>();
+    unsigned int key = aNumber;
+    benchmark::DoNotOptimize(map);
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(key);
+        const auto number = Contender::template read<Subject::number>(map.find(key)->second);
+        benchmark::DoNotOptimize(number);
+    }
+}
+
+template <class Contender>
+void timeMapReplace(benchmark::State& state)
+{
+    auto map = properties<Contender>();
+    const auto value = Contender::make(Contender::native(content<Subject::number>(1)));
+    unsigned int key = aNumber;
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(key);
+        map.find(key)->second = value;
+        benchmark::DoNotOptimize(map);
+    }
+}
+
+template <class Contender>
+void timeMapPrint(benchmark::State& state)
+{
+    const auto map = properties<Contender>();
+    Target target;
+    beforeTiming();
+    for (auto _ : state)
+        Contender::streamMap(target.fromTheStart(), map);
+    if (target.empty())
+        state.SkipWithError("nothing is written");
+}
+
+// The print of a map by a contender whose library has none for it.
+template <class Contender>
+void streamEachProperty(std::ostream& out, const PropertyMap<Contender>& map)
+{
+    const char* separator = "[";
+    for (const auto& [key, value] : map) {
+        out << separator << key << " = ";
+        Contender::stream(out, value);
+        separator = "], [";
+    }
+    out << ']';
+}
+
+template <class Contender, class Native>
+void timeLargeCopy(benchmark::State& state, const Native& native)
+{
+    const auto source = Contender::make(Contender::native(native));
+    beforeTiming();
+    for (auto _ : state) {
+        auto copy = source;
+        benchmark::DoNotOptimize(copy);
+    }
+}
+
+template <class Contender, class Native>
+void timeLargeText(benchmark::State& state, const Native& native)
+{
+    const auto source = Contender::make(Contender::native(native));
+    beforeTiming();
+    for (auto _ : state) {
+        auto text = Contender::text(source);
+        benchmark::DoNotOptimize(text);
+    }
+}
+
+// The memory in use, whichever library asked for it.
+inline double bytesInUse()
+{
+    const auto information = mallinfo2();
+    return static_cast<double>(information.uordblks) + static_cast<double>(information.hblkhd);
+}
+
+// The bytes of one of the objects that `make` makes, with everything that it owns.
+template <class Make>
+void countBytes(benchmark::State& state, const Make& make)
+{
+    constexpr std::size_t count = 10000;
+    for (auto _ : state) {
+        using Object = decltype(make(std::size_t {0}));
+        std::vector<Object> objects;
+        objects.reserve(count);
+        const double before = bytesInUse();
+        for (std::size_t i = 0; i < count; ++i)
+            objects.push_back(make(i));
+        const double owned = bytesInUse() - before;
+        state.counters["bytes"] = owned / static_cast<double>(count) + static_cast<double>(sizeof(Object));
+    }
+}
+
+template <class Contender, class Function>
+void add(const std::string& row, Function function)
+{
+    benchmark::RegisterBenchmark(benchmarkName(row, Contender::name).c_str(), function);
+}
+
+template <class Contender, class Make>
+void addBytes(const std::string& row, Make make)
+{
+    const auto count = [make](benchmark::State& state) { countBytes(state, make); };
+    benchmark::RegisterBenchmark(benchmarkName("bytes/" + row, Contender::name).c_str(), count)
+        ->Iterations(1);
+}
+
+template <class Contender, Subject S>
+void addSubject()
+{
+    const std::string subject = std::string("/") + nameOf(S);
+    if constexpr (Contender::has(Operation::make, S)) {
+        add<Contender>("make" + subject, timeMake<Contender, S>);
+        addBytes<Contender>("value" + subject, [](std::size_t i) {
+            return Contender::make(Contender::native(content<S>(i % 1000)));
+        });
+    }
+    if constexpr (Contender::has(Operation::copy, S))
+        add<Contender>("copy" + subject, timeCopy<Contender, S>);
+    if constexpr (Contender::has(Operation::move, S))
+        add<Contender>("move" + subject, timeMove<Contender, S>);
+    if constexpr (Contender::has(Operation::assign, S)) {
+        add<Contender>("assign-same" + subject, timeAssignSameKind<Contender, S>);
+        add<Contender>("assign-other" + subject, timeAssignOtherKind<Contender, S>);
+    }
+    if constexpr (Contender::has(Operation::read, S))
+        add<Contender>("read" + subject, timeRead<Contender, S>);
+    if constexpr (S == Subject::text12 && Contender::has(Operation::refuse, S))
+        add<Contender>("refused-read" + subject, timeRefusedRead<Contender>);
+    if constexpr (Contender::has(Operation::equal, S))
+        add<Contender>("equal" + subject, timeEqual<Contender, S>);
+    if constexpr (Contender::has(Operation::less, S))
+        add<Contender>("less" + subject, timeLess<Contender, S>);
+    if constexpr (Contender::has(Operation::text, S))
+        add<Contender>("text" + subject, timeText<Contender, S>);
+    if constexpr (Contender::has(Operation::stream, S))
+        add<Contender>("stream" + subject, timeStream<Contender, S>);
+}
+
+template <class Contender>
+void addGrowth()
+{
+    for (const auto length : std::initializer_list<std::size_t> {10, 1000, 100000}) {
+        const std::string size = '/' + std::to_string(length);
+        add<Contender>("grow/copy-numbers" + size, [length](benchmark::State& state) {
+            timeLargeCopy<Contender>(state, numbersOfLength(length, 0));
+        });
+        add<Contender>("grow/copy-texts" + size, [length](benchmark::State& state) {
+            timeLargeCopy<Contender>(state, textsOfLength(length, 0));
+        });
+        add<Contender>("grow/text-numbers" + size, [length](benchmark::State& state) {
+            timeLargeText<Contender>(state, numbersOfLength(length, 0));
+        });
+        add<Contender>("grow/text-texts" + size, [length](benchmark::State& state) {
+            timeLargeText<Contender>(state, textsOfLength(length, 0));
+        });
+    }
+}
+
+// Everything that a contender can be measured at, nodes apart.
+template <class Contender>
+bool addValueWorkloads()
+{
+    addSubject<Contender, Subject::number>();
+    addSubject<Contender, Subject::real>();
+    addSubject<Contender, Subject::text12>();
+    addSubject<Contender, Subject::text40>();
+    addSubject<Contender, Subject::bytes64>();
+    addSubject<Contender, Subject::numbers100>();
+    addSubject<Contender, Subject::texts100>();
+    add<Contender>("map32/copy", timeMapCopy<Contender>);
+    add<Contender>("map32/find-and-read", timeMapFindAndRead<Contender>);
+    add<Contender>("map32/replace", timeMapReplace<Contender>);
+    add<Contender>("map32/print", timeMapPrint<Contender>);
+    addBytes<Contender>("map32", [](std::size_t) { return properties<Contender>(); });
+    addGrowth<Contender>();
+    return true;
+}
+
+}  // namespace benchmarks

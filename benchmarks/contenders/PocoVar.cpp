@@ -1,0 +1,98 @@
+// Poco::Dynamic::Var.
+
+#include <Poco/Dynamic/Var.h>
+#include <Poco/HexBinaryEncoder.h>
+
+#include "Workloads.h"
+
+namespace benchmarks {
+
+namespace {
+
+struct PocoVar {
+    static constexpr const char* name = "Poco::Var";
+    static constexpr bool libraryForm = false;
+    using Value = Poco::Dynamic::Var;
+
+    // It orders no vectors.
+    static constexpr bool has(Operation operation, Subject subject)
+    {
+        return operation != Operation::less
+            || (subject != Subject::bytes64 && subject != Subject::numbers100
+                && subject != Subject::texts100);
+    }
+
+    template <class Content>
+    static const Content& native(const Content& content)
+    {
+        return content;
+    }
+
+    template <class Native>
+    static Value make(const Native& native)
+    {
+        return Value(native);
+    }
+
+    template <Subject S>
+    static auto read(const Value& value)
+    {
+        return value.extract<std::decay_t<decltype(content<S>(0))>>();
+    }
+
+    template <class Content>
+    static bool same(const Content& read, const Content& content)
+    {
+        return read == content;
+    }
+
+    static bool refused(const Value& text)
+    {
+        try {
+            const auto number = text.extract<Poco::UInt32>();
+            benchmark::DoNotOptimize(number);
+        } catch (const Poco::BadCastException&) {
+            return true;
+        }
+        return false;
+    }
+
+    static bool equal(const Value& a, const Value& b) { return a == b; }
+    static bool less(const Value& a, const Value& b) { return a < b; }
+    static std::string text(const Value& value)
+    {
+        if (value.type() != typeid(Bytes))
+            return value.convert<std::string>();
+        std::ostringstream out;
+        writeHex(out, value);
+        return out.str();
+    }
+    static void stream(std::ostream& out, const Value& value)
+    {
+        if (value.type() == typeid(Bytes))
+            writeHex(out, value);
+        else
+            out << value.convert<std::string>();
+    }
+    static void streamMap(std::ostream& out, const PropertyMap<PocoVar>& map)
+    {
+        streamEachProperty<PocoVar>(out, map);
+    }
+
+private:
+    static void writeHex(std::ostream& out, const Value& value)
+    {
+        const auto& bytes = value.extract<Bytes>();
+        Poco::HexBinaryEncoder encoder(out);
+        encoder.rdbuf()->setLineLength(0);
+        for (const unsigned char byte : bytes)
+            encoder.put(static_cast<char>(byte));
+        encoder.close();
+    }
+};
+
+const bool added = addValueWorkloads<PocoVar>();
+
+}  // namespace
+
+}  // namespace benchmarks

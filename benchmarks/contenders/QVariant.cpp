@@ -1,0 +1,116 @@
+// Qt's QVariant, with Qt's own texts, bytes and lists. Copies share their content.
+
+#include <QByteArray>
+#include <QString>
+#include <QStringList>
+#include <QVariant>
+#include <QVariantList>
+
+#include "Workloads.h"
+
+namespace benchmarks {
+
+namespace {
+
+struct Qt {
+    static constexpr const char* name = "QVariant";
+    static constexpr bool libraryForm = false;
+    using Value = QVariant;
+
+    // It orders no lists of variants.
+    static constexpr bool has(Operation operation, Subject subject)
+    {
+        return operation != Operation::less || subject != Subject::numbers100;
+    }
+
+    static std::uint32_t native(std::uint32_t number) { return number; }
+    static double native(double real) { return real; }
+    static QString native(const std::string& text) { return QString::fromStdString(text); }
+    static QByteArray native(const Bytes& bytes)
+    {
+        return QByteArray::fromStdString(std::string(bytes.begin(), bytes.end()));
+    }
+    static QVariantList native(const Numbers& numbers)
+    {
+        QVariantList list;
+        for (const auto number : numbers)
+            list.append(number);
+        return list;
+    }
+    static QStringList native(const Texts& texts)
+    {
+        QStringList list;
+        for (const auto& text : texts)
+            list.append(QString::fromStdString(text));
+        return list;
+    }
+
+    template <class Native>
+    static Value make(const Native& native)
+    {
+        return native;
+    }
+
+    template <Subject S>
+    static auto read(const Value& value)
+    {
+        if constexpr (S == Subject::number)
+            return value.toUInt();
+        else if constexpr (S == Subject::real)
+            return value.toDouble();
+        else if constexpr (S == Subject::bytes64)
+            return value.toByteArray();
+        else if constexpr (S == Subject::numbers100)
+            return value.toList();
+        else if constexpr (S == Subject::texts100)
+            return value.toStringList();
+        else
+            return value.toString();
+    }
+
+    template <class Read, class Content>
+    static bool same(const Read& read, const Content& content)
+    {
+        return read == native(content);
+    }
+
+    // By a flag, not by an exception.
+    static bool refused(const Value& text)
+    {
+        bool converted = false;
+        const auto number = text.toUInt(&converted);
+        benchmark::DoNotOptimize(number);
+        return !converted;
+    }
+
+    static bool equal(const Value& a, const Value& b) { return a == b; }
+    static bool less(const Value& a, const Value& b)
+    {
+        return QVariant::compare(a, b) == QPartialOrdering::Less;
+    }
+    static QString text(const Value& value)
+    {
+        switch (value.typeId()) {
+        case QMetaType::QByteArray:
+            return QString::fromLatin1(value.toByteArray().toHex());
+        case QMetaType::QStringList:
+            return "{\"" + value.toStringList().join("\", \"") + "\"}";
+        case QMetaType::QVariantList: {
+            QStringList texts;
+            for (const auto& element : value.toList())
+                texts.append(element.toString());
+            return '{' + texts.join(", ") + '}';
+        }
+        default:
+            return value.toString();
+        }
+    }
+    static void stream(std::ostream& out, const Value& value) { out << text(value).toStdString(); }
+    static void streamMap(std::ostream& out, const PropertyMap<Qt>& map) { streamEachProperty<Qt>(out, map); }
+};
+
+const bool added = addValueWorkloads<Qt>();
+
+}  // namespace
+
+}  // namespace benchmarks

@@ -1,0 +1,377 @@
+#!/usr/bin/python3
+"""Reads what the benchmark measured; prints it as a table and draws it.
+
+The table has a row for each workload: the medians of this library, of the limit and of the peers, and what the
+library costs as a ratio of the limit and of the best peer, beside the bar for it. Exits with 1 where a bar is
+missed.
+"""
+
+import argparse
+import dataclasses
+import fnmatch
+import html
+import json
+import math
+import pathlib
+import platform
+import statistics
+import sys
+
+LIBRARY = "IC"
+LIMIT = "limit"
+RECORDS = "std::variant + records"
+PEERS = ["std::variant", RECORDS, "nlohmann::json", "boost::json", "Poco::Var", "QVariant", "GVariant"]
+SHARING = {"QVariant", "GVariant"}  # a copy is one more reference to the same content
+COLUMNS = [LIBRARY, LIMIT] + PEERS
+PRIMITIVE = "primitive"
+NODE_PANELS = {"node", "two-threads", "nodes"}
+
+BEGIN = "<!-- measured: begin (written by scripts/run-benchmarks --update-docs) -->"
+END = "<!-- measured: end -->"
+
+
+@dataclasses.dataclass
+class Bar:
+    """The most that a row may cost; None is no bar."""
+
+    pattern: str
+    limit: float | None
+    peer: float | None
+    peer_name: str | None
+
+
+@dataclasses.dataclass
+class Ratio:
+    value: float
+    bar: float | None
+    other: str
+
+    @property
+    def missed(self):
+        # To two digits, as it is printed and as the bars are given.
+        return self.bar is not None and round(self.value, 2) > self.bar
+
+    def __str__(self):
+        if self.bar is None:
+            return f"{self.value:.2f}"
+        return f"{self.value:.2f} {'> ' if self.missed else '≤ '}{self.bar:g}{' MISSED' if self.missed else ''}"
+
+
+def kind(row):
+    return row.split("/")[0]
+
+
+def read_bars(path):
+    bars = []
+    for line in path.read_text(encoding="utf-8").splitlines():
+        fields = line.split(maxsplit=3)
+        if not fields or fields[0].startswith("#"):
+            continue
+        numbers = [None if field == "-" else float(field) for field in fields[1:3]]
+        bars.append(Bar(fields[0], numbers[0], numbers[1], fields[3] if len(fields) > 3 else None))
+    return bars
+
+
+def read_results(paths):
+    """The context, and for each row the median of each contender in nanoseconds or bytes."""
+    files = [json.loads(path.read_text(encoding="utf-8")) for path in paths]
+    samples = {}
+    position = {}  # of a row in the benchmark, which runs its rows in any order
+    for run in (run for file in files for run in file["benchmarks"]):
+        if run.get("run_type") != "iteration":
+            continue
+        if run.get("error_occurred"):
+            sys.exit(f"{run['name']}: {run['error_message']}")
+        row, contender = run["name"].split("|")
+        contender = contender.split("/")[0]  # without what the runner appends, such as the number of threads
+        if "bytes" in run:
+            sample = run["bytes"]
+        else:
+            # The processor's time, which others on the machine disturb least; two threads also wait.
+            sample = run["real_time" if run.get("threads", 1) > 1 else "cpu_time"]
+        position[row] = min(run["family_index"], position.get(row, run["family_index"]))
+        samples.setdefault(row, {}).setdefault(contender, []).append(sample)
+    rows = sorted(samples, key=position.get)
+    kinds = list(dict.fromkeys(kind(row) for row in rows))
+    # Rows of one kind together, and last what is no operation.
+    rows.sort(key=lambda row: (kind(row) in {"bytes", PRIMITIVE}, kinds.index(kind(row))))
+    medians = {
+        row: {contender: statistics.median(values) for contender, values in samples[row].items()}
+        for row in rows
+    }
+    return files[0]["context"], medians
+
+
+def bar_of(row, bars):
+    for bar in bars:
+        if fnmatch.fnmatchcase(row, bar.pattern):
+            return bar
+    return Bar(row, None, None, None)
+
+
+def ratios(row, medians, bars):
+    """What the library costs against the limit and against the peer; None where one of them is missing."""
+    if LIBRARY not in medians:
+        return None, None
+    bar = bar_of(row, bars)
+    cost = medians[LIBRARY]
+    against_limit = Ratio(cost / medians[LIMIT], bar.limit, LIMIT) if LIMIT in medians else None
+    candidates = [bar.peer_name] if bar.peer_name else [
+        peer for peer in PEERS if peer not in SHARING and peer != RECORDS]
+    candidates = [peer for peer in candidates if peer in medians]
+    if not candidates:
+        return against_limit, None
+    best = min(candidates, key=medians.get)
+    return against_limit, Ratio(cost / medians[best], bar.peer, best)
+
+
+def quantity(value, row):
+    if row.startswith("bytes/"):
+        return f"{value:.0f} B"
+    for unit, size in (("ms", 1e6), ("µs", 1e3)):
+        if value >= size:
+            value /= size
+            break
+    else:
+        unit = "ns"
+    return f"{value:.{max(0, 2 - int(math.log10(max(value, 1))))}f} {unit}"
+
+
+def heading(contender):
+    return contender + (" *" if contender in SHARING else "")
+
+
+def table(results, bars, columns):
+    """The table in Markdown, its columns aligned."""
+    lines = [["workload"] + [heading(column) for column in columns] + ["÷ limit", "÷ best peer", "best peer"]]
+    for row, medians in results.items():
+        if PRIMITIVE in medians:
+            continue
+        against_limit, against_peer = ratios(row, medians, bars)
+        lines.append(
+            [row]
+            + [quantity(medians[column], row) if column in medians else "" for column in columns]
+            + [str(ratio) if ratio else "" for ratio in (against_limit, against_peer)]
+            + [against_peer.other if against_peer else ""]
+        )
+    widths = [max(len(line[i]) for line in lines) for i in range(len(lines[0]))]
+    lines.insert(1, ["-" * widths[0]] + ["-" * (width - 1) + ":" for width in widths[1:-1]] + ["-" * widths[-1]])
+    return "\n".join(
+        "| " + " | ".join(cell.rjust(width) if 0 < i < len(line) - 1 else cell.ljust(width)
+                          for i, (cell, width) in enumerate(zip(line, widths))) + " |"
+        for line in lines
+    )
+
+
+def lacking(results, columns):
+    """What each peer does not offer, in one line a peer."""
+    rows = [row for row in results if LIBRARY in results[row] and kind(row) not in NODE_PANELS | {"bytes"}]
+    lines = []
+    for column in columns:
+        missing = {row for row in rows if column not in results[row]}
+        if column == RECORDS or not missing:
+            continue
+        for pattern in dict.fromkeys(
+            [kind(row) + "/*" for row in rows] + ["*/" + row.split("/", 1)[1] for row in rows]
+        ):
+            covered = {row for row in rows if fnmatch.fnmatchcase(row, pattern)}
+            if len(covered) > 1 and not any(column in results[row] for row in covered):
+                missing = {row for row in missing if row not in covered} | {pattern}
+        lines.append(f"- {column} has no {', '.join(sorted(missing))}.")
+    return lines
+
+
+def processor():
+    for line in pathlib.Path("/proc/cpuinfo").read_text(encoding="utf-8").splitlines():
+        if line.startswith("model name"):
+            return line.split(":", 1)[1].strip()
+    return platform.machine()
+
+
+def operating_system():
+    try:
+        return platform.freedesktop_os_release()["PRETTY_NAME"]
+    except OSError:
+        return platform.system()
+
+
+def report(context, results, bars):
+    """The lines of the report in Markdown, and how many bars are missed."""
+    columns = [column for column in COLUMNS if any(column in medians for medians in results.values())]
+    judged = [
+        (row, ratio)
+        for row, medians in results.items()
+        for ratio in ratios(row, medians, bars)
+        if ratio and ratio.bar is not None
+    ]
+    missed = [(row, ratio) for row, ratio in judged if ratio.missed]
+    lines = [
+        f"- {processor()}, {context['num_cpus']} processors, {operating_system()}, {context['compiler']}; "
+        f"{context['date'][:10]}.",
+        f"- Peers: {context['peers']}.",
+    ]
+    if context["missing peers"]:
+        lines.append(f"- Not found on this machine, and left out: {context['missing peers'].rstrip('; ')}.")
+    lines += lacking(results, columns)
+    lines += [
+        "",
+        table(results, bars, columns),
+        "",
+        "\\* A copy shares its content with its source; the ratios do not count this peer.",
+        "",
+        "What the operations are made of: "
+        + ", ".join(
+            f"{row.split('/')[1]} {quantity(medians[PRIMITIVE], row)}"
+            for row, medians in results.items()
+            if PRIMITIVE in medians
+        )
+        + ".",
+        "",
+        f"{len(judged) - len(missed)} of {len(judged)} bars met.",
+    ]
+    lines += [f"- missed: {row} against {ratio.other}: {ratio.value:.2f} > {ratio.bar:g}" for row, ratio in missed]
+    return lines, len(missed)
+
+
+# The figure: a panel for each kind of workload, a group of bars for each workload.
+
+COLOURS = {
+    LIBRARY: "#c0392b",
+    LIMIT: "#2c3e50",
+    "std::variant": "#2980b9",
+    RECORDS: "#7fb3d5",
+    "nlohmann::json": "#27ae60",
+    "boost::json": "#82c99a",
+    "Poco::Var": "#d68910",
+    "QVariant": "#a793c4",
+    "GVariant": "#c3b9cf",
+    PRIMITIVE: "#7f8c8d",
+}
+PANEL_WIDTH = 400
+LABEL_WIDTH = 128
+BAR_HEIGHT = 6
+GROUP_GAP = 8
+PANEL_COLUMNS = 3
+
+
+def escaped(text):
+    return html.escape(text, quote=True)
+
+
+def panel(name, rows, columns):
+    """The SVG of one panel, and its height."""
+    everything = [value for _, medians in rows for value in medians.values()]
+    low = math.floor(math.log10(min(everything)) - 0.3)
+    high = math.ceil(math.log10(max(everything)) + 0.01)
+    plot_width = PANEL_WIDTH - LABEL_WIDTH - 24
+
+    def x(value):
+        return LABEL_WIDTH + plot_width * (math.log10(value) - low) / (high - low)
+
+    parts = [f'<text x="0" y="12" class="title">{escaped(name)}</text>']
+    y = 32
+    bars = []
+    for row, medians in rows:
+        shown = [column for column in columns if column in medians]
+        label = row.split("/", 1)[1]
+        middle = y + len(shown) * BAR_HEIGHT / 2 + 4
+        bars.append(f'<text x="{LABEL_WIDTH - 6}" y="{middle:.1f}" class="label">{escaped(label)}</text>')
+        for column in shown:
+            width = x(medians[column]) - LABEL_WIDTH
+            bars.append(
+                f'<rect x="{LABEL_WIDTH}" y="{y}" width="{width:.1f}" height="{BAR_HEIGHT - 1}" '
+                f'fill="{COLOURS[column]}"><title>{escaped(column)}: {quantity(medians[column], row)}</title></rect>'
+            )
+            y += BAR_HEIGHT
+        y += GROUP_GAP
+    for exponent in range(low, high + 1):
+        parts.append(
+            f'<line x1="{x(10**exponent):.1f}" y1="28" x2="{x(10**exponent):.1f}" y2="{y}" class="grid"/>'
+            f'<text x="{x(10**exponent):.1f}" y="24" class="tick">{tick(exponent, rows[0][0])}</text>'
+        )
+    return parts + bars, y + 16
+
+
+def tick(exponent, row):
+    units = ["B", "kB", "MB"] if row.startswith("bytes/") else ["ns", "µs", "ms", "s"]
+    index = min(max(exponent // 3, 0), len(units) - 1)
+    return f"{10.0 ** (exponent - 3 * index):g} {units[index]}"
+
+
+def draw(results):
+    """The whole figure as SVG."""
+    columns = [column for column in COLOURS if any(column in medians for medians in results.values())]
+    panels = {}
+    for row, medians in results.items():
+        panels.setdefault(kind(row), []).append((row, medians))
+
+    heights = [64] * PANEL_COLUMNS
+    body = []
+    for name, rows in panels.items():
+        parts, height = panel(name, rows, columns)
+        column = heights.index(min(heights))
+        body.append(f'<g transform="translate({20 + column * (PANEL_WIDTH + 16)} {heights[column]})">')
+        body += parts + ["</g>"]
+        heights[column] += height
+
+    legend = []
+    left = 20
+    for column in columns:
+        if column == PRIMITIVE:
+            continue
+        legend.append(f'<rect x="{left}" y="30" width="10" height="10" fill="{COLOURS[column]}"/>')
+        legend.append(f'<text x="{left + 14}" y="39" class="legend">{escaped(heading(column))}</text>')
+        left += 40 + 6 * len(heading(column))
+    width = 40 + PANEL_COLUMNS * (PANEL_WIDTH + 16)
+    style = (
+        "text { font-family: sans-serif; fill: #222; } .title { font-size: 13px; font-weight: bold; }"
+        " .label { font-size: 10px; text-anchor: end; } .tick { font-size: 9px; text-anchor: middle; fill: #666; }"
+        " .legend { font-size: 10px; } .head { font-size: 12px; } .grid { stroke: #ddd; stroke-width: 1; }"
+    )
+    return "\n".join(
+        [
+            f'<svg xmlns="http://www.w3.org/2000/svg" viewBox="0 0 {width} {max(heights)}" width="{width}" '
+            f'height="{max(heights)}">',
+            f"<style>{style}</style>",
+            f'<rect width="{width}" height="{max(heights)}" fill="white"/>',
+            '<text x="20" y="20" class="head">Time of one operation (bytes where marked), logarithmic; shorter is '
+            "better. * copies share their content</text>",
+        ]
+        + legend
+        + body
+        + ["</svg>", ""]
+    )
+
+
+def update(page, lines):
+    """Replaces what stands between the two marks of the page."""
+    text = page.read_text(encoding="utf-8")
+    before, begin, rest = text.partition(BEGIN)
+    _, end, after = rest.partition(END)
+    if not begin or not end:
+        sys.exit(f"{page}: the marks around the measured part are missing")
+    measured = "\n".join(lines)
+    page.write_text(f"{before}{BEGIN}\n\n{measured}\n\n{END}{after}", encoding="utf-8")
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__.splitlines()[0])
+    parser.add_argument("results", type=pathlib.Path, nargs="+", help="what the benchmark wrote as JSON")
+    parser.add_argument("--bars", type=pathlib.Path, default=pathlib.Path(__file__).with_name("bars.txt"))
+    parser.add_argument("--svg", type=pathlib.Path, help="where to draw the figure")
+    parser.add_argument("--update", type=pathlib.Path, help="the page to write the report into")
+    arguments = parser.parse_args()
+
+    context, results = read_results(arguments.results)
+    bars = read_bars(arguments.bars)
+    lines, missed = report(context, results, bars)
+    print("\n".join(lines))
+    if arguments.svg:
+        arguments.svg.write_text(draw(results), encoding="utf-8")
+    if arguments.update:
+        update(arguments.update, lines)
+    return 1 if missed else 0
+
+
+if __name__ == "__main__":
+    sys.exit(main())
