@@ -55,9 +55,7 @@ void Alert::init(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char 
 
 std::string Alert::hexstring(const std::string& text) const
 {
-    detail::Text hex;
-    hex.addHex(text);
-    return hex.take();
+    return detail::hexOf(text);
 }
 
 Alert::operator std::string() const
@@ -75,7 +73,7 @@ Alert::operator std::string() const
     text.addStreamed(timeStamp_);
     text.add("; { ");
     for (const std::string& path : nodePaths_) {
-        text.addHex(path);
+        text.add(hexstring(path));
         text.add(' ');
     }
     text.add('}');

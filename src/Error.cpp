@@ -19,11 +19,6 @@ detail::Where here(const char* function, int line = __builtin_LINE())
 
 }  // namespace
 
-Error::Error(const Number& value, unsigned char status) : value_(value)
-{
-    initStatus(status);
-}
-
 Error::Error(unsigned char status, const Number& value, const std::string& message)
     : value_(value),
       message_(message)
@@ -45,12 +40,10 @@ Error::Error(const std::string& message, unsigned char status)
     initStatus(status);
 }
 
-void Error::initStatus(unsigned char status)
+void Error::refuse(unsigned char status)
 {
-    if (status > STATUS_READ_ONLY)
-        detail::fail<std::invalid_argument>(here("initStatus"), "Invalid error status",
-                                            "initstatus: Invalid error status=", status);
-    status_ = static_cast<StatusType>(status);
+    detail::fail<std::invalid_argument>(here("initStatus"), "Invalid error status",
+                                        "initstatus: Invalid error status=", status);
 }
 
 Error::operator std::string() const

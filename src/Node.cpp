@@ -45,9 +45,12 @@ struct SensorRefusal {
     }
 };
 
+// What the outcome of an operation carries beside its status. Copying it costs less than making it anew.
+[[gnu::init_priority(101)]] const Number nothing(Number::KIND_UNKNOWN);
+
 Error outcome(Error::StatusType status)
 {
-    return {Number(Number::KIND_UNKNOWN), status};
+    return {nothing, status};
 }
 
 }  // namespace
@@ -121,9 +124,7 @@ Error Node::setProperty(const unsigned int& key, const PropertyValue& value)
 
 std::string Node::hexstring(std::string bytes) const
 {
-    detail::Text hex;
-    hex.addHex(bytes);
-    return hex.take();
+    return detail::hexOf(bytes);
 }
 
 Node::operator std::string() const

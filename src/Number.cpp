@@ -6,6 +6,8 @@
 #include <limits>
 #include <ostream>
 #include <stdexcept>
+#include <string_view>
+#include <vector>
 
 #include "detail/Failure.h"
 #include "detail/Text.h"
@@ -137,11 +139,6 @@ Number::Number(const unsigned char& code) : Number(Tag(), static_cast<KindType>(
         detail::fail<std::invalid_argument>(here("Number"), "Invalid kind of number",
                                             "Number: wrong kind of number: ", code);
     initKind(static_cast<KindType>(code));
-}
-
-Number::Number(const KindType& kind) : Number(Tag(), kind)
-{
-    initKind(kind);
 }
 
 void Number::initKind(const KindType& kind)
@@ -320,33 +317,34 @@ Number::operator std::string() const
     return detail::textOf(*this);
 }
 
-bool operator==(const Number& a, const Number& b)
+// The header has compared the kinds that are not named here and have a value.
+bool Number::equal(const Number& a, const Number& b)
 {
     if (a.kind_ != b.kind_)
         return false;
     switch (a.kind_) {
-    case Number::KIND_BOOL:
+    case KIND_BOOL:
         return a.load<ZQ::Uint8>() == b.load<ZQ::Uint8>();
-    case Number::KIND_UINT32:
-        return a.load<ZQ::Uint32>() == b.load<ZQ::Uint32>();
-    case Number::KIND_UINT64:
+    case KIND_UINT64:
         return a.load<ZQ::Uint64>() == b.load<ZQ::Uint64>();
-    case Number::KIND_REAL:
-        return a.load<ZQ::Real64>() == b.load<ZQ::Real64>();
-    case Number::KIND_VERSION: {
+    case KIND_VERSION: {
         const auto x = a.load<Version2>();
         const auto y = b.load<Version2>();
         return x.major == y.major && x.minor == y.minor;
     }
-    case Number::KIND_DATETIME: {
-        const auto x = a.load<Number::DateTimeFields>();
-        const auto y = b.load<Number::DateTimeFields>();
+    case KIND_DATETIME: {
+        const auto x = a.load<DateTimeFields>();
+        const auto y = b.load<DateTimeFields>();
         return x.seconds == y.seconds && x.milliseconds == y.milliseconds;
     }
     default:
         return true;
     }
 }
+
+// Inline in the header; a program that looks them up in the library finds them all the same.
+[[gnu::used]] static bool (*const comparisons[])(const Number&,
+                                                 const Number&) = {operator==, operator<, operator> };
 
 bool operator!=(const Number& a, const Number& b)
 {
@@ -358,12 +356,8 @@ bool Number::precedes(const Number& a, const Number& b)
     switch (a.kind_) {
     case KIND_BOOL:
         return a.load<ZQ::Uint8>() < b.load<ZQ::Uint8>();
-    case KIND_UINT32:
-        return a.load<ZQ::Uint32>() < b.load<ZQ::Uint32>();
     case KIND_UINT64:
         return a.load<ZQ::Uint64>() < b.load<ZQ::Uint64>();
-    case KIND_REAL:
-        return a.load<ZQ::Real64>() < b.load<ZQ::Real64>();
     case KIND_VERSION: {
         const auto x = a.load<Version2>();
         const auto y = b.load<Version2>();
@@ -379,32 +373,32 @@ bool Number::precedes(const Number& a, const Number& b)
     }
 }
 
-bool operator<(const Number& a, const Number& b)
+bool Number::less(const Number& a, const Number& b)
 {
-    if (a.kind_ == Number::KIND_NAN || b.kind_ == Number::KIND_NAN)
+    if (a.kind_ == KIND_NAN || b.kind_ == KIND_NAN)
         detail::fail<std::invalid_argument>(here("operator<"), "Invalid operation when kind is NaN",
                                             "<: invalid operation when kind is NaN");
-    if (a.kind_ == Number::KIND_INFINITY)
+    if (a.kind_ == KIND_INFINITY)
         return false;
     if (a.kind_ != b.kind_)
         detail::fail<std::invalid_argument>(
             here("operator<"), "Cannot compare two different kinds of number",
             "<: cannot compare two different kinds of number, kind1=", a.kind_, ", kind2=", b.kind_);
-    return Number::precedes(a, b);
+    return precedes(a, b);
 }
 
-bool operator>(const Number& a, const Number& b)
+bool Number::greater(const Number& a, const Number& b)
 {
-    if (a.kind_ == Number::KIND_NAN || b.kind_ == Number::KIND_NAN)
+    if (a.kind_ == KIND_NAN || b.kind_ == KIND_NAN)
         detail::fail<std::invalid_argument>(here("operator>"), "Invalid operation when kind is NaN",
                                             ">: invalid operation when kind is NaN");
-    if (a.kind_ == Number::KIND_INFINITY)
-        return b.kind_ != Number::KIND_INFINITY;
+    if (a.kind_ == KIND_INFINITY)
+        return b.kind_ != KIND_INFINITY;
     if (a.kind_ != b.kind_)
         detail::fail<std::invalid_argument>(
             here("operator>"), "Cannot compare two different kinds of number",
             ">: cannot compare two different kinds of number, kind1=", a.kind_, ", kind2=", b.kind_);
-    return Number::precedes(b, a);
+    return precedes(b, a);
 }
 
 bool operator<=(const Number& a, const Number& b)
@@ -477,6 +471,21 @@ void detail::append(Text& text, const Number& number)
         return;
     }
     text.add("invalid");
+}
+
+void detail::append(Text& text, const std::vector<Number>& numbers)
+{
+    std::string_view separator = "{";
+    for (const Number& number : numbers) {
+        if (number.kind_ == Number::KIND_UINT32) {
+            text.addInteger(separator, number.load<ZQ::Uint32>());
+        } else {
+            text.add(separator);
+            append(text, number);
+        }
+        separator = ", ";
+    }
+    text.add(numbers.empty() ? "{}" : "}");
 }
 
 }  // namespace IC

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <ostream>
+#include <string_view>
 
 #include "IC/ICException.h"
 #include "detail/Failure.h"
@@ -22,7 +23,7 @@ constexpr char notANumber[] = "Can't return current value as a Number";
 
 // The old elements stay until the new ones are complete; not every vector's own assignment sees to that.
 template <class Array>
-void assign(Array& target, const Array& source)
+void replace(Array& target, const Array& source)
 {
     Array copy(source);
     target.swap(copy);
@@ -35,118 +36,53 @@ bool lexicographicallyLess(const Array& a, const Array& b)
     return std::lexicographical_compare(a.begin(), a.end(), b.begin(), b.end());
 }
 
-template <class Array, class AddElement>
-void addArray(detail::Text& text, const Array& array, AddElement addElement)
+std::string textOf(const Buffer& bytes)
 {
+    std::string text(2 * bytes.size() + bytes.size() / 4, ' ');
+    char* out = text.data();
+    const unsigned char* byte = bytes.data();
+    for (std::size_t groups = bytes.size() / 4; groups > 0; --groups) {
+        for (int i = 0; i < 4; ++i)
+            out = detail::writeHex(out, *byte++);
+        ++out;  // over the blank
+    }
+    for (std::size_t rest = bytes.size() % 4; rest > 0; --rest)
+        out = detail::writeHex(out, *byte++);
+    return text;
+}
+
+void addQuoted(detail::Text& text, std::string_view content)
+{
+    text.add('"');
+    for (auto quote = content.find('"'); quote != std::string_view::npos; quote = content.find('"')) {
+        text.add(content.substr(0, quote));
+        text.add("\\\"");
+        content.remove_prefix(quote + 1);
+    }
+    text.add(content);
+    text.add('"');
+}
+
+void addTexts(detail::Text& text, const StringArray& texts)
+{
+    std::size_t length = 2;
+    for (const std::string& content : texts)
+        length += content.size() + 4;
+    text.reserve(length);
     const char* separator = "{";
-    for (const auto& element : array) {
+    for (const std::string& content : texts) {
         text.add(separator);
-        addElement(element);
+        addQuoted(text, content);
         separator = ", ";
     }
-    text.add(array.empty() ? "{}" : "}");
-}
-
-void addQuoted(detail::Text& text, const std::string& content)
-{
-    text.add('"');
-    for (const char character : content) {
-        if (character == '"')
-            text.add('\\');
-        text.add(character);
-    }
-    text.add('"');
-}
-
-void addBuffer(detail::Text& text, const Buffer& bytes)
-{
-    for (std::size_t i = 0; i < bytes.size(); ++i) {
-        text.addHex(bytes[i]);
-        if (i % 4 == 3)
-            text.add(' ');
-    }
-}
-
-void insertProperty(std::ostream& out, unsigned int key, const PropertyValue& value)
-{
-    out << key << " = " << value;
+    text.add(texts.empty() ? "{}" : "}");
 }
 
 }  // namespace
 
-PropertyValue::PropertyValue(const std::string& value, const bool& readOnly)
-    : value_(new std::string(value)),
-      kind_(KIND_STRING),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(std::string&& value, const bool& readOnly)
-    : value_(new std::string(std::move(value))),
-      kind_(KIND_STRING),
-      readOnly_(readOnly)
-{
-}
-
 PropertyValue::PropertyValue(const char* value, const bool& readOnly)
     : value_(new std::string(detail::checked(value))),
       kind_(KIND_STRING),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(const Number& value, const bool& readOnly)
-    : value_(new Number(value)),
-      kind_(KIND_NUMBER),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(const EnumValue& value, const bool& readOnly)
-    : value_(new EnumValue(value)),
-      kind_(KIND_ENUMVALUE),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(const Buffer& value, const bool& readOnly)
-    : value_(new Buffer(value)),
-      kind_(KIND_BUFFER),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(Buffer&& value, const bool& readOnly)
-    : value_(new Buffer(std::move(value))),
-      kind_(KIND_BUFFER),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(const NumberArray& value, const bool& readOnly)
-    : value_(new NumberArray(value)),
-      kind_(KIND_NUMBERARRAY),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(NumberArray&& value, const bool& readOnly)
-    : value_(new NumberArray(std::move(value))),
-      kind_(KIND_NUMBERARRAY),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(const StringArray& value, const bool& readOnly)
-    : value_(new StringArray(value)),
-      kind_(KIND_STRINGARRAY),
-      readOnly_(readOnly)
-{
-}
-
-PropertyValue::PropertyValue(StringArray&& value, const bool& readOnly)
-    : value_(new StringArray(std::move(value))),
-      kind_(KIND_STRINGARRAY),
       readOnly_(readOnly)
 {
 }
@@ -161,16 +97,15 @@ PropertyValue::PropertyValue(const KindType& kind, const bool& readOnly) : readO
     initKind(static_cast<unsigned char>(kind));
 }
 
-PropertyValue::PropertyValue(const PropertyValue& source) : kind_(source.kind_), readOnly_(source.readOnly_)
+// Called for what holds no object yet.
+void PropertyValue::copyObject(const PropertyValue& source)
 {
     if (source.value_ == nullptr)
         return;
     switch (kind_) {
     case KIND_UNKNOWN:
-        break;
     case KIND_NUMBER:
-        value_ = new Number(*source.held<Number>(kind_));
-        break;
+        break;  // not here: nothing to copy, or copied in the header
     case KIND_STRING:
         value_ = new std::string(*source.held<std::string>(kind_));
         break;
@@ -189,62 +124,36 @@ PropertyValue::PropertyValue(const PropertyValue& source) : kind_(source.kind_),
     }
 }
 
-PropertyValue& PropertyValue::operator=(const PropertyValue& source)
+void PropertyValue::assign(const PropertyValue& source)
 {
     if (this == &source)
-        return *this;
+        return;
     if (kind_ != source.kind_ || value_ == nullptr || source.value_ == nullptr) {
         PropertyValue copy(source);
         swap(copy);
-        return *this;
+        return;
     }
     switch (kind_) {
     case KIND_UNKNOWN:
-        break;
     case KIND_NUMBER:
-        *static_cast<Number*>(value_) = *source.held<Number>(kind_);
-        break;
+        break;  // not here: nothing to assign, or assigned in the header
     case KIND_STRING:
-        *static_cast<std::string*>(value_) = *source.held<std::string>(kind_);
+        *held<std::string>(kind_) = *source.held<std::string>(kind_);
         break;
     case KIND_BUFFER:
-        assign(*static_cast<Buffer*>(value_), *source.held<Buffer>(kind_));
+        replace(*held<Buffer>(kind_), *source.held<Buffer>(kind_));
         break;
     case KIND_ENUMVALUE:
-        *static_cast<EnumValue*>(value_) = *source.held<EnumValue>(kind_);
+        *held<EnumValue>(kind_) = *source.held<EnumValue>(kind_);
         break;
     case KIND_NUMBERARRAY:
-        assign(*static_cast<NumberArray*>(value_), *source.held<NumberArray>(kind_));
+        replace(*held<NumberArray>(kind_), *source.held<NumberArray>(kind_));
         break;
     case KIND_STRINGARRAY:
-        assign(*static_cast<StringArray*>(value_), *source.held<StringArray>(kind_));
+        replace(*held<StringArray>(kind_), *source.held<StringArray>(kind_));
         break;
     }
     readOnly_ = source.readOnly_;
-    return *this;
-}
-
-PropertyValue::PropertyValue(PropertyValue&& source) noexcept
-    : value_(std::exchange(source.value_, nullptr)),
-      kind_(std::exchange(source.kind_, KIND_UNKNOWN)),
-      readOnly_(source.readOnly_)
-{
-}
-
-PropertyValue& PropertyValue::operator=(PropertyValue&& source) noexcept
-{
-    if (this != &source) {
-        PropertyValue moved(std::move(source));
-        swap(moved);
-    }
-    return *this;
-}
-
-void PropertyValue::swap(PropertyValue& other) noexcept
-{
-    std::swap(value_, other.value_);
-    std::swap(kind_, other.kind_);
-    std::swap(readOnly_, other.readOnly_);
 }
 
 void PropertyValue::initKind(const unsigned char& kind)
@@ -388,52 +297,52 @@ StringArray PropertyValue::refuseStringArray() const
         "PropertyValue:StringArray: can't return current value as a StringArray, kind=", kind_);
 }
 
-PropertyValue::operator std::string() const
+std::string PropertyValue::toText() const
 {
-    detail::Text text;
     if (kind_ == KIND_UNKNOWN)
-        text.add("unknown");
-    else if (value_ == nullptr)
-        text.add("invalid");
-    else if (const auto* number = held<Number>(KIND_NUMBER))
+        return "unknown";
+    if (value_ == nullptr)
+        return "invalid";
+    if (const auto* bytes = held<Buffer>(KIND_BUFFER))
+        return textOf(*bytes);
+    detail::Text text;
+    if (const auto* number = held<Number>(KIND_NUMBER))
         append(text, *number);
-    else if (const auto* string = held<std::string>(KIND_STRING))
-        text.add(*string);
-    else if (const auto* bytes = held<Buffer>(KIND_BUFFER))
-        addBuffer(text, *bytes);
     else if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
         append(text, *value);
     else if (const auto* numbers = held<NumberArray>(KIND_NUMBERARRAY))
-        addArray(text, *numbers, [&text](const Number& element) { append(text, element); });
+        append(text, *numbers);
     else if (const auto* texts = held<StringArray>(KIND_STRINGARRAY))
-        addArray(text, *texts, [&text](const std::string& element) { addQuoted(text, element); });
+        addTexts(text, *texts);
     return text.take();
 }
 
-bool operator==(const PropertyValue& a, const PropertyValue& b)
+// The header has compared numbers, texts and bytes.
+bool PropertyValue::equal(const PropertyValue& a, const PropertyValue& b)
 {
     if (a.kind_ != b.kind_)
         return false;
     if (a.value_ == nullptr || b.value_ == nullptr)
         return a.value_ == b.value_;
     switch (a.kind_) {
-    case PropertyValue::KIND_UNKNOWN:
+    case KIND_UNKNOWN:
+    case KIND_NUMBER:
+    case KIND_STRING:
+    case KIND_BUFFER:
         break;
-    case PropertyValue::KIND_NUMBER:
-        return *a.held<Number>(a.kind_) == *b.held<Number>(b.kind_);
-    case PropertyValue::KIND_STRING:
-        return *a.held<std::string>(a.kind_) == *b.held<std::string>(b.kind_);
-    case PropertyValue::KIND_BUFFER:
-        return *a.held<Buffer>(a.kind_) == *b.held<Buffer>(b.kind_);
-    case PropertyValue::KIND_ENUMVALUE:
+    case KIND_ENUMVALUE:
         return *a.held<EnumValue>(a.kind_) == *b.held<EnumValue>(b.kind_);
-    case PropertyValue::KIND_NUMBERARRAY:
+    case KIND_NUMBERARRAY:
         return *a.held<NumberArray>(a.kind_) == *b.held<NumberArray>(b.kind_);
-    case PropertyValue::KIND_STRINGARRAY:
+    case KIND_STRINGARRAY:
         return *a.held<StringArray>(a.kind_) == *b.held<StringArray>(b.kind_);
     }
     return true;
 }
+
+// Inline in the header; a program that looks them up in the library finds them all the same.
+[[gnu::used]] static bool (*const comparisons[])(const PropertyValue&,
+                                                 const PropertyValue&) = {operator==, operator<, operator> };
 
 bool operator!=(const PropertyValue& a, const PropertyValue& b)
 {
@@ -446,11 +355,9 @@ bool PropertyValue::precedes(const PropertyValue& a, const PropertyValue& b)
         return false;
     switch (a.kind_) {
     case KIND_UNKNOWN:
-        break;
     case KIND_NUMBER:
-        return *a.held<Number>(a.kind_) < *b.held<Number>(b.kind_);
     case KIND_STRING:
-        return *a.held<std::string>(a.kind_) < *b.held<std::string>(b.kind_);
+        break;
     case KIND_BUFFER:
         return lexicographicallyLess(*a.held<Buffer>(a.kind_), *b.held<Buffer>(b.kind_));
     case KIND_ENUMVALUE:
@@ -463,25 +370,22 @@ bool PropertyValue::precedes(const PropertyValue& a, const PropertyValue& b)
     return false;
 }
 
-bool operator<(const PropertyValue& a, const PropertyValue& b)
+bool PropertyValue::less(const PropertyValue& a, const PropertyValue& b)
 {
     if (a.kind_ != b.kind_)
         detail::fail<PropertyValueInvalidKind>(
             here("operator<"), "Cannot compare two different kinds of properties",
             "<: cannot compare two different kinds of properties, kind1=", a.kind_, ", kind2=", b.kind_);
-    return PropertyValue::precedes(a, b);
+    return precedes(a, b);
 }
 
-bool operator>(const PropertyValue& a, const PropertyValue& b)
+bool PropertyValue::greater(const PropertyValue& a, const PropertyValue& b)
 {
     if (a.kind_ != b.kind_)
         detail::fail<PropertyValueInvalidKind>(
             here("operator>"), "Cannot compare two different kinds of properties",
             ">: cannot compare two different kinds of properties, kind1=", a.kind_, ", kind2=", b.kind_);
-    // Numbers have a > of their own: infinity on the left is greater than any kind of number.
-    const auto* x = a.held<Number>(PropertyValue::KIND_NUMBER);
-    const auto* y = b.held<Number>(PropertyValue::KIND_NUMBER);
-    return x != nullptr && y != nullptr ? *x > *y : PropertyValue::precedes(b, a);
+    return precedes(b, a);
 }
 
 bool operator<=(const PropertyValue& a, const PropertyValue& b)
@@ -496,9 +400,9 @@ bool operator>=(const PropertyValue& a, const PropertyValue& b)
 
 std::string pB(unsigned char byte)
 {
-    detail::Text text;
-    text.addHex(byte);
-    return text.take();
+    std::string digits(2, '0');
+    detail::writeHex(digits.data(), byte);
+    return digits;
 }
 
 std::ostream& operator<<(std::ostream& out, const PropertyValue& value)
@@ -508,16 +412,18 @@ std::ostream& operator<<(std::ostream& out, const PropertyValue& value)
 
 std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, PropertyValue>& property)
 {
-    insertProperty(out, property.first, property.second);
-    return out;
+    return out << property.first << " = " << property.second;
 }
 
+// What stands between two numbers is one piece: inserting costs more than joining.
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties)
 {
-    for (auto property = properties.begin(); property != properties.end();) {
+    if (!properties.empty())
         out << '[';
-        insertProperty(out, property->first, property->second);
-        out << (++property == properties.end() ? "]" : "], ");
+    for (auto property = properties.begin(); property != properties.end();) {
+        const auto& [key, value] = *property;
+        const char* const end = ++property == properties.end() ? "]" : "], [";
+        out << key << " = " + std::string(value) + end;
     }
     return out;
 }

@@ -266,4 +266,41 @@ TEST(ErrorConstructor, GivesBackAllMemoryWhenItRunsOut)
     }
 }
 
+TEST(ErrorStream, WritesNulBytes)
+{
+    std::ostringstream out;
+    out << Error(std::string("a\0b", 3), 5);
+    EXPECT_EQ(out.str(), std::string("5 - a\0b", 7));
+}
+
+TEST(ErrorStatus, IsCheckedLastByEveryConstructorWithAMessage)
+{
+    const std::string message = "a message that needs memory of its own";
+    const std::function<void()> constructions[] = {
+        [&] { const Error error(17, none, message); },
+        [&] { const Error error(message, 17); },
+        [&] { const Error error(message.c_str(), 17); },
+    };
+    for (const auto& construct : constructions) {
+        // One allocation, the message's; the records of the refusal would be there already.
+        EXPECT_FALSE(allocation::completesWith(0, construct));
+        EXPECT_TRUE(observe::records().empty());
+        bool refused = false;
+        EXPECT_FALSE(allocation::completesWith(1, [&] {
+            try {
+                construct();
+            } catch (const std::invalid_argument&) {
+                refused = true;
+            }
+        }));
+        EXPECT_FALSE(refused);
+    }
+    // The message is given back before the refusal leaves.
+    observe::throwAt(observe::Call::bufferConstructor, 1);
+    for (const auto& construct : constructions) {
+        observe::throwAt(observe::Call::bufferConstructor, 1);
+        EXPECT_EQ(allocation::countOf([&] { EXPECT_THROW(construct(), observe::Thrown); }), 1);
+    }
+}
+
 }  // namespace

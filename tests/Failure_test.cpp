@@ -1,4 +1,6 @@
+#include <cstring>
 #include <cxxabi.h>
+#include <functional>
 
 #include <exception>
 #include <initializer_list>
@@ -532,6 +534,44 @@ TEST(FailurePath, AnyThreadMayRefuseAtAnyTime)
     for (const auto& ofOneLevel : records)
         EXPECT_THAT(ofOneLevel, testing::Each(refusalsOfAThread));
     EXPECT_EQ(observe::buffersAlive(), 0);
+}
+
+TEST(FailurePath, TheExceptionIsBuiltAfterBothRecords)
+{
+    const std::pair<const char*, std::function<void()>> refusing[] = {
+        {"Number", [] { Number(Number::KIND_INT); }},
+        {"PropertyValue", [] { PropertyValue(static_cast<unsigned char>(7)); }},
+        {"Node", [] { const Node node(74); }},
+    };
+    for (const auto& [name, refuse] : refusing) {
+        SCOPED_TRACE(name);
+        std::size_t records = 0;  // written when the last allocation failed
+        for (long allowed = 0;; ++allowed) {
+            ASSERT_LT(allowed, 1000);
+            observe::reset();
+            const bool completed = allocation::completesWith(allowed, [&refuse = refuse] {
+                try {
+                    refuse();
+                } catch (const std::bad_alloc&) {
+                    throw;
+                } catch (...) {
+                }
+            });
+            if (completed)
+                break;
+            records = observe::records().size();
+        }
+        EXPECT_EQ(records, 2u);
+    }
+}
+
+TEST(ExceptionClasses, WhatStandsAfterTheTwoDestructors)
+{
+    std::ptrdiff_t parts[2];
+    std::string (ICException::*what)() const = &ICException::what;
+    static_assert(sizeof parts == sizeof what);
+    std::memcpy(parts, &what, sizeof parts);
+    EXPECT_EQ(parts[0] / static_cast<std::ptrdiff_t>(sizeof(void*)), 2);
 }
 
 }  // namespace

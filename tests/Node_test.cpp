@@ -1043,4 +1043,160 @@ TEST(NodeThreads, ShareOneNode)
     expectFree(node);
 }
 
+// What each operation reads and writes has to be read and written between lock and unlock: the test changes it
+// at both ends.
+TEST(NodeLock, CoversWhatIsRead)
+{
+    Probe node(20);
+    const auto fill = [&node](unsigned int code, const std::string& text) {
+        node.status = static_cast<Node::StatusType>(code);
+        node.description = text;
+        node.properties.insert_or_assign(1u, PropertyValue(text));
+    };
+    const auto within = [&](auto operation) {
+        fill(1, "before");
+        observe::onLock([&](bool lock) { lock ? fill(2, "within") : fill(3, "after"); });
+        auto result = operation();
+        observe::onLock(nullptr);
+        return result;
+    };
+    EXPECT_EQ(within([&] { return node.getStatus(); }), 2u);
+    EXPECT_EQ(within([&] { return node.operator Node::StatusType(); }), 2u);
+    EXPECT_EQ(within([&] { return node.getDescription(); }), "within");
+    EXPECT_EQ(within([&] { return seen(node.getProperties()); }), "1: 2 writable: within; ");
+    EXPECT_EQ(within([&] {
+                  PropertyValue value("");
+                  static_cast<void>(node.getProperty(1, value));
+                  return seen(value);
+              }),
+              "2 writable: within");
+}
+
+TEST(NodeLock, CoversTheLookUp)
+{
+    Probe node(20);
+    observe::onLock([&](bool lock) {
+        node.properties.clear();
+        if (lock)
+            node.properties.emplace(1u, PropertyValue("within"));
+    });
+    PropertyValue value("");
+    EXPECT_EQ(node.getProperty(1, value).getStatus(), Error::STATUS_SUCCESS);
+    EXPECT_EQ(node.setProperty(1, PropertyValue("changed")).getStatus(), Error::STATUS_SUCCESS);
+    observe::onLock([&](bool lock) {
+        node.properties.clear();
+        if (!lock)
+            node.properties.emplace(1u, PropertyValue("after"));
+    });
+    EXPECT_EQ(node.getProperty(1, value).getStatus(), Error::STATUS_NO_SUCH_PROPERTY);
+    EXPECT_EQ(node.setProperty(1, value).getStatus(), Error::STATUS_NO_SUCH_PROPERTY);
+    EXPECT_EQ(seen(node.properties), "1: 2 writable: after; ");
+}
+
+TEST(NodeLock, CoversTheChange)
+{
+    Probe node(20);
+    node.properties.emplace(1u, PropertyValue("old"));
+    std::string atUnlock;
+    observe::onLock([&](bool lock) {
+        if (!lock)
+            atUnlock = seen(node.properties);
+    });
+    static_cast<void>(node.setProperty(1, PropertyValue("new")));
+    observe::onLock(nullptr);
+    EXPECT_EQ(atUnlock, "1: 2 writable: new; ");
+}
+
+TEST(NodeComparison, LooksAtTheWholePath)
+{
+    const Probe a(20, "/chassis/board/fan1");
+    const Probe b(20, "/chassis/board/fan2");
+    EXPECT_TRUE(a < b);
+    EXPECT_FALSE(a > b);
+    EXPECT_FALSE(a == b);
+}
+
+TEST(NodeSensor, NamesTheCodesAsTheTableDoes)
+{
+    const Node::SensorType codes[] = {Node::SENSOR_UNKNOWN,
+                                      Node::SENSOR_CHASSIS,
+                                      Node::SENSOR_BIOS,
+                                      Node::SENSOR_FIRMWARE,
+                                      Node::SENSOR_CPU,
+                                      Node::SENSOR_USB_CONTROLLER,
+                                      Node::SENSOR_USB_PORT,
+                                      Node::SENSOR_SERIAL_PORT,
+                                      Node::SENSOR_PARALLEL_PORT,
+                                      Node::SENSOR_VIDEO,
+                                      Node::SENSOR_FLOPPY_DRIVE,
+                                      Node::SENSOR_HARD_DRIVE,
+                                      Node::SENSOR_NETWORK_PORT,
+                                      Node::SENSOR_BMC,
+                                      Node::SENSOR_TOLK,
+                                      Node::SENSOR_SMBIOS,
+                                      Node::SENSOR_VPD,
+                                      Node::SENSOR_OS,
+                                      Node::SENSOR_RAM,
+                                      Node::SENSOR_DIMM,
+                                      Node::SENSOR_FAN,
+                                      Node::SENSOR_VOLTAGE_SENSOR,
+                                      Node::SENSOR_TEMPERATURE_SENSOR,
+                                      Node::SENSOR_INTRUSION,
+                                      Node::SENSOR_PFA,
+                                      Node::SENSOR_POWER_SUPPLY,
+                                      Node::SENSOR_BLUE_LIGHT,
+                                      Node::SENSOR_FRONT_PANEL,
+                                      Node::SENSOR_BACK_PANEL,
+                                      Node::SENSOR_NETWORK_IP_CONFIGURATION,
+                                      Node::SENSOR_SYSTEM,
+                                      Node::SENSOR_CACHE,
+                                      Node::SENSOR_MEMORY_ARRAY,
+                                      Node::SENSOR_MEMORY_DEVICE,
+                                      Node::SENSOR_IPMI,
+                                      Node::SENSOR_LOG,
+                                      Node::SENSOR_GLIMTRACE,
+                                      Node::SENSOR_SERVICE_PROCESSOR,
+                                      Node::SENSOR_OS_HW,
+                                      Node::SENSOR_OS_SW,
+                                      Node::SENSOR_COMPUTER,
+                                      Node::SENSOR_PLANAR,
+                                      Node::SENSOR_CPU_CORE,
+                                      Node::SENSOR_APPLICATION,
+                                      Node::SENSOR_DRIVER,
+                                      Node::SENSOR_PARTITION,
+                                      Node::SENSOR_USER,
+                                      Node::SENSOR_LOG_ENTRY,
+                                      Node::SENSOR_PFA_SENSOR,
+                                      Node::SENSOR_NETWORK_CONTROLLER,
+                                      Node::SENSOR_DISK_CONTROLLER,
+                                      Node::SENSOR_GROUP,
+                                      Node::SENSOR_PELLION_ALERT_CONFIG,
+                                      Node::SENSOR_DIAGNOSTICS,
+                                      Node::SENSOR_SMBIOS_DATA,
+                                      Node::SENSOR_SMBIOS_TABLE,
+                                      Node::SENSOR_NETWORK_TEAMING,
+                                      Node::SENSOR_SCALABLE_PARTITION,
+                                      Node::SENSOR_SCALABLE_SYSTEM,
+                                      Node::SENSOR_ROOT,
+                                      Node::SENSOR_MODULAR_CHASSIS,
+                                      Node::SENSOR_SLOT_GROUP,
+                                      Node::SENSOR_SLOT,
+                                      Node::SENSOR_CMM,
+                                      Node::SENSOR_IO_MODULE,
+                                      Node::SENSOR_COOLING_DOMAIN,
+                                      Node::SENSOR_POWER_DOMAIN,
+                                      Node::SENSOR_CHASSIS_MID_PLANE_CARD,
+                                      Node::SENSOR_MODULAR_GROUP,
+                                      Node::SENSOR_ALERT_INDICATION,
+                                      Node::SENSOR_CONNECTOR,
+                                      Node::SENSOR_BMC_USER,
+                                      Node::SENSOR_DRIVE_SLOT_SENSOR,
+                                      Node::SENSOR_LAN_END_POINT};
+    unsigned int code = 0;
+    for (const Node::SensorType sensor : codes)
+        EXPECT_EQ(sensor, code++);
+    EXPECT_EQ(code, 74u);
+    EXPECT_EQ(Node::SENSOR_LARGEST, 73u);
+}
+
 }  // namespace

@@ -548,10 +548,11 @@ TEST(NumberSetKind, TakesEveryKindAndKeepsTheBytes)
             SCOPED_TRACE("from kind " + std::to_string(from) + " to " + std::to_string(code));
             const Number before = ofKind(from);
             Number number = before;
+            const Bytes bytes = bytesOf(number);  // of this object: a copy need not bring padding along
             number.setKind(byte(code));
             EXPECT_EQ(number.getKind(), code);
             number.setKind(byte(from));
-            EXPECT_EQ(bytesOf(number), bytesOf(before));
+            EXPECT_EQ(bytesOf(number), bytes);
         }
     }
     EXPECT_THAT(observe::records(), IsEmpty());

@@ -16,6 +16,7 @@
 #include <type_traits>
 #include <vector>
 
+#include "AllocationFailure.h"
 #include "GroupingLocale.h"
 #include "VXLog/RecordSink.h"
 #include "VXLog/VXLogger.h"
@@ -445,6 +446,83 @@ TEST_F(Sink, EscapesTheCategoryToo)
     EXPECT_THAT(standardError(
                     [] { VXLog::VXLogger::logLevelMessage("f\n", "F\n", 1, "C\n", 1, nullptr, 0, 0, "m"); }),
                 testing::EndsWith(" 1 C\\n F\\n:1 f\\n: m\n"));
+}
+
+TEST(DateTimeText, HasEveryMillisecond)
+{
+    for (unsigned int millisecond = 1; millisecond <= 999; ++millisecond) {
+        ZQ::DateTime time(0, 3);
+        time.setMillisecond(millisecond);
+        const std::string digits = std::to_string(1000 + millisecond).substr(1);
+        ASSERT_EQ(std::string(time), "1970-01-01T00:00:00." + digits + "Z");
+    }
+}
+TEST(MessageBuffer, IsWholeOrThrowsWhereMemoryRunsOut)
+{
+    const std::string piece(1000, 'x');
+    const std::string whole = "literal " + piece + "4294967295";
+    for (long allowed = 0;; ++allowed) {
+        ASSERT_LT(allowed, 100);
+        std::string text;
+        const bool completed = allocation::completesWith(allowed, [&] {
+            VXLog::VXMessageBuffer buffer;
+            text = buffer.str(buffer << "literal " << piece << 4294967295u);
+        });
+        if (!completed)
+            continue;
+        EXPECT_EQ(text, whole) << "with memory for " << allowed << " allocations";
+        if (text == whole) {
+            EXPECT_GT(allowed, 0);
+        }
+        break;
+    }
+}
+std::string line(const std::string& message)
+{
+    testing::internal::CaptureStderr();
+    VXLog::VXLogger::logLevelMessage("f", "F", 1, "C", 1, nullptr, 0, 0, message);
+    return testing::internal::GetCapturedStderr();
+}
+TEST_F(Sink, EscapesTheEdgesOfWhatIsPrintable)
+{
+    const struct {
+        std::string text;
+        const char* written;
+    } rows[] = {
+        {"\xc2\x9f", "\\xc2\\x9f"},                    // the last control character
+        {"\xf0\x8f\xbf\xbf", "\\xf0\\x8f\\xbf\\xbf"},  // U+FFFF, written too long
+        {"\xf0\x90\x80\x80", "\xf0\x90\x80\x80"},      // U+10000
+        {"\xe0\x9f\xbf", "\\xe0\\x9f\\xbf"},           // U+07FF, written too long
+        {"\xe0\xa0\x80", "\xe0\xa0\x80"},              // U+0800
+        {"\xed\x9f\xbf", "\xed\x9f\xbf"},              // before the surrogates
+        {"\xed\xbf\xbf", "\\xed\\xbf\\xbf"},           // the last surrogate
+        {"\xee\x80\x80", "\xee\x80\x80"},              // after them
+    };
+    for (const auto& row : rows)
+        EXPECT_THAT(line(row.text), testing::EndsWith(std::string(" f: ") + row.written + "\n"));
+}
+struct ThrowingCopy {
+    static bool fail;
+    ThrowingCopy() = default;
+    ThrowingCopy(const ThrowingCopy&)
+    {
+        if (fail)
+            throw std::length_error("no copy");
+    }
+    void operator()(const VXLog::Record&) const { ++calls; }
+    static int calls;
+};
+bool ThrowingCopy::fail = false;
+int ThrowingCopy::calls = 0;
+TEST_F(Sink, StaysWhereTheOneBeforeCannotBeReturned)
+{
+    VXLog::setRecordSink(ThrowingCopy());
+    ThrowingCopy::fail = true;
+    EXPECT_THROW(VXLog::setRecordSink([](const VXLog::Record&) {}), std::length_error);
+    ThrowingCopy::fail = false;
+    line("x");
+    EXPECT_EQ(ThrowingCopy::calls, 1);
+    VXLog::setRecordSink(nullptr);
 }
 
 }  // namespace

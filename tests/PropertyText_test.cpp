@@ -552,4 +552,49 @@ TEST(PropertyByteText, NamesEveryByte)
                   std::string({digits[byte / 16], digits[byte % 16]}));
 }
 
+TEST(PropertyComparison, AfterARefusedSetKindIsUnequalAndNotOrdered)
+{
+    for (const PropertyValue& original : samples()) {
+        if (original.getKind() == PropertyValue::KIND_UNKNOWN)
+            continue;
+        SCOPED_TRACE(seen(original));
+        PropertyValue gone(original);
+        EXPECT_THROW(gone.setKind(7), PropertyValueInvalidKind);
+        observe::reset();
+        EXPECT_FALSE(gone == original);
+        EXPECT_FALSE(original == gone);
+        EXPECT_FALSE(gone < original);
+        EXPECT_FALSE(gone > original);
+        EXPECT_FALSE(original < gone);
+        EXPECT_FALSE(original > gone);
+        EXPECT_TRUE(gone == PropertyValue(gone));
+        EXPECT_FALSE(gone < PropertyValue(gone));
+        EXPECT_FALSE(gone > PropertyValue(gone));
+        EXPECT_TRUE(observe::records().empty());
+    }
+}
+
+TEST(PropertyStream, WritesNulBytes)
+{
+    std::ostringstream out;
+    out << PropertyValue(std::string("a\0b", 3));
+    EXPECT_EQ(out.str(), std::string("a\0b", 3));
+}
+
+TEST(PropertyText, FollowsTheLocaleThatWasGlobalAtItsStart)
+{
+    const PropertyValue value(NumberArray {Number(5L, 1), Number(1234567u)});
+    std::string text;
+    {
+        const GlobalGroupingLocale restore(3);
+        std::locale::global(std::locale::classic());
+        observe::onRecord([](const observe::Record&) { std::locale::global(groupingLocale()); });
+        text = value.operator std::string();
+        observe::onRecord(nullptr);
+        std::locale::global(std::locale::classic());
+    }
+    std::locale::global(std::locale::classic());
+    EXPECT_EQ(text, "{5/3.Conversion failed remainder>0, 1234567}");
+}
+
 }  // namespace

@@ -651,4 +651,67 @@ TEST(PropertySwap, WithItselfChangesNothing)
     }
 }
 
+TEST(PropertyAssignment, LeavesEveryElementWhenOneThatGrowsFindsNoMemory)
+{
+    // The target's array has room for the source's elements; the elements themselves have not.
+    const std::string grown = "an element that needs memory of its own";
+    const PropertyValue source(IC::StringArray {grown, grown}, true);
+    PropertyValue target(IC::StringArray {"a", "b", "c"});
+    const std::string before = seen(target);
+    for (long allowed = 0;; ++allowed) {
+        ASSERT_LT(allowed, 100);
+        if (completesWith(allowed, [&] { target = source; }))
+            break;
+        EXPECT_EQ(seen(target), before) << "with memory for " << allowed << " allocations";
+    }
+    EXPECT_EQ(seen(target), seen(source));
+}
+
+TEST(PropertyKind, RefusedChangeLeavesAValueThatCanBeCopiedMovedAndSwapped)
+{
+    for (const PropertyValue& original : samples(true)) {
+        SCOPED_TRACE(seen(original));
+        PropertyValue value(original);
+        EXPECT_THROW(value.setKind(7), PropertyValueInvalidKind);
+        const std::string left = seen(value);
+
+        EXPECT_EQ(seen(PropertyValue(value)), left);
+        for (const PropertyValue& old : otherSamples()) {
+            PropertyValue target(old);
+            target = value;  // also onto a value of its own kind
+            EXPECT_EQ(seen(target), left);
+        }
+        PropertyValue other("other");
+        other.swap(value);
+        EXPECT_EQ(seen(other), left);
+        EXPECT_EQ(seen(value), "2 writable: other");
+        const PropertyValue moved(std::move(other));
+        EXPECT_EQ(seen(moved), left);
+    }
+}
+
+TEST(PropertyAssignment, ToItselfNeedsNoMemoryAndMovingToItselfKeepsTheValue)
+{
+    for (PropertyValue& value : std::vector<PropertyValue>(samples(true))) {
+        const std::string before = seen(value);
+        PropertyValue& itself = value;
+        EXPECT_EQ(countOf([&] { value = itself; }), 0);
+        EXPECT_EQ(seen(value), before);
+        value = std::move(itself);
+        EXPECT_EQ(seen(value), before);
+    }
+}
+
+TEST(PropertyConstructor, TakesTheMemoryOfTemporaries)
+{
+    std::string text = "a text that needs memory of its own";
+    IC::Buffer bytes(5, 1);
+    IC::NumberArray numbers(3, Number(1u));
+    IC::StringArray texts(3, text);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(text)); }), 1);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(bytes)); }), 1);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(numbers)); }), 1);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(texts)); }), 1);
+}
+
 }  // namespace

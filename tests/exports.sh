@@ -17,8 +17,8 @@ fi
 
 # What must be there, once for each kind of name.
 for name in 'IC::pst' 'IC::pB' 'IC::Number::setKind' 'IC::EnumValue::operator std::' 'IC::PropertyValue::setKind' \
-    'IC::Error::Error' 'IC::Alert::hexstring' 'IC::Node::Node' 'IC::operator<<' 'IC::operator==' \
-    'typeinfo for IC::ICException' 'typeinfo for IC::PropertyValueInvalidKind' \
+    'IC::Error::Error' 'IC::Alert::hexstring' 'IC::Node::Node' 'IC::operator<<' 'IC::operator==(IC::Number' 'IC::operator<(IC::PropertyValue' \
+    'typeinfo name for IC::ICException' 'typeinfo for IC::ICException' 'typeinfo for IC::PropertyValueInvalidKind' \
     'typeinfo for IC::NodeInvalidSensor' 'typeinfo for IC::Node' 'vtable for IC::Node'; do
     if ! echo "$exported" | grep -qF "$name"; then
         echo "not exported: $name" >&2

@@ -19,6 +19,8 @@ namespace IC {
 //
 //   IC::Alert alert(2, 1, {"/fan/1"}, 5, "Fan failed");
 //   std::cout << alert;                        // Alert 2; 1; 5; Fan failed; <time>; { 2f66616e2f31 }
+//
+// Severity and class are bytes: they print as characters; write `out << +alert.getSeverity()`.
 class __attribute__((visibility("default"))) Alert {
 public:
     // The codes are numbers without names; these are the first and the last.

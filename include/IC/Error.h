@@ -17,7 +17,9 @@ namespace IC {
 //   IC::Error error("no such property", IC::Error::STATUS_NO_SUCH_PROPERTY);
 //   std::cout << error;                        // 5 - no such property
 //
-// Mind the order of the arguments: the constructor of three takes the status first, the others last.
+// Mind the order of the arguments: the constructor of three takes the status first, the others last. A literal 0
+// for the number is taken for a null text: write Number(0). The status is a byte: it prints as a character; write
+// `out << +error.getStatus()`, or the error itself.
 class __attribute__((visibility("default"))) Error {
 public:
     // 1 to 4 and 6 to 15 are valid as well; their meaning is the caller's.
@@ -33,7 +35,7 @@ public:
     //
     //     "initstatus: Invalid error status="
     //       "Invalid error status"
-    Error(const Number& value, unsigned char status);
+    Error(const Number& value, unsigned char status) : value_(value) { initStatus(status); }
     Error(unsigned char status, const Number& value, const std::string& message);
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
@@ -53,7 +55,13 @@ public:
     operator std::string() const;
 
 private:
-    void initStatus(unsigned char status);
+    void initStatus(unsigned char status)
+    {
+        if (status > STATUS_READ_ONLY)
+            refuse(status);
+        status_ = static_cast<StatusType>(status);
+    }
+    [[noreturn, gnu::cold]] static void refuse(unsigned char status);
 
     StatusType status_ = STATUS_SUCCESS;
     Number value_;

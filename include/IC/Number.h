@@ -5,6 +5,7 @@
 #include <iosfwd>
 #include <string>
 #include <type_traits>
+#include <vector>
 
 #include "ZQ/DateTime.h"
 #include "ZQ/Types.h"
@@ -21,6 +22,7 @@ class Number;
 namespace IC::detail {
 class Text;
 void append(Text& text, const Number& number);
+void append(Text& text, const std::vector<Number>& numbers);
 }  // namespace IC::detail
 
 #pragma GCC visibility push(default)
@@ -58,7 +60,7 @@ using NodeRef = sNodeRef;
 // - unsigned char is a kind code: Number(static_cast<unsigned char>(3)) is the kind KIND_UINT32 with 0.
 //   unsigned short and char widen to int and give a signed number.
 // - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
-// - A signed number converts to int and to nothing else; a negative real converts to no integer.
+// - A signed number converts to int and to nothing else; a real of -1 or less converts to no integer.
 // - Two signed numbers are always equal and never ordered; so are two node references.
 class __attribute__((visibility("default"))) Number {
 public:
@@ -103,12 +105,19 @@ public:
     Number(const unsigned char& code);
 
     // The same; every refusal is initKind's.
-    Number(const KindType& kind);
+    Number(const KindType& kind) : Number(Tag(), kind)
+    {
+        if (kind != KIND_UNKNOWN)
+            initKind(kind);
+    }
 
-    // A pointer would silently become a flag.
+    // A pointer would silently become a flag, and an enumeration of one byte (such as Error::StatusType) a kind
+    // code. Write Number(static_cast<unsigned int>(value)).
     template <class T>
     Number(T*) = delete;
     Number(std::nullptr_t) = delete;
+    template <class T, std::enable_if_t<std::is_enum_v<T> && sizeof(T) == 1, int> = 0>
+    Number(T) = delete;
 
     KindType getKind() const noexcept { return kind_; }
     operator KindType() const noexcept { return kind_; }
@@ -137,10 +146,10 @@ public:
     //
     //   to                  takes
     //   bool                flag; uint32, uint64 and real, whether not 0 (NaN is true)
-    //   int                 flag, int; uint32, and uint64 and reals from 0 to below 2^32, of which the low 32
-    //                       bits are taken as signed; its refusals are those of unsigned int
-    //   unsigned int        flag, uint32; uint64 and reals below 2^32
-    //   unsigned long long  flag, uint32, uint64; reals below 2^64
+    //   int                 flag, int; and what unsigned int takes, with the 32 bits taken as signed; its
+    //                       refusals are those of unsigned int
+    //   unsigned int        flag, uint32; uint64 below 2^32; reals above -1 and below 2^32
+    //   unsigned long long  flag, uint32, uint64; reals above -1 and below 2^64
     //   double              flag, uint32, uint64, real, NaN, infinity; a version as major.minor (2.15)
     //   Version2            version; uint32 and uint64 up to 255, as the major number
     //   ZQ::DateTime        date-time of scope 1 to 3
@@ -204,6 +213,7 @@ private:
     friend bool operator<(const Number& a, const Number& b);
     friend bool operator>(const Number& a, const Number& b);
     friend void detail::append(detail::Text& text, const Number& number);
+    friend void detail::append(detail::Text& text, const std::vector<Number>& numbers);
 
     struct Tag { };
 
@@ -253,7 +263,15 @@ private:
     Version2 toVersion() const;
     [[noreturn, gnu::cold]] sNodeRef refuseNodeRef() const;
 
+    static bool equal(const Number& a, const Number& b);
+    static bool less(const Number& a, const Number& b);
+    static bool greater(const Number& a, const Number& b);
     static bool precedes(const Number& a, const Number& b);
+    // Whether both are of this kind, for the kinds that are compared most.
+    static bool both(KindType kind, const Number& a, const Number& b)
+    {
+        return a.kind_ == kind && b.kind_ == kind;
+    }
 
     KindType kind_;
     // The kind's content at its start. Bytes, because setKind lets one kind's be read as another's.
@@ -268,12 +286,19 @@ static_assert(std::is_trivially_copyable_v<sNodeRef>);
 // Equality never fails. Numbers of different kinds are unequal. Signed numbers are all equal, and so are node
 // references, and the kinds without a value. Date-times are equal whatever their scope; a real NaN equals
 // nothing.
-bool operator==(const Number& a, const Number& b);
+[[gnu::visibility("default")]] inline bool operator==(const Number& a, const Number& b)
+{
+    if (Number::both(Number::KIND_UINT32, a, b))
+        return a.load<ZQ::Uint32>() == b.load<ZQ::Uint32>();
+    if (Number::both(Number::KIND_REAL, a, b))
+        return a.load<ZQ::Real64>() == b.load<ZQ::Real64>();
+    return Number::equal(a, b);
+}
 bool operator!=(const Number& a, const Number& b);
 
 // Less-than and greater-than, within one kind. Kinds without a value, signed numbers and node references are
-// neither less nor greater. Infinity on the left is never less and always greater than what is not infinity,
-// of any kind; infinity on the right of another kind is refused.
+// neither less nor greater. KIND_INFINITY on the left is never less, and greater than every other kind but
+// KIND_NAN; on the right of another kind it is refused.
 //
 // The refusals, with std::invalid_argument: what is logged (for > it begins with ">"), and below it what the
 // exception says.
@@ -284,8 +309,22 @@ bool operator!=(const Number& a, const Number& b);
 //   the kinds differ
 //     "<: cannot compare two different kinds of number, kind1=3, kind2=4"
 //       "Cannot compare two different kinds of number"
-bool operator<(const Number& a, const Number& b);
-bool operator>(const Number& a, const Number& b);
+[[gnu::visibility("default")]] inline bool operator<(const Number& a, const Number& b)
+{
+    if (Number::both(Number::KIND_UINT32, a, b))
+        return a.load<ZQ::Uint32>() < b.load<ZQ::Uint32>();
+    if (Number::both(Number::KIND_REAL, a, b))
+        return a.load<ZQ::Real64>() < b.load<ZQ::Real64>();
+    return Number::less(a, b);
+}
+[[gnu::visibility("default")]] inline bool operator>(const Number& a, const Number& b)
+{
+    if (Number::both(Number::KIND_UINT32, a, b))
+        return a.load<ZQ::Uint32>() > b.load<ZQ::Uint32>();
+    if (Number::both(Number::KIND_REAL, a, b))
+        return a.load<ZQ::Real64>() > b.load<ZQ::Real64>();
+    return Number::greater(a, b);
+}
 
 // a == b, or else a < b (a > b): equal numbers are never refused.
 bool operator<=(const Number& a, const Number& b);

@@ -24,7 +24,8 @@ using StringArray = std::vector<std::string>;
 //
 // A value type: a copy is independent of its source. One object belongs to one thread at a time. Every
 // refusal but one (to EnumValue) writes a log record and a trace record (category "Vexilon.IC.Property",
-// level 6000) and then throws. Where memory runs out, std::bad_alloc is thrown and the value is as it was.
+// level 6000) and then throws. Where memory runs out, std::bad_alloc is thrown and, but for a
+// refused setKind, the value is as it was.
 //
 //   IC::PropertyValue model("DCS8000Z", true); // a read-only text
 //   std::string text = model;                  // DCS8000Z
@@ -35,8 +36,8 @@ using StringArray = std::vector<std::string>;
 // Rules that look odd and are meant:
 // - PropertyValue(5) is an empty array of numbers: an integer, as a byte, is a kind code. Write
 //   PropertyValue(IC::Number(5)) for the number.
-// - Write `IC::Buffer b = value;`, not `IC::Buffer b(value);`: a vector can also be made from a size, and the
-//   second is ambiguous. The same holds for the arrays, Number and EnumValue.
+// - Write `IC::StringArray texts = value;`, never `{value}`: braces make an array of one element.
+//   To an existing std::string assign `std::string(value)`; `text = value` does not compile.
 // - No operation here looks at the read-only mark; assignment replaces it.
 class __attribute__((visibility("default"))) PropertyValue {
 public:
@@ -50,18 +51,48 @@ public:
         KIND_STRINGARRAY = 6   // a StringArray
     };
 
-    PropertyValue(const std::string& value, const bool& readOnly = false);
-    PropertyValue(std::string&& value, const bool& readOnly = false);
+    PropertyValue(const std::string& value, const bool& readOnly = false)
+        : PropertyValue(new std::string(value), KIND_STRING, readOnly)
+    {
+    }
+    PropertyValue(std::string&& value, const bool& readOnly = false)
+        : PropertyValue(new std::string(std::move(value)), KIND_STRING, readOnly)
+    {
+    }
     // Up to the terminating NUL. Throws std::logic_error for a null pointer.
     PropertyValue(const char* value, const bool& readOnly = false);
-    PropertyValue(const Number& value, const bool& readOnly = false);
-    PropertyValue(const EnumValue& value, const bool& readOnly = false);
-    PropertyValue(const Buffer& value, const bool& readOnly = false);
-    PropertyValue(Buffer&& value, const bool& readOnly = false);
-    PropertyValue(const NumberArray& value, const bool& readOnly = false);
-    PropertyValue(NumberArray&& value, const bool& readOnly = false);
-    PropertyValue(const StringArray& value, const bool& readOnly = false);
-    PropertyValue(StringArray&& value, const bool& readOnly = false);
+    PropertyValue(const Number& value, const bool& readOnly = false)
+        : PropertyValue(new Number(value), KIND_NUMBER, readOnly)
+    {
+    }
+    PropertyValue(const EnumValue& value, const bool& readOnly = false)
+        : PropertyValue(new EnumValue(value), KIND_ENUMVALUE, readOnly)
+    {
+    }
+    PropertyValue(const Buffer& value, const bool& readOnly = false)
+        : PropertyValue(new Buffer(value), KIND_BUFFER, readOnly)
+    {
+    }
+    PropertyValue(Buffer&& value, const bool& readOnly = false)
+        : PropertyValue(new Buffer(std::move(value)), KIND_BUFFER, readOnly)
+    {
+    }
+    PropertyValue(const NumberArray& value, const bool& readOnly = false)
+        : PropertyValue(new NumberArray(value), KIND_NUMBERARRAY, readOnly)
+    {
+    }
+    PropertyValue(NumberArray&& value, const bool& readOnly = false)
+        : PropertyValue(new NumberArray(std::move(value)), KIND_NUMBERARRAY, readOnly)
+    {
+    }
+    PropertyValue(const StringArray& value, const bool& readOnly = false)
+        : PropertyValue(new StringArray(value), KIND_STRINGARRAY, readOnly)
+    {
+    }
+    PropertyValue(StringArray&& value, const bool& readOnly = false)
+        : PropertyValue(new StringArray(std::move(value)), KIND_STRINGARRAY, readOnly)
+    {
+    }
 
     // The first value of the kind with this code: a Number of kind 0, an EnumValue of 0, or an empty text,
     // buffer or array. Codes of 7 and above are refused with PropertyValueInvalidKind: what is logged, with the
@@ -74,26 +105,67 @@ public:
     // The same. The code is cut to its low 8 bits first, so 257 is KIND_NUMBER (deliberate).
     PropertyValue(const KindType& kind, const bool& readOnly = false);
 
-    // Flags, reals and other enumerations would silently become a kind code. Write Number(value) or
-    // EnumValue(value).
+private:
     template <class T>
     static constexpr bool notAKind =
         std::disjunction_v<std::is_same<T, bool>, std::is_floating_point<T>,
                            std::conjunction<std::is_enum<T>, std::negation<std::is_same<T, KindType>>>>;
+
+public:
+    // Flags, reals and other enumerations would silently become a kind code. Write Number(value) or
+    // EnumValue(value).
     template <class T, std::enable_if_t<notAKind<T>, int> = 0>
     PropertyValue(T, const bool& = false) = delete;
 
     // A copy has the source's mark; assignment replaces the mark by the source's, whatever it was.
-    PropertyValue(const PropertyValue& source);
-    PropertyValue& operator=(const PropertyValue& source);
+    PropertyValue(const PropertyValue& source) : kind_(source.kind_), readOnly_(source.readOnly_)
+    {
+        if (const auto* number = source.held<Number>(KIND_NUMBER))
+            value_ = new Number(*number);
+        else
+            copyObject(source);
+    }
+    PropertyValue& operator=(const PropertyValue& source)
+    {
+        auto* const number = held<Number>(KIND_NUMBER);
+        const auto* const newNumber = source.held<Number>(KIND_NUMBER);
+        if (number == nullptr || newNumber == nullptr) {
+            assign(source);
+            return *this;
+        }
+        *number = *newNumber;
+        readOnly_ = source.readOnly_;
+        return *this;
+    }
 
     // Moves allocate nothing. The source is left with KIND_UNKNOWN and its mark.
-    PropertyValue(PropertyValue&& source) noexcept;
-    PropertyValue& operator=(PropertyValue&& source) noexcept;
-    void swap(PropertyValue& other) noexcept;
+    PropertyValue(PropertyValue&& source) noexcept
+        : value_(std::exchange(source.value_, nullptr)),
+          kind_(std::exchange(source.kind_, KIND_UNKNOWN)),
+          readOnly_(source.readOnly_)
+    {
+    }
+    PropertyValue& operator=(PropertyValue&& source) noexcept
+    {
+        if (this != &source) {
+            PropertyValue moved(std::move(source));
+            swap(moved);
+        }
+        return *this;
+    }
+    void swap(PropertyValue& other) noexcept
+    {
+        std::swap(value_, other.value_);
+        std::swap(kind_, other.kind_);
+        std::swap(readOnly_, other.readOnly_);
+    }
     friend void swap(PropertyValue& a, PropertyValue& b) noexcept { a.swap(b); }
 
-    ~PropertyValue() { freeValue(); }
+    ~PropertyValue()
+    {
+        if (value_ != nullptr)
+            freeValue();
+    }
 
     KindType getKind() const noexcept { return kind_; }
     operator KindType() const noexcept { return kind_; }
@@ -204,24 +276,47 @@ public:
     //   bytes        two hexadecimal digits a byte, and a blank after every fourth byte, also the last
     //   numbers      {1, 2}
     //   texts        {"a\"b", ""}: double quotes inside get a backslash, nothing else is escaped
-    operator std::string() const;
+    operator std::string() const
+    {
+        const auto* text = held<std::string>(KIND_STRING);
+        return text != nullptr ? *text : toText();
+    }
 
 private:
     friend bool operator==(const PropertyValue& a, const PropertyValue& b);
     friend bool operator<(const PropertyValue& a, const PropertyValue& b);
     friend bool operator>(const PropertyValue& a, const PropertyValue& b);
 
+    // Takes over the object.
+    PropertyValue(void* object, KindType kind, const bool& readOnly) noexcept
+        : value_(object),
+          kind_(kind),
+          readOnly_(readOnly)
+    {
+    }
+
     // Null also for a value that a refused setKind left without an object.
+    template <class T>
+    T* held(KindType kind) noexcept
+    {
+        return kind_ == kind ? static_cast<T*>(value_) : nullptr;
+    }
     template <class T>
     const T* held(KindType kind) const noexcept
     {
         return kind_ == kind ? static_cast<const T*>(value_) : nullptr;
     }
 
+    void copyObject(const PropertyValue& source);
+    void assign(const PropertyValue& source);
     void initKind(const unsigned char& kind);
     void freeValue() noexcept;
+    static bool equal(const PropertyValue& a, const PropertyValue& b);
+    static bool less(const PropertyValue& a, const PropertyValue& b);
+    static bool greater(const PropertyValue& a, const PropertyValue& b);
     static bool precedes(const PropertyValue& a, const PropertyValue& b);
 
+    std::string toText() const;
     ZQ::Real64 toReal() const;
     ZQ::Uint64 toUint64() const;
     ZQ::Uint32 toUint32() const;
@@ -241,7 +336,18 @@ private:
 
 // Equality never fails. Values of different kinds are unequal; the read-only mark is not compared. Numbers
 // and enumerated values compare as Number and EnumValue do, everything else by its bytes or elements.
-bool operator==(const PropertyValue& a, const PropertyValue& b);
+[[gnu::visibility("default")]] inline bool operator==(const PropertyValue& a, const PropertyValue& b)
+{
+    using Value = PropertyValue;
+    if (const auto* x = a.held<Number>(Value::KIND_NUMBER), *y = b.held<Number>(Value::KIND_NUMBER); x && y)
+        return *x == *y;
+    if (const auto* x = a.held<std::string>(Value::KIND_STRING), *y = b.held<std::string>(Value::KIND_STRING);
+        x && y)
+        return *x == *y;
+    if (const auto* x = a.held<Buffer>(Value::KIND_BUFFER), *y = b.held<Buffer>(Value::KIND_BUFFER); x && y)
+        return *x == *y;
+    return Value::equal(a, b);
+}
 bool operator!=(const PropertyValue& a, const PropertyValue& b);
 
 // Within one kind: numbers and enumerated values as Number and EnumValue do, refusals included; the others
@@ -251,8 +357,26 @@ bool operator!=(const PropertyValue& a, const PropertyValue& b);
 //
 //     "<: cannot compare two different kinds of properties, kind1=2, kind2=1"
 //       "Cannot compare two different kinds of properties"
-bool operator<(const PropertyValue& a, const PropertyValue& b);
-bool operator>(const PropertyValue& a, const PropertyValue& b);
+[[gnu::visibility("default")]] inline bool operator<(const PropertyValue& a, const PropertyValue& b)
+{
+    using Value = PropertyValue;
+    if (const auto* x = a.held<Number>(Value::KIND_NUMBER), *y = b.held<Number>(Value::KIND_NUMBER); x && y)
+        return *x < *y;
+    if (const auto* x = a.held<std::string>(Value::KIND_STRING), *y = b.held<std::string>(Value::KIND_STRING);
+        x && y)
+        return *x < *y;
+    return Value::less(a, b);
+}
+[[gnu::visibility("default")]] inline bool operator>(const PropertyValue& a, const PropertyValue& b)
+{
+    using Value = PropertyValue;
+    if (const auto* x = a.held<Number>(Value::KIND_NUMBER), *y = b.held<Number>(Value::KIND_NUMBER); x && y)
+        return *x > *y;
+    if (const auto* x = a.held<std::string>(Value::KIND_STRING), *y = b.held<std::string>(Value::KIND_STRING);
+        x && y)
+        return *x > *y;
+    return Value::greater(a, b);
+}
 
 // a == b, or else a < b (a > b): equal values are never refused.
 bool operator<=(const PropertyValue& a, const PropertyValue& b);

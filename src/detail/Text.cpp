@@ -1,80 +1,118 @@
 #include "detail/Text.h"
 
-#include <charconv>
-#include <cstdlib>
+#include <cmath>
 #include <stdexcept>
 
 namespace IC::detail {
 
 namespace {
 
-constexpr char digits[] = "0123456789abcdef";
+// Writes a real with six significant digits where they can be had quickly and are certain, and returns the end;
+// null where they are not.
+//
+// The real is brought to six digits before the point by one multiplication with a power of ten that is exact, so
+// the product is off by less than 2^-33 of a unit. Where it is further than that from the middle between two
+// integers, the nearest integer is the one that the real itself rounds to.
+char* writeSixDigits(char* out, double real)
+{
+    constexpr double smallest[] = {1e5, 1e4, 1e3, 1e2, 1e1, 1e0, 1e-1, 1e-2, 1e-3, 1e-4};
+    constexpr double power[] = {1e0, 1e1, 1e2, 1e3, 1e4, 1e5, 1e6, 1e7, 1e8, 1e9};
+    constexpr int digits = 6;
+    constexpr double uncertain = 0x1p-30;
+
+    const double magnitude = std::fabs(real);
+    if (!(magnitude >= 1e-4 && magnitude < 1e6))
+        return nullptr;
+    int decimals = 0;
+    while (magnitude < smallest[decimals])
+        ++decimals;
+    const double product = magnitude * power[decimals];
+    auto number = static_cast<unsigned int>(product);
+    const double rest = product - number;
+    if (std::fabs(rest - 0.5) <= uncertain)
+        return nullptr;
+    number += rest > 0.5 ? 1 : 0;
+    if (number < 100000 || number > 999999)
+        return nullptr;
+
+    char digit[digits];
+    for (int i = digits; i-- > 0; number /= 10)
+        digit[i] = static_cast<char>('0' + number % 10);
+    int significant = digits;
+    while (digit[significant - 1] == '0')
+        --significant;
+
+    if (real < 0)
+        *out++ = '-';
+    const int beforePoint = digits - decimals;
+    if (beforePoint <= 0) {
+        *out++ = '0';
+        *out++ = '.';
+        for (int i = beforePoint; i < 0; ++i)
+            *out++ = '0';
+        return std::copy(digit, digit + significant, out);
+    }
+    out = std::copy(digit, digit + beforePoint, out);
+    if (significant <= beforePoint)
+        return out;
+    *out++ = '.';
+    return std::copy(digit + beforePoint, digit + significant, out);
+}
 
 }  // namespace
 
-// A locale other than the classic one may group digits or write them otherwise, which only its own facets
-// know; those numbers go through a stream.
-template <class T, class... Format>
-void Text::addNumber(T number, Format... format)
+// A copy of one's own is found sooner than the standard library's.
+[[gnu::init_priority(101)]] static const std::locale classicLocale = std::locale::classic();
+
+Text::Text()
 {
-    if (!classic()) {
-        addStreamed(number);
-        return;
-    }
-    char buffer[32];  // more than the 20 digits of the largest integer and the 13 characters of any real
-    const auto end = std::to_chars(buffer, buffer + sizeof buffer, number, format...).ptr;
-    text_.append(buffer, end);
+    std::locale global;
+    if (global != classicLocale)
+        locale_ = std::move(global);
 }
 
 void Text::add(int number)
 {
-    if (!classic()) {
+    if (locale_) {
         addStreamed(number);
         return;
     }
     if (number < 0)
-        text_ += '-';
+        add('-');
     add(static_cast<unsigned int>(std::abs(static_cast<long long>(number))));
-}
-
-void Text::add(unsigned int number)
-{
-    addNumber(number);
-}
-
-void Text::add(unsigned long long number)
-{
-    addNumber(number);
 }
 
 void Text::add(double number)
 {
-    addNumber(number, std::chars_format::general, 6);  // a stream's default form
+    if (locale_) {
+        addStreamed(number);
+        return;
+    }
+    constexpr std::size_t longest = 13;  // -1.23457e+308
+    write(longest, [number](char* out) {
+        char* const end = writeSixDigits(out, number);
+        return end != nullptr ? end
+                              : std::to_chars(out, out + longest, number, std::chars_format::general, 6).ptr;
+    });
 }
 
-void Text::addHex(unsigned char byte)
+void Text::grow(std::size_t length)
 {
-    text_ += digits[byte >> 4];
-    text_ += digits[byte & 0x0F];
+    const bool first = long_.empty();
+    long_.resize(std::max(used_ + length, 2 * room_));
+    if (first)
+        std::memcpy(long_.data(), short_, used_);
+    text_ = long_.data();
+    room_ = long_.size();
 }
 
-void Text::addHex(std::string_view bytes)
+std::string hexOf(std::string_view bytes)
 {
+    std::string hex(2 * bytes.size(), '0');
+    char* out = hex.data();
     for (const char byte : bytes)
-        addHex(static_cast<unsigned char>(byte));
-}
-
-const std::locale& Text::locale()
-{
-    if (!locale_)
-        classic_ = locale_.emplace() == std::locale::classic();
-    return *locale_;
-}
-
-bool Text::classic()
-{
-    locale();
-    return classic_;
+        out = writeHex(out, static_cast<unsigned char>(byte));
+    return hex;
 }
 
 const char* checked(const char* text)

@@ -1,5 +1,11 @@
 #pragma once
 
+#include <algorithm>
+#include <charconv>
+#include <cstddef>
+#include <cstdlib>
+#include <cstring>
+#include <limits>
 #include <locale>
 #include <optional>
 #include <ostream>
@@ -7,6 +13,7 @@
 #include <string>
 #include <string_view>
 #include <utility>
+#include <vector>
 
 namespace IC {
 class EnumValue;
@@ -15,48 +22,125 @@ class Number;
 
 namespace IC::detail {
 
-// Collects a text form piece by piece. The text is what a fresh std::ostringstream would give under the
-// global locale, which is asked for once a text, but memory that runs out is thrown, not swallowed.
+// The two lower-case hexadecimal digits of each byte, one after another.
+struct HexDigits {
+    constexpr HexDigits()
+    {
+        constexpr char digits[] = "0123456789abcdef";
+        for (std::size_t byte = 0; byte < 256; ++byte) {
+            pairs[2 * byte] = digits[byte / 16];
+            pairs[2 * byte + 1] = digits[byte % 16];
+        }
+    }
+    char pairs[512] = {};
+};
+inline constexpr HexDigits hexDigits;
+
+// Returns the end of what it wrote.
+inline char* writeHex(char* out, unsigned char byte)
+{
+    std::memcpy(out, hexDigits.pairs + 2 * std::size_t {byte}, 2);
+    return out + 2;
+}
+
+// The bytes in hexadecimal.
+std::string hexOf(std::string_view bytes);
+
+// Collects a text form piece by piece. The text is what a fresh std::ostringstream would give under the global
+// locale, which is asked for at the start, but memory that runs out is thrown, not swallowed.
 class Text {
 public:
-    void add(std::string_view piece) { text_ += piece; }
-    void add(char piece) { text_ += piece; }
+    Text();
+
+    // Makes room for so many further characters at once.
+    void reserve(std::size_t length) { room(length); }
+
+    // `writer` is given the place for so many characters and returns the end of what it wrote.
+    template <class Writer>
+    void write(std::size_t longest, Writer writer)
+    {
+        char* const start = room(longest);
+        used_ += static_cast<std::size_t>(writer(start) - start);
+    }
+
+    void add(std::string_view piece)
+    {
+        std::memcpy(room(piece.size()), piece.data(), piece.size());
+        used_ += piece.size();
+    }
+    void add(char piece)
+    {
+        *room(1) = piece;
+        ++used_;
+    }
     void add(int number);
-    void add(unsigned int number);
-    void add(unsigned long long number);
+    void add(unsigned int number) { addInteger("", number); }
+    void add(unsigned long long number) { addInteger("", number); }
     void add(double number);
+
+    // With what separates it from the number before it: one step for both.
+    template <class T>
+    void addInteger(std::string_view separator, T number)
+    {
+        if (locale_) {
+            add(separator);
+            addStreamed(number);
+            return;
+        }
+        constexpr std::size_t longest = std::numeric_limits<T>::digits10 + 1;
+        write(separator.size() + longest, [separator, number](char* out) {
+            out = std::copy(separator.begin(), separator.end(), out);
+            return std::to_chars(out, out + longest, number).ptr;
+        });
+    }
 
     // By the type's own stream insertion.
     template <class T>
     void addStreamed(const T& piece)
     {
         std::ostringstream out;
-        out.imbue(locale());
+        if (locale_)
+            out.imbue(*locale_);
         out.exceptions(std::ios_base::badbit);
         out << piece;
-        text_ += out.str();
+        add(out.str());
     }
 
-    // Two lower-case hexadecimal digits a byte.
-    void addHex(unsigned char byte);
-    void addHex(std::string_view bytes);
+    std::string take()
+    {
+        if (long_.empty())
+            return std::string(short_, used_);
+        long_.resize(used_);
+        return std::move(long_);
+    }
 
-    std::string take() { return std::move(text_); }
+    Text(const Text&) = delete;
+    Text& operator=(const Text&) = delete;
 
 private:
-    const std::locale& locale();
-    bool classic();
+    // Where the next characters go; there is room for so many.
+    char* room(std::size_t length)
+    {
+        if (room_ - used_ < length)
+            grow(length);
+        return text_ + used_;
+    }
+    void grow(std::size_t length);
 
-    template <class T, class... Format>
-    void addNumber(T number, Format... format);
-
-    std::string text_;
-    std::optional<std::locale> locale_;  // the global one, once it has been asked for
-    bool classic_ = false;
+    // Most texts are short and need no memory before they are taken.
+    char short_[96];
+    std::string long_;
+    char* text_ = short_;
+    std::size_t room_ = sizeof short_;
+    std::size_t used_ = 0;
+    // Where it is not the classic one. It may group digits or write them otherwise, which only its own facets
+    // know: numbers then go through a stream.
+    std::optional<std::locale> locale_;
 };
 
 // The text forms that containers write too.
 void append(Text& text, const Number& number);
+void append(Text& text, const std::vector<Number>& numbers);
 void append(Text& text, const EnumValue& value);
 
 // The text itself; throws std::logic_error for a null pointer, which not every std::string notices.

@@ -37,12 +37,15 @@ bool Mutex::lock(unsigned int timeoutMilliseconds)
         return false;
     owner_ = std::this_thread::get_id();
     ++depth_;
-    return note({this, true, timeoutMilliseconds, depth_, 0});
+    const bool result = note({this, true, timeoutMilliseconds, depth_, 0});
+    observe::held(true);
+    return result;
 }
 
 void Mutex::unlock()
 {
     const std::lock_guard<std::mutex> guard(guard_);
+    observe::held(false);
     --depth_;
     note({this, false, 0, depth_, 0});
     released_.notify_one();  // under the guard: the thread that wakes may destroy this mutex

@@ -11,6 +11,7 @@ namespace observe {
 struct State {
     std::vector<Record> records;
     std::function<void(const Record&)> action;
+    std::function<void(bool)> lockAction;
     std::vector<LockCall> lockCalls;
     bool lockResult = true;
     long clockSeconds = 1000000000;
@@ -37,6 +38,9 @@ void count(int Observed::*counter, int change);
 
 // Seconds and milliseconds of the clock; the reading is counted.
 std::pair<long, unsigned int> readClock();
+
+// Calls what onLock has set.
+void held(bool lock);
 
 // To be called at the start of each call that can be made to throw.
 void reached(Call call);

@@ -64,6 +64,18 @@ void onRecord(std::function<void(const Record&)> action)
     guarded([&](Observed& all) { all.state.action = std::move(action); });
 }
 
+void onLock(std::function<void(bool)> action)
+{
+    guarded([&](Observed& all) { all.state.lockAction = std::move(action); });
+}
+
+void held(bool lock)
+{
+    const auto action = guarded([](Observed& all) { return all.state.lockAction; });
+    if (action)
+        action(lock);
+}
+
 std::vector<LockCall> lockCalls()
 {
     return guarded([](Observed& all) { return all.state.lockCalls; });

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <ostream>
-#include <sstream>
 #include <string>
 
 #pragma GCC visibility push(default)
@@ -32,10 +31,11 @@ public:
     const std::string& str(VXMessageBuffer& last);
 
 private:
+    struct Composer;
+
     const std::string& take();
 
-    std::ostringstream stream_;
-    std::string text_;
+    Composer* composer_;  // the thread's own, or a further one where a record is composed while another is
 };
 
 // Every other type, by its own stream insertion.

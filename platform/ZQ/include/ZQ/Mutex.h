@@ -10,20 +10,29 @@ namespace ZQ {
 // Every operation may be called from any thread.
 class __attribute__((visibility("default"))) Mutex {
 public:
-    Mutex();
-    ~Mutex();
+    Mutex() = default;
     Mutex(const Mutex&) = delete;
     Mutex& operator=(const Mutex&) = delete;
 
     // Waits at most `timeoutMilliseconds`, 0 not at all, 0xFFFFFFFF for ever. Returns whether the calling
     // thread now holds the mutex (once more). Throws std::system_error where the system refuses the lock,
     // such as for a depth of nesting that it cannot count.
-    bool lock(unsigned int timeoutMilliseconds);
+    bool lock(unsigned int timeoutMilliseconds)
+    {
+        if (timeoutMilliseconds != forEver)
+            return lockWithin(timeoutMilliseconds);
+        mutex_.lock();
+        return true;
+    }
 
     // Gives back one lock. The calling thread must hold the mutex.
-    void unlock();
+    void unlock() { mutex_.unlock(); }
 
 private:
+    static constexpr unsigned int forEver = 0xFFFFFFFF;
+
+    bool lockWithin(unsigned int timeoutMilliseconds);
+
     std::recursive_timed_mutex mutex_;
 };
 

@@ -49,6 +49,9 @@ std::vector<LockCall> lockCalls();
 // How many locks are held, over all mutexes and threads.
 int locksHeld();
 
+// Called while the mutex is held: at the end of each lock (true) and at the start of each unlock (false).
+void onLock(std::function<void(bool lock)> action);
+
 // What ZQ::Mutex::lock returns from now on; the mutex is obtained all the same.
 void setLockResult(bool obtained);
 

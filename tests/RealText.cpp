@@ -1,0 +1,88 @@
+// Compares the texts of so many reals (the argument) with those of fresh streams: random bits, random decimals of up
+// to nine digits, halfway cases, powers of ten and of two with their neighbours, denormals. Ends with 1 at the first
+// difference.
+#include <cmath>
+#include <cstdint>
+#include <cstdlib>
+#include <cstring>
+#include <iostream>
+#include <limits>
+#include <random>
+#include <sstream>
+
+#include "IC/Number.h"
+
+namespace {
+
+std::mt19937_64 randomBits(20260801);
+
+bool agree(double real)
+{
+    std::ostringstream stream;
+    stream << real;
+    if (std::string(IC::Number(real)) == stream.str())
+        return true;
+    std::cout << std::hexfloat << real << " is written " << std::string(IC::Number(real)) << " instead of "
+              << stream.str() << '\n';
+    return false;
+}
+
+bool agreeAround(double real)
+{
+    constexpr double infinity = std::numeric_limits<double>::infinity();
+    return agree(real) && agree(-real) && agree(std::nextafter(real, infinity))
+        && agree(std::nextafter(real, -infinity));
+}
+
+bool agreeAtEdges()
+{
+    bool same = agreeAround(0.0) && agreeAround(std::numeric_limits<double>::infinity())
+        && agree(std::numeric_limits<double>::quiet_NaN()) && agree(-std::numeric_limits<double>::quiet_NaN())
+        && agreeAround(std::numeric_limits<double>::denorm_min());
+    for (int exponent = -1074; exponent <= 1023; ++exponent)
+        same = same && agreeAround(std::ldexp(1.0, exponent));
+    for (int exponent = -323; exponent <= 308; ++exponent) {
+        for (const char* digits : {"1", "9.99999", "9.999995", "9.9999949999", "1.000005", "1.234565", "5"})
+            same = same
+                && agreeAround(std::strtod((digits + ("e" + std::to_string(exponent))).c_str(), nullptr));
+    }
+    return same;
+}
+
+double ofRandomBits()
+{
+    const std::uint64_t bits = randomBits();
+    double real = 0.0;
+    std::memcpy(&real, &bits, sizeof real);
+    return real;
+}
+
+// A decimal of up to nine digits with the point somewhere.
+double randomDecimal()
+{
+    const auto digits = static_cast<double>(randomBits() % 1000000000);
+    return digits / std::pow(10.0, static_cast<double>(randomBits() % 16));
+}
+
+// Six digits and a five: in the middle between two texts, as near as a real comes to it.
+double halfway()
+{
+    const auto digits = static_cast<double>((randomBits() % 1000000) * 10 + 5);
+    const double real = digits / std::pow(10.0, static_cast<double>(randomBits() % 13));
+    return std::nextafter(real, randomBits() % 2 == 0 ? 0.0 : 1e9);
+}
+
+}  // namespace
+
+int main(int argc, char** argv)
+{
+    const long long count = argc > 1 ? std::atoll(argv[1]) : 100000000;
+    bool same = agreeAtEdges();
+    for (long long i = 0; same && i < count / 4; ++i) {
+        const double decimal = randomDecimal();
+        same = agree(ofRandomBits()) && agree(decimal) && agree(-decimal) && agree(halfway());
+    }
+    if (same)
+        std::cout << count << " reals are written as streams write them\n";
+    return same ? EXIT_SUCCESS : EXIT_FAILURE;
+}
