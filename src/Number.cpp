@@ -317,7 +317,7 @@ Number::operator std::string() const
     return detail::textOf(*this);
 }
 
-// The header has compared the kinds that are not named here and have a value.
+// The header has compared 32-bit numbers and reals; two of a kind that is not named here are equal.
 bool Number::equal(const Number& a, const Number& b)
 {
     if (a.kind_ != b.kind_)
@@ -351,6 +351,7 @@ bool operator!=(const Number& a, const Number& b)
     return !(a == b);
 }
 
+// For two of a kind; of a kind that is not named here, neither precedes.
 bool Number::precedes(const Number& a, const Number& b)
 {
     switch (a.kind_) {

@@ -126,8 +126,6 @@ void PropertyValue::copyObject(const PropertyValue& source)
 
 void PropertyValue::assign(const PropertyValue& source)
 {
-    if (this == &source)
-        return;
     if (kind_ != source.kind_ || value_ == nullptr || source.value_ == nullptr) {
         PropertyValue copy(source);
         swap(copy);

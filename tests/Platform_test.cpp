@@ -10,6 +10,7 @@
 #include <ctime>
 #include <iomanip>
 #include <limits>
+#include <memory>
 #include <sstream>
 #include <stdexcept>
 #include <thread>
@@ -239,6 +240,57 @@ TEST(MessageBuffer, WritesNumbersPlainWhateverTheLocale)
     const GlobalGroupingLocale grouping;
     VXLog::VXMessageBuffer buffer;
     EXPECT_EQ(buffer.str(buffer << "" << 1234567u << " " << 1.5), "1234567 1.5");
+}
+
+TEST(MessageBuffer, BeginsAnewWhateverWasDoneToTheStreamOfTheOneBefore)
+{
+    {
+        VXLog::VXMessageBuffer buffer;
+        std::ostream& stream = buffer << "left behind" << 1u;
+        stream << std::hex << std::setfill('*') << std::setprecision(2) << std::setw(9);
+        stream.imbue(groupingLocale());
+        stream.setstate(std::ios_base::failbit);
+    }
+    VXLog::VXMessageBuffer buffer;
+    EXPECT_EQ(buffer.str(buffer << "" << 1234567ull << ' ' << 1234567 << ' ' << 0.123456),
+              "1234567 1234567 0.123456");
+}
+
+TEST(MessageBuffer, MayBeComposedWhileAnotherIs)
+{
+    VXLog::VXMessageBuffer outer;
+    std::ostream& last = outer << "outer " << 1u;
+    {
+        VXLog::VXMessageBuffer inner;
+        EXPECT_EQ(inner.str(inner << "inner " << 2u), "inner 2");
+    }
+    EXPECT_EQ(outer.str(last << " still"), "outer 1 still");
+}
+
+TEST(MessageBuffer, MayEndOnAnotherThread)
+{
+    auto buffer = std::make_unique<VXLog::VXMessageBuffer>();
+    EXPECT_EQ(buffer->str(*buffer << "made here"), "made here");
+    std::thread([&buffer] { buffer.reset(); }).join();
+    std::thread([&buffer] { buffer = std::make_unique<VXLog::VXMessageBuffer>(); }).join();
+    EXPECT_EQ(buffer->str(*buffer << "made there"), "made there");
+}
+
+// One that is used before and after the thread's own composer is gone.
+VXLog::VXMessageBuffer& globalBuffer()
+{
+    static VXLog::VXMessageBuffer buffer;
+    return buffer;
+}
+
+TEST(MessageBuffer, MayOutliveItsThread)
+{
+    EXPECT_EXIT(
+        {
+            globalBuffer() << "used before the end";
+            std::exit(0);
+        },
+        testing::ExitedWithCode(0), "");
 }
 
 TEST(MessageBuffer, HoldsTextsWithNulBytes)

@@ -64,12 +64,13 @@ double randomDecimal()
     return digits / std::pow(10.0, static_cast<double>(randomBits() % 16));
 }
 
-// Six digits and a five: in the middle between two texts, as near as a real comes to it.
+// Six digits and a five: in the middle between two texts or next to it, as near as a real comes.
 double halfway()
 {
     const auto digits = static_cast<double>((randomBits() % 1000000) * 10 + 5);
     const double real = digits / std::pow(10.0, static_cast<double>(randomBits() % 13));
-    return std::nextafter(real, randomBits() % 2 == 0 ? 0.0 : 1e9);
+    const auto choice = randomBits() % 3;
+    return choice == 0 ? real : std::nextafter(real, choice == 1 ? 0.0 : 1e9);
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cstring>
+#include <functional>
 #include <iosfwd>
 #include <string>
 #include <type_traits>
@@ -291,7 +292,7 @@ static_assert(std::is_trivially_copyable_v<sNodeRef>);
     if (Number::both(Number::KIND_UINT32, a, b))
         return a.load<ZQ::Uint32>() == b.load<ZQ::Uint32>();
     if (Number::both(Number::KIND_REAL, a, b))
-        return a.load<ZQ::Real64>() == b.load<ZQ::Real64>();
+        return std::equal_to<>()(a.load<ZQ::Real64>(), b.load<ZQ::Real64>());
     return Number::equal(a, b);
 }
 bool operator!=(const Number& a, const Number& b);

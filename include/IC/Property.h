@@ -127,13 +127,13 @@ public:
     }
     PropertyValue& operator=(const PropertyValue& source)
     {
-        auto* const number = held<Number>(KIND_NUMBER);
-        const auto* const newNumber = source.held<Number>(KIND_NUMBER);
-        if (number == nullptr || newNumber == nullptr) {
+        if (this == &source)
+            return *this;
+        if (!bothHold(KIND_NUMBER, *this, source)) {
             assign(source);
             return *this;
         }
-        *number = *newNumber;
+        *held<Number>(KIND_NUMBER) = *source.held<Number>(KIND_NUMBER);
         readOnly_ = source.readOnly_;
         return *this;
     }
@@ -307,6 +307,12 @@ private:
         return kind_ == kind ? static_cast<const T*>(value_) : nullptr;
     }
 
+    // Whether both have an object of this kind.
+    static bool bothHold(KindType kind, const PropertyValue& a, const PropertyValue& b) noexcept
+    {
+        return a.kind_ == kind && b.kind_ == kind && a.value_ != nullptr && b.value_ != nullptr;
+    }
+
     void copyObject(const PropertyValue& source);
     void assign(const PropertyValue& source);
     void initKind(const unsigned char& kind);
@@ -339,13 +345,12 @@ private:
 [[gnu::visibility("default")]] inline bool operator==(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
-    if (const auto* x = a.held<Number>(Value::KIND_NUMBER), *y = b.held<Number>(Value::KIND_NUMBER); x && y)
-        return *x == *y;
-    if (const auto* x = a.held<std::string>(Value::KIND_STRING), *y = b.held<std::string>(Value::KIND_STRING);
-        x && y)
-        return *x == *y;
-    if (const auto* x = a.held<Buffer>(Value::KIND_BUFFER), *y = b.held<Buffer>(Value::KIND_BUFFER); x && y)
-        return *x == *y;
+    if (Value::bothHold(Value::KIND_NUMBER, a, b))
+        return *a.held<Number>(Value::KIND_NUMBER) == *b.held<Number>(Value::KIND_NUMBER);
+    if (Value::bothHold(Value::KIND_STRING, a, b))
+        return *a.held<std::string>(Value::KIND_STRING) == *b.held<std::string>(Value::KIND_STRING);
+    if (Value::bothHold(Value::KIND_BUFFER, a, b))
+        return *a.held<Buffer>(Value::KIND_BUFFER) == *b.held<Buffer>(Value::KIND_BUFFER);
     return Value::equal(a, b);
 }
 bool operator!=(const PropertyValue& a, const PropertyValue& b);
@@ -360,21 +365,19 @@ bool operator!=(const PropertyValue& a, const PropertyValue& b);
 [[gnu::visibility("default")]] inline bool operator<(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
-    if (const auto* x = a.held<Number>(Value::KIND_NUMBER), *y = b.held<Number>(Value::KIND_NUMBER); x && y)
-        return *x < *y;
-    if (const auto* x = a.held<std::string>(Value::KIND_STRING), *y = b.held<std::string>(Value::KIND_STRING);
-        x && y)
-        return *x < *y;
+    if (Value::bothHold(Value::KIND_NUMBER, a, b))
+        return *a.held<Number>(Value::KIND_NUMBER) < *b.held<Number>(Value::KIND_NUMBER);
+    if (Value::bothHold(Value::KIND_STRING, a, b))
+        return *a.held<std::string>(Value::KIND_STRING) < *b.held<std::string>(Value::KIND_STRING);
     return Value::less(a, b);
 }
 [[gnu::visibility("default")]] inline bool operator>(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
-    if (const auto* x = a.held<Number>(Value::KIND_NUMBER), *y = b.held<Number>(Value::KIND_NUMBER); x && y)
-        return *x > *y;
-    if (const auto* x = a.held<std::string>(Value::KIND_STRING), *y = b.held<std::string>(Value::KIND_STRING);
-        x && y)
-        return *x > *y;
+    if (Value::bothHold(Value::KIND_NUMBER, a, b))
+        return *a.held<Number>(Value::KIND_NUMBER) > *b.held<Number>(Value::KIND_NUMBER);
+    if (Value::bothHold(Value::KIND_STRING, a, b))
+        return *a.held<std::string>(Value::KIND_STRING) > *b.held<std::string>(Value::KIND_STRING);
     return Value::greater(a, b);
 }
 

@@ -99,8 +99,7 @@ public:
     void addStreamed(const T& piece)
     {
         std::ostringstream out;
-        if (locale_)
-            out.imbue(*locale_);
+        out.imbue(locale_ ? *locale_ : std::locale::classic());
         out.exceptions(std::ios_base::badbit);
         out << piece;
         add(out.str());

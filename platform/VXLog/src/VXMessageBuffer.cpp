@@ -3,6 +3,7 @@
 #include <charconv>
 #include <iterator>
 #include <locale>
+#include <memory>
 #include <streambuf>
 
 namespace VXLog {
@@ -29,10 +30,8 @@ protected:
     }
 };
 
-// What has become of the composer that the thread keeps. It outlives that composer: objects of the program may
-// write records after it is gone.
-enum class Kept { free, busy, gone };
-thread_local Kept kept = Kept::free;
+// Whether the thread's composer is gone already: objects of the program may write records after it.
+thread_local bool isGone = false;
 
 }  // namespace
 
@@ -45,7 +44,7 @@ struct VXMessageBuffer::Composer {
         stream.exceptions(std::ios_base::badbit);
     }
 
-    // As new, but for the memory of texts of ordinary length.
+    // As new, whatever was done to the stream, but for the memory of texts of ordinary length.
     void reset()
     {
         constexpr std::size_t ordinaryLength = 4096;
@@ -54,51 +53,52 @@ struct VXMessageBuffer::Composer {
             if (text->capacity() > ordinaryLength)
                 std::string().swap(*text);
         }
-        stream.clear();
+        stream.rdbuf(&buffer);  // clears the state too
+        stream.exceptions(std::ios_base::badbit);
+        stream.tie(nullptr);
+        if (stream.getloc() != std::locale::classic())
+            stream.imbue(std::locale::classic());
         stream.flags(std::ios_base::dec | std::ios_base::skipws);
         stream.precision(6);
         stream.width(0);
         stream.fill(' ');
     }
 
-    static Composer& ofThread()
-    {
-        struct Owner {
-            ~Owner() { kept = Kept::gone; }
-            Composer composer;
-        };
-        thread_local Owner owner;
-        return owner.composer;
-    }
+    // The one that the thread keeps while no buffer has it.
+    static std::unique_ptr<Composer>& kept();
 
     TextBuffer buffer;
     std::ostream stream;
     std::string taken;
 };
 
-VXMessageBuffer::VXMessageBuffer()
+std::unique_ptr<VXMessageBuffer::Composer>& VXMessageBuffer::Composer::kept()
 {
-    if (kept == Kept::free) {
-        composer_ = &Composer::ofThread();
-        kept = Kept::busy;
-    } else {
-        composer_ = new Composer;
-    }
+    struct Owner {
+        ~Owner() { isGone = true; }
+        std::unique_ptr<Composer> composer;
+    };
+    thread_local Owner owner;
+    return owner.composer;
+}
+
+VXMessageBuffer::VXMessageBuffer()
+    : composer_(!isGone && Composer::kept() ? Composer::kept().release() : new Composer)
+{
 }
 
 VXMessageBuffer::~VXMessageBuffer()
 {
-    if (kept == Kept::busy && composer_ == &Composer::ofThread()) {
-        composer_->reset();
-        kept = Kept::free;
-    } else {
+    composer_->reset();
+    if (isGone || Composer::kept())
         delete composer_;
-    }
+    else
+        Composer::kept().reset(composer_);
 }
 
 VXMessageBuffer& VXMessageBuffer::operator<<(const char* text)
 {
-    composer_->buffer.text += text;
+    composer_->stream << text;
     return *this;
 }
 
@@ -106,7 +106,7 @@ VXMessageBuffer& VXMessageBuffer::operator<<(const char* text)
 std::ostream& VXMessageBuffer::operator<<(unsigned int number)
 {
     char digits[10];
-    const auto end = std::to_chars(std::begin(digits), std::end(digits), number).ptr;
+    auto* const end = std::to_chars(std::begin(digits), std::end(digits), number).ptr;
     composer_->buffer.text.append(digits, end);
     return composer_->stream;
 }

@@ -9,7 +9,8 @@ namespace VXLog {
 
 // Composes the text of a record: pieces go in with <<, the text comes out with str.
 //
-// Numbers are written in the classic locale, so that a record reads the same in every program. Where memory
+// Numbers are written in the classic locale, so that a record reads the same in every program; unsigned int and
+// double take no heed of what manipulators have set. Where memory
 // runs out, the insertion throws std::bad_alloc; a text is never cut short. One buffer belongs to one thread.
 class __attribute__((visibility("default"))) VXMessageBuffer {
 public:
@@ -35,7 +36,7 @@ private:
 
     const std::string& take();
 
-    Composer* composer_;  // the thread's own, or a further one where a record is composed while another is
+    Composer* composer_;  // owned; the thread keeps one for the next buffer
 };
 
 // Every other type, by its own stream insertion.
