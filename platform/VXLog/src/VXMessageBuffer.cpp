@@ -114,7 +114,7 @@ std::ostream& VXMessageBuffer::operator<<(unsigned int number)
 std::ostream& VXMessageBuffer::operator<<(double number)
 {
     char text[13];  // -1.23457e+308
-    const auto end =
+    auto* const end =
         std::to_chars(std::begin(text), std::end(text), number, std::chars_format::general, 6).ptr;
     composer_->buffer.text.append(text, end);
     return composer_->stream;
