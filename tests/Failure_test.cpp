@@ -539,8 +539,8 @@ TEST(FailurePath, AnyThreadMayRefuseAtAnyTime)
 TEST(FailurePath, TheExceptionIsBuiltAfterBothRecords)
 {
     const std::pair<const char*, std::function<void()>> refusing[] = {
-        {"Number", [] { Number(Number::KIND_INT); }},
-        {"PropertyValue", [] { PropertyValue(static_cast<unsigned char>(7)); }},
+        {"Number", [] { static_cast<void>(Number(Number::KIND_INT)); }},
+        {"PropertyValue", [] { static_cast<void>(PropertyValue(static_cast<unsigned char>(7))); }},
         {"Node", [] { const Node node(74); }},
     };
     for (const auto& [name, refuse] : refusing) {
