@@ -42,9 +42,10 @@ bool agreeAtEdges()
     for (int exponent = -1074; exponent <= 1023; ++exponent)
         same = same && agreeAround(std::ldexp(1.0, exponent));
     for (int exponent = -323; exponent <= 308; ++exponent) {
+        const std::string power = std::to_string(exponent);
         for (const char* digits : {"1", "9.99999", "9.999995", "9.9999949999", "1.000005", "1.234565", "5"})
             same = same
-                && agreeAround(std::strtod((digits + ("e" + std::to_string(exponent))).c_str(), nullptr));
+                && agreeAround(std::strtod(std::string(digits).append("e").append(power).c_str(), nullptr));
     }
     return same;
 }
