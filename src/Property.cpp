@@ -19,6 +19,12 @@ detail::Where here(const char* function, int line = __builtin_LINE())
     return {function, "Property", line, loggerProperty};
 }
 
+// For a record, which reads it anew each time.
+auto kindOf(const PropertyValue& value)
+{
+    return [&value]() -> ZQ::Uint32 { return value.getKind(); };
+}
+
 constexpr char notANumber[] = "Can't return current value as a Number";
 
 // The old elements stay until the new ones are complete; not every vector's own assignment sees to that.
@@ -100,8 +106,6 @@ PropertyValue::PropertyValue(const KindType& kind, const bool& readOnly) : readO
 // Called for what holds no object yet.
 void PropertyValue::copyObject(const PropertyValue& source)
 {
-    if (source.value_ == nullptr)
-        return;
     switch (kind_) {
     case KIND_UNKNOWN:
     case KIND_NUMBER:
@@ -126,7 +130,7 @@ void PropertyValue::copyObject(const PropertyValue& source)
 
 void PropertyValue::assign(const PropertyValue& source)
 {
-    if (kind_ != source.kind_ || value_ == nullptr || source.value_ == nullptr) {
+    if (kind_ != source.kind_) {
         PropertyValue copy(source);
         swap(copy);
         return;
@@ -184,14 +188,12 @@ void PropertyValue::initKind(const unsigned char& kind)
     kind_ = static_cast<KindType>(kind);
 }
 
-void PropertyValue::freeValue() noexcept
+void PropertyValue::freeObject() noexcept
 {
     switch (kind_) {
     case KIND_UNKNOWN:
-        break;
     case KIND_NUMBER:
-        delete static_cast<Number*>(value_);
-        break;
+        break;  // not here: nothing to free, or freed in the header
     case KIND_STRING:
         delete static_cast<std::string*>(value_);
         break;
@@ -208,15 +210,17 @@ void PropertyValue::freeValue() noexcept
         delete static_cast<StringArray*>(value_);
         break;
     }
-    value_ = nullptr;
 }
 
 void PropertyValue::setKind(const unsigned char& kind)
 {
-    if (kind == kind_)
+    if (kind == getKind())
         return;
-    if (kind > KIND_STRINGARRAY)
-        freeValue();  // a refused code costs the old value; a valid one only once the new value exists
+    if (kind > KIND_STRINGARRAY && value_ != nullptr) {
+        release();  // a refused code costs the old value; a valid one only once the new value exists
+        value_ = nullptr;
+        kind_ = static_cast<KindType>(kind_ | without);
+    }
     PropertyValue fresh(kind, readOnly_);
     swap(fresh);
 }
@@ -227,7 +231,7 @@ ZQ::Real64 PropertyValue::toReal() const
         return value->operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Real64"), notANumber,
-        "PropertyValue:Real64: can't return current value as a Real64, kind=", kind_);
+        "PropertyValue:Real64: can't return current value as a Real64, kind=", kindOf(*this));
 }
 
 ZQ::Uint64 PropertyValue::toUint64() const
@@ -236,7 +240,7 @@ ZQ::Uint64 PropertyValue::toUint64() const
         return value->operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint64"), notANumber,
-        "PropertyValue:Uint64: can't return current value as a Uint64, kind=", kind_);
+        "PropertyValue:Uint64: can't return current value as a Uint64, kind=", kindOf(*this));
 }
 
 ZQ::Uint32 PropertyValue::toUint32() const
@@ -245,28 +249,28 @@ ZQ::Uint32 PropertyValue::toUint32() const
         return value->operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint32"), notANumber,
-        "PropertyValue::Uint32: can't return current value as a Uint32, kind=", kind_);
+        "PropertyValue::Uint32: can't return current value as a Uint32, kind=", kindOf(*this));
 }
 
 bool PropertyValue::refuseBool() const
 {
     detail::fail<PropertyValueInvalidKind>(
         here("operator bool"), notANumber,
-        "PropertyValue::bool: can't return current value as a bool, kind=", kind_);
+        "PropertyValue::bool: can't return current value as a bool, kind=", kindOf(*this));
 }
 
 Number PropertyValue::refuseNumber() const
 {
     detail::fail<PropertyValueInvalidKind>(
         here("operator IC::Number"), notANumber,
-        "PropertyValue:Number: can't return current value as a Number, kind=", kind_);
+        "PropertyValue:Number: can't return current value as a Number, kind=", kindOf(*this));
 }
 
 Version2 PropertyValue::refuseVersion() const
 {
     detail::fail<PropertyValueInvalidKind>(
         here("operator IC::Version2"), notANumber,
-        "PropertyValue:Version2: can't return current value as a Version2, kind=", kind_);
+        "PropertyValue:Version2: can't return current value as a Version2, kind=", kindOf(*this));
 }
 
 EnumValue PropertyValue::refuseEnumValue()
@@ -278,21 +282,21 @@ Buffer PropertyValue::refuseBuffer() const
 {
     detail::fail<PropertyValueInvalidKind>(
         here("operator IC::Buffer"), "Can't return current value as a Buffer",
-        "PropertyValue:Buffer: can't return current value as a Buffer, kind=", kind_);
+        "PropertyValue:Buffer: can't return current value as a Buffer, kind=", kindOf(*this));
 }
 
 NumberArray PropertyValue::refuseNumberArray() const
 {
     detail::fail<PropertyValueInvalidKind>(
         here("operator IC::NumberArray"), "Can't return current value as a NumberArray",
-        "PropertyValue:NumberArray: can't return current value as a NumberArray, kind=", kind_);
+        "PropertyValue:NumberArray: can't return current value as a NumberArray, kind=", kindOf(*this));
 }
 
 StringArray PropertyValue::refuseStringArray() const
 {
     detail::fail<PropertyValueInvalidKind>(
         here("operator IC::StringArray"), "Can't return current value as a StringArray",
-        "PropertyValue:StringArray: can't return current value as a StringArray, kind=", kind_);
+        "PropertyValue:StringArray: can't return current value as a StringArray, kind=", kindOf(*this));
 }
 
 std::string PropertyValue::toText() const
@@ -320,8 +324,6 @@ bool PropertyValue::equal(const PropertyValue& a, const PropertyValue& b)
 {
     if (a.kind_ != b.kind_)
         return false;
-    if (a.value_ == nullptr || b.value_ == nullptr)
-        return a.value_ == b.value_;
     switch (a.kind_) {
     case KIND_UNKNOWN:
     case KIND_NUMBER:
@@ -349,8 +351,8 @@ bool operator!=(const PropertyValue& a, const PropertyValue& b)
 
 bool PropertyValue::precedes(const PropertyValue& a, const PropertyValue& b)
 {
-    if (a.value_ == nullptr || b.value_ == nullptr)
-        return false;
+    if (a.kind_ != b.kind_)
+        return false;  // one of them has no object
     switch (a.kind_) {
     case KIND_UNKNOWN:
     case KIND_NUMBER:
@@ -370,19 +372,19 @@ bool PropertyValue::precedes(const PropertyValue& a, const PropertyValue& b)
 
 bool PropertyValue::less(const PropertyValue& a, const PropertyValue& b)
 {
-    if (a.kind_ != b.kind_)
+    if (a.getKind() != b.getKind())
         detail::fail<PropertyValueInvalidKind>(
             here("operator<"), "Cannot compare two different kinds of properties",
-            "<: cannot compare two different kinds of properties, kind1=", a.kind_, ", kind2=", b.kind_);
+            "<: cannot compare two different kinds of properties, kind1=", kindOf(a), ", kind2=", kindOf(b));
     return precedes(a, b);
 }
 
 bool PropertyValue::greater(const PropertyValue& a, const PropertyValue& b)
 {
-    if (a.kind_ != b.kind_)
+    if (a.getKind() != b.getKind())
         detail::fail<PropertyValueInvalidKind>(
             here("operator>"), "Cannot compare two different kinds of properties",
-            ">: cannot compare two different kinds of properties, kind1=", a.kind_, ", kind2=", b.kind_);
+            ">: cannot compare two different kinds of properties, kind1=", kindOf(a), ", kind2=", kindOf(b));
     return precedes(b, a);
 }
 

@@ -148,8 +148,10 @@ public:
     PropertyValue& operator=(PropertyValue&& source) noexcept
     {
         if (this != &source) {
-            PropertyValue moved(std::move(source));
-            swap(moved);
+            release();
+            value_ = std::exchange(source.value_, nullptr);
+            kind_ = std::exchange(source.kind_, KIND_UNKNOWN);
+            readOnly_ = source.readOnly_;
         }
         return *this;
     }
@@ -161,14 +163,10 @@ public:
     }
     friend void swap(PropertyValue& a, PropertyValue& b) noexcept { a.swap(b); }
 
-    ~PropertyValue()
-    {
-        if (value_ != nullptr)
-            freeValue();
-    }
+    ~PropertyValue() { release(); }
 
-    KindType getKind() const noexcept { return kind_; }
-    operator KindType() const noexcept { return kind_; }
+    KindType getKind() const noexcept { return static_cast<KindType>(kind_ & ~without); }
+    operator KindType() const noexcept { return getKind(); }
     bool readOnly() const noexcept { return readOnly_; }
 
     // Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
@@ -295,28 +293,44 @@ private:
     {
     }
 
-    // Null also for a value that a refused setKind left without an object.
+    // Marks a kind that a refused setKind left without an object: such a kind is none of those below, so that
+    // one comparison tells what is held.
+    static constexpr ZQ::Uint32 without = 8;
+
     template <class T>
     T* held(KindType kind) noexcept
     {
-        return kind_ == kind ? static_cast<T*>(value_) : nullptr;
+        return const_cast<T*>(std::as_const(*this).held<T>(kind));
     }
     template <class T>
     const T* held(KindType kind) const noexcept
     {
-        return kind_ == kind ? static_cast<const T*>(value_) : nullptr;
+        if (kind_ != kind)
+            return nullptr;
+        if (value_ == nullptr)
+            __builtin_unreachable();  // saves the caller, who tests what is returned, a second test
+        return static_cast<const T*>(value_);
     }
 
     // Whether both have an object of this kind.
     static bool bothHold(KindType kind, const PropertyValue& a, const PropertyValue& b) noexcept
     {
-        return a.kind_ == kind && b.kind_ == kind && a.value_ != nullptr && b.value_ != nullptr;
+        return a.kind_ == kind && b.kind_ == kind;
+    }
+
+    // Leaves the pointer as it is.
+    void release() noexcept
+    {
+        if (const auto* number = held<Number>(KIND_NUMBER))
+            delete number;
+        else if (value_ != nullptr)
+            freeObject();
     }
 
     void copyObject(const PropertyValue& source);
     void assign(const PropertyValue& source);
     void initKind(const unsigned char& kind);
-    void freeValue() noexcept;
+    void freeObject() noexcept;
     static bool equal(const PropertyValue& a, const PropertyValue& b);
     static bool less(const PropertyValue& a, const PropertyValue& b);
     static bool greater(const PropertyValue& a, const PropertyValue& b);
