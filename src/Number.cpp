@@ -474,19 +474,33 @@ void detail::append(Text& text, const Number& number)
     text.add("invalid");
 }
 
+// 32-bit numbers, the commonest, are written a run at once.
 void detail::append(Text& text, const std::vector<Number>& numbers)
 {
-    std::string_view separator = "{";
-    for (const Number& number : numbers) {
-        if (number.kind_ == Number::KIND_UINT32) {
-            text.addInteger(separator, number.load<ZQ::Uint32>());
+    const auto isUint32 = [](const Number& number) { return number.kind_ == Number::KIND_UINT32; };
+    text.add('{');
+    const auto end = numbers.end();
+    for (auto number = numbers.begin(); number != end;) {
+        const auto other = std::find_if_not(number, end, isUint32);
+        if (other != number && text.isClassic()) {
+            const std::size_t longest = 12 * static_cast<std::size_t>(other - number);  // 4294967295 and ", "
+            text.write(longest, [run = number, other](char* out) mutable {
+                for (; run != other; ++run) {
+                    out = writeDecimal(out, run->load<ZQ::Uint32>());
+                    *out++ = ',';
+                    *out++ = ' ';
+                }
+                return out;
+            });
+            number = other;
         } else {
-            text.add(separator);
-            append(text, number);
+            append(text, *number++);
+            text.add(", ");
         }
-        separator = ", ";
     }
-    text.add(numbers.empty() ? "{}" : "}");
+    if (!numbers.empty())
+        text.remove(2);
+    text.add('}');
 }
 
 }  // namespace IC

@@ -1472,6 +1472,31 @@ TEST(NumberText, OfADateTimeTakesAnyScope)
     }
 }
 
+TEST(NumberText, OfAnIntegerHasEveryDigitAtEveryLength)
+{
+    const auto expectText = [](ZQ::Uint64 integer) {
+        EXPECT_EQ(std::string(Number(integer)), std::to_string(integer));
+        const auto cut = static_cast<unsigned int>(integer & 0xFFFFFFFF);
+        EXPECT_EQ(std::string(Number(cut)), std::to_string(cut));
+        const int half = static_cast<int>(cut / 2);
+        EXPECT_EQ(std::string(Number(half)), std::to_string(half));
+        EXPECT_EQ(std::string(Number(-half)), std::to_string(-half));
+    };
+    for (ZQ::Uint64 integer = 0; integer < 20000; ++integer)
+        expectText(integer);
+    ZQ::Uint64 digits = 0;
+    ZQ::Uint64 power = 1;
+    for (unsigned int length = 1; length <= 20; ++length) {
+        expectText(power - 1);
+        expectText(power);
+        expectText(power + 1);
+        expectText(power * 9 / 7);
+        digits = digits * 10 + length % 10;
+        expectText(digits);
+        power = length < 20 ? power * 10 : power;
+    }
+}
+
 TEST(NumberText, OfADateTimeWithTheLastMillisecondDigitNotZeroSaysThatTheConversionFailed)
 {
     for (unsigned int digit = 1; digit <= 9; ++digit) {

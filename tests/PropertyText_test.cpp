@@ -365,6 +365,31 @@ TEST(PropertyText, KeepsEveryByteOfATextAndOfTheElements)
     EXPECT_EQ(texts({all}).operator std::string(), "{\"" + escaped + "\"}");
 }
 
+TEST(PropertyText, OfNumbersWritesOtherKindsAmongRunsOf32BitNumbers)
+{
+    EXPECT_EQ(numbers({Number(1u), Number(4294967295u), Number(12345ull), Number(true), Number(77777777u),
+                       Number(-1), Number(0u)})
+                  .
+                  operator std::string(),
+              "{1, 4294967295, 12345, true, 77777777, -1, 0}");
+    EXPECT_EQ(numbers({Number(2.5), Number(100u), Number(99u)}).operator std::string(), "{2.5, 100, 99}");
+}
+
+TEST(PropertyText, OfManyNumbersIsTheirTextsOneAfterAnother)
+{
+    NumberArray numbers;
+    std::string expected;
+    for (unsigned int i = 0; i < 3000; ++i) {
+        const unsigned int number = i * i * 477;  // up to ten digits
+        numbers.emplace_back(number);
+        expected += (expected.empty() ? "{" : ", ") + std::to_string(number);
+        if (i % 3 == 0) {
+            SCOPED_TRACE(i);
+            EXPECT_EQ(PropertyValue(numbers).operator std::string(), expected + "}");
+        }
+    }
+}
+
 TEST(PropertyText, OfNumbersWritesTheRecordsOfTheirTexts)
 {
     EXPECT_EQ(numbers({Number(5u), Number(1234567890L, 123)}).operator std::string(),

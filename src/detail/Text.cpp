@@ -17,7 +17,6 @@ char* writeSixDigits(char* out, double real)
 {
     constexpr double smallest[] = {1e5, 1e4, 1e3, 1e2, 1e1, 1e0, 1e-1, 1e-2, 1e-3, 1e-4};
     constexpr double power[] = {1e0, 1e1, 1e2, 1e3, 1e4, 1e5, 1e6, 1e7, 1e8, 1e9};
-    constexpr int digits = 6;
     constexpr double uncertain = 0x1p-30;
 
     const double magnitude = std::fabs(real);
@@ -35,28 +34,20 @@ char* writeSixDigits(char* out, double real)
     if (number < 100000 || number > 999999)
         return nullptr;
 
-    char digit[digits];
-    for (int i = digits; i-- > 0; number /= 10)
-        digit[i] = static_cast<char>('0' + number % 10);
-    int significant = digits;
-    while (digit[significant - 1] == '0')
-        --significant;
-
     if (real < 0)
         *out++ = '-';
-    const int beforePoint = digits - decimals;
-    if (beforePoint <= 0) {
-        *out++ = '0';
-        *out++ = '.';
-        for (int i = beforePoint; i < 0; ++i)
-            *out++ = '0';
-        return std::copy(digit, digit + significant, out);
-    }
-    out = std::copy(digit, digit + beforePoint, out);
-    if (significant <= beforePoint)
+    const auto scale = static_cast<unsigned int>(power[decimals]);
+    out = writeDecimal(out, number / scale);
+    unsigned int fraction = number % scale * static_cast<unsigned int>(power[9 - decimals]);  // nine digits
+    if (fraction == 0)
         return out;
     *out++ = '.';
-    return std::copy(digit + beforePoint, digit + significant, out);
+    *out++ = static_cast<char>('0' + fraction / 100000000);
+    fraction %= 100000000;
+    out = writeFourDigits(writeFourDigits(out, fraction / 10000), fraction % 10000);
+    while (out[-1] == '0')
+        --out;
+    return out;
 }
 
 }  // namespace
@@ -88,7 +79,7 @@ void Text::add(double number)
         addStreamed(number);
         return;
     }
-    constexpr std::size_t longest = 13;  // -1.23457e+308
+    constexpr std::size_t longest = 17;  // -123456.000000000 before it is shortened; -1.23457e+308 is shorter
     write(longest, [number](char* out) {
         char* const end = writeSixDigits(out, number);
         return end != nullptr ? end

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <charconv>
 #include <cstddef>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
@@ -22,25 +23,61 @@ class Number;
 
 namespace IC::detail {
 
-// The two lower-case hexadecimal digits of each byte, one after another.
-struct HexDigits {
-    constexpr HexDigits()
+// The two digits of each number that has so many, one number after another.
+template <unsigned int base>
+struct DigitPairs {
+    constexpr DigitPairs()
     {
         constexpr char digits[] = "0123456789abcdef";
-        for (std::size_t byte = 0; byte < 256; ++byte) {
-            pairs[2 * byte] = digits[byte / 16];
-            pairs[2 * byte + 1] = digits[byte % 16];
+        for (std::size_t number = 0; number < base * base; ++number) {
+            pairs[2 * number] = digits[number / base];
+            pairs[2 * number + 1] = digits[number % base];
         }
     }
-    char pairs[512] = {};
+    char pairs[2 * base * base] = {};
 };
-inline constexpr HexDigits hexDigits;
+inline constexpr DigitPairs<10> decimalDigits;
+inline constexpr DigitPairs<16> hexDigits;
 
-// Returns the end of what it wrote.
+// All of these return the end of what they wrote.
 inline char* writeHex(char* out, unsigned char byte)
 {
     std::memcpy(out, hexDigits.pairs + 2 * std::size_t {byte}, 2);
     return out + 2;
+}
+inline char* writeTwoDigits(char* out, std::uint32_t number)
+{
+    std::memcpy(out, decimalDigits.pairs + 2 * std::size_t {number}, 2);
+    return out + 2;
+}
+inline char* writeFourDigits(char* out, std::uint32_t number)
+{
+    return writeTwoDigits(writeTwoDigits(out, number / 100), number % 100);
+}
+inline char* writeUpToFourDigits(char* out, std::uint32_t number)
+{
+    if (number >= 1000)
+        return writeFourDigits(out, number);
+    if (number >= 100) {
+        *out++ = static_cast<char>('0' + number / 100);
+        return writeTwoDigits(out, number % 100);
+    }
+    if (number >= 10)
+        return writeTwoDigits(out, number);
+    *out++ = static_cast<char>('0' + number);
+    return out;
+}
+inline char* writeDecimal(char* out, std::uint64_t number)
+{
+    constexpr std::uint32_t eightDigits = 100000000;
+    if (number >= eightDigits)
+        out = writeDecimal(out, number / eightDigits);
+    const auto low = static_cast<std::uint32_t>(number % eightDigits);
+    if (number >= eightDigits)
+        return writeFourDigits(writeFourDigits(out, low / 10000), low % 10000);
+    if (low >= 10000)
+        return writeFourDigits(writeUpToFourDigits(out, low / 10000), low % 10000);
+    return writeUpToFourDigits(out, low);
 }
 
 // The bytes in hexadecimal.
@@ -73,6 +110,12 @@ public:
         *room(1) = piece;
         ++used_;
     }
+    // Takes back the last characters.
+    void remove(std::size_t length) { used_ -= length; }
+
+    // Whether numbers are written as the classic locale writes them.
+    bool isClassic() const { return !locale_; }
+
     void add(int number);
     void add(unsigned int number) { addInteger("", number); }
     void add(unsigned long long number) { addInteger("", number); }
@@ -90,7 +133,7 @@ public:
         constexpr std::size_t longest = std::numeric_limits<T>::digits10 + 1;
         write(separator.size() + longest, [separator, number](char* out) {
             out = std::copy(separator.begin(), separator.end(), out);
-            return std::to_chars(out, out + longest, number).ptr;
+            return writeDecimal(out, number);
         });
     }
 
@@ -127,7 +170,7 @@ private:
     void grow(std::size_t length);
 
     // Most texts are short and need no memory before they are taken.
-    char short_[96];
+    char short_[256];
     std::string long_;
     char* text_ = short_;
     std::size_t room_ = sizeof short_;
