@@ -1,0 +1,97 @@
+#!/usr/bin/env python3
+"""Counts the instructions that the commonest operations execute in the library, the stand-ins and their caller.
+
+The C and C++ libraries are left out: which instructions they choose depends on the processor. A table of earlier
+counts is compared, or written anew with --update.
+"""
+
+import argparse
+import pathlib
+import re
+import subprocess
+import sys
+import tempfile
+
+TOLERANCE = 0.03
+RUNS = (1000, 2000)  # the difference between the two is the operations alone
+OURS = re.compile(r"/(libIC|libZQ|libVXLog)\.so[.\d]*$|/instructions$")
+
+
+def executed(program, operation, count):
+    """The instructions executed in our own objects."""
+    with tempfile.TemporaryDirectory() as folder:
+        profile = pathlib.Path(folder, "profile")
+        subprocess.run(
+            ["valgrind", "--tool=callgrind", f"--callgrind-out-file={profile}", program, operation, str(count)],
+            check=True, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+        total = 0
+        objects = {}
+        ours = False
+        called = False
+        for line in profile.read_text().splitlines():
+            if match := re.match(r"ob=(\(\d+\))(?: (.*))?$", line):
+                if match[2]:
+                    objects[match[1]] = match[2]
+                ours = OURS.search(objects[match[1]]) is not None
+            elif match := re.match(r"cob=(\(\d+\))(?: (.*))?$", line):
+                if match[2]:
+                    objects[match[1]] = match[2]
+            elif line.startswith("calls="):
+                called = True  # the next line is what the callee costs
+            elif match := re.match(r"[+\-*\d]\S* (\d+)$", line):
+                if ours and not called:
+                    total += int(match[1])
+                called = False
+        return total
+
+
+def read_table(path):
+    table = {}
+    compiler = None
+    for line in path.read_text().splitlines():
+        if line.startswith("compiler "):
+            compiler = line.split(" ", 1)[1]
+        elif line and not line.startswith("#"):
+            operation, count = line.split()
+            table[operation] = float(count)
+    return compiler, table
+
+
+def main():
+    arguments = argparse.ArgumentParser(description=__doc__)
+    arguments.add_argument("program")
+    arguments.add_argument("compiler")
+    arguments.add_argument("table", type=pathlib.Path)
+    arguments.add_argument("--update", action="store_true")
+    options = arguments.parse_args()
+
+    compiler, table = read_table(options.table)
+    if not table:
+        sys.exit(f"{options.table} has no operations")
+    if compiler != options.compiler and not options.update:
+        sys.exit(f"{options.table} counts what {compiler} compiled, not {options.compiler}; "
+                 "write it anew with --update")
+
+    exceeded = []
+    counts = {}
+    print(f"{'operation':16} {'now':>9} {'table':>9} {'ratio':>6}")
+    for operation, before in table.items():
+        first, second = (executed(options.program, operation, count) for count in RUNS)
+        now = counts[operation] = (second - first) / (RUNS[1] - RUNS[0])
+        ratio = now / before
+        print(f"{operation:16} {now:9.1f} {before:9.1f} {ratio:6.3f}")
+        if not 1 - TOLERANCE <= ratio <= 1 + TOLERANCE:
+            exceeded.append(operation)
+
+    if options.update:
+        comments = [line for line in options.table.read_text().splitlines() if line.startswith("#")]
+        lines = comments + [f"compiler {options.compiler}"]
+        lines += [f"{operation} {count:.1f}" for operation, count in counts.items()]
+        options.table.write_text("\n".join(lines) + "\n")
+    elif exceeded:
+        sys.exit(f"More than 3 % from the table: {', '.join(exceeded)}. "
+                 "Where that is meant, write the table anew with --update")
+
+
+if __name__ == "__main__":
+    main()
