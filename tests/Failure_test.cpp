@@ -549,9 +549,9 @@ TEST(FailurePath, TheExceptionIsBuiltAfterBothRecords)
         for (long allowed = 0;; ++allowed) {
             ASSERT_LT(allowed, 1000);
             observe::reset();
-            const bool completed = allocation::completesWith(allowed, [&refuse = refuse] {
+            const bool completed = allocation::completesWith(allowed, [&operation = refuse] {
                 try {
-                    refuse();
+                    operation();
                 } catch (const std::bad_alloc&) {
                     throw;
                 } catch (...) {
