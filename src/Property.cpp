@@ -103,56 +103,53 @@ PropertyValue::PropertyValue(const KindType& kind, const bool& readOnly) : readO
     initKind(static_cast<unsigned char>(kind));
 }
 
-// Called for what holds no object yet.
+// Called for what holds no object yet. The header has copied numbers.
 void PropertyValue::copyObject(const PropertyValue& source)
 {
+    if (source.value_ == nullptr)
+        return;
     switch (kind_) {
-    case KIND_UNKNOWN:
-    case KIND_NUMBER:
-        break;  // not here: nothing to copy, or copied in the header
     case KIND_STRING:
-        value_ = new std::string(*source.held<std::string>(kind_));
+        value_ = new std::string(source.object<std::string>());
         break;
     case KIND_BUFFER:
-        value_ = new Buffer(*source.held<Buffer>(kind_));
+        value_ = new Buffer(source.object<Buffer>());
         break;
     case KIND_ENUMVALUE:
-        value_ = new EnumValue(*source.held<EnumValue>(kind_));
+        value_ = new EnumValue(source.object<EnumValue>());
         break;
     case KIND_NUMBERARRAY:
-        value_ = new NumberArray(*source.held<NumberArray>(kind_));
+        value_ = new NumberArray(source.object<NumberArray>());
         break;
-    case KIND_STRINGARRAY:
-        value_ = new StringArray(*source.held<StringArray>(kind_));
+    default:  // KIND_STRINGARRAY
+        value_ = new StringArray(source.object<StringArray>());
         break;
     }
 }
 
+// The header has assigned numbers.
 void PropertyValue::assign(const PropertyValue& source)
 {
-    if (kind_ != source.kind_) {
+    if (kind_ != source.kind_ || value_ == nullptr) {
         PropertyValue copy(source);
         swap(copy);
         return;
     }
     switch (kind_) {
-    case KIND_UNKNOWN:
-    case KIND_NUMBER:
-        break;  // not here: nothing to assign, or assigned in the header
     case KIND_STRING:
-        *held<std::string>(kind_) = *source.held<std::string>(kind_);
+        object<std::string>() = source.object<std::string>();
         break;
     case KIND_BUFFER:
-        replace(*held<Buffer>(kind_), *source.held<Buffer>(kind_));
+        replace(object<Buffer>(), source.object<Buffer>());
         break;
     case KIND_ENUMVALUE:
-        *held<EnumValue>(kind_) = *source.held<EnumValue>(kind_);
+        object<EnumValue>() = source.object<EnumValue>();
         break;
     case KIND_NUMBERARRAY:
-        replace(*held<NumberArray>(kind_), *source.held<NumberArray>(kind_));
+        replace(object<NumberArray>(), source.object<NumberArray>());
         break;
-    case KIND_STRINGARRAY:
-        replace(*held<StringArray>(kind_), *source.held<StringArray>(kind_));
+    default:  // KIND_STRINGARRAY
+        replace(object<StringArray>(), source.object<StringArray>());
         break;
     }
     readOnly_ = source.readOnly_;
@@ -188,26 +185,24 @@ void PropertyValue::initKind(const unsigned char& kind)
     kind_ = static_cast<KindType>(kind);
 }
 
+// The header has freed numbers.
 void PropertyValue::freeObject() noexcept
 {
     switch (kind_) {
-    case KIND_UNKNOWN:
-    case KIND_NUMBER:
-        break;  // not here: nothing to free, or freed in the header
     case KIND_STRING:
-        delete static_cast<std::string*>(value_);
+        delete &object<std::string>();
         break;
     case KIND_BUFFER:
-        delete static_cast<Buffer*>(value_);
+        delete &object<Buffer>();
         break;
     case KIND_ENUMVALUE:
-        delete static_cast<EnumValue*>(value_);
+        delete &object<EnumValue>();
         break;
     case KIND_NUMBERARRAY:
-        delete static_cast<NumberArray*>(value_);
+        delete &object<NumberArray>();
         break;
-    case KIND_STRINGARRAY:
-        delete static_cast<StringArray*>(value_);
+    default:  // KIND_STRINGARRAY
+        delete &object<StringArray>();
         break;
     }
 }
@@ -227,8 +222,8 @@ void PropertyValue::setKind(const unsigned char& kind)
 
 ZQ::Real64 PropertyValue::toReal() const
 {
-    if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
-        return value->operator unsigned int();
+    if (holds(KIND_ENUMVALUE))
+        return object<EnumValue>().operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Real64"), notANumber,
         "PropertyValue:Real64: can't return current value as a Real64, kind=", kindOf(*this));
@@ -236,8 +231,8 @@ ZQ::Real64 PropertyValue::toReal() const
 
 ZQ::Uint64 PropertyValue::toUint64() const
 {
-    if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
-        return value->operator unsigned int();
+    if (holds(KIND_ENUMVALUE))
+        return object<EnumValue>().operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint64"), notANumber,
         "PropertyValue:Uint64: can't return current value as a Uint64, kind=", kindOf(*this));
@@ -245,8 +240,8 @@ ZQ::Uint64 PropertyValue::toUint64() const
 
 ZQ::Uint32 PropertyValue::toUint32() const
 {
-    if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
-        return value->operator unsigned int();
+    if (holds(KIND_ENUMVALUE))
+        return object<EnumValue>().operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint32"), notANumber,
         "PropertyValue::Uint32: can't return current value as a Uint32, kind=", kindOf(*this));
@@ -305,17 +300,17 @@ std::string PropertyValue::toText() const
         return "unknown";
     if (value_ == nullptr)
         return "invalid";
-    if (const auto* bytes = held<Buffer>(KIND_BUFFER))
-        return textOf(*bytes);
+    if (holds(KIND_BUFFER))
+        return textOf(object<Buffer>());
     detail::Text text;
-    if (const auto* number = held<Number>(KIND_NUMBER))
-        append(text, *number);
-    else if (const auto* value = held<EnumValue>(KIND_ENUMVALUE))
-        append(text, *value);
-    else if (const auto* numbers = held<NumberArray>(KIND_NUMBERARRAY))
-        append(text, *numbers);
-    else if (const auto* texts = held<StringArray>(KIND_STRINGARRAY))
-        addTexts(text, *texts);
+    if (holds(KIND_NUMBER))
+        append(text, object<Number>());
+    else if (holds(KIND_ENUMVALUE))
+        append(text, object<EnumValue>());
+    else if (holds(KIND_NUMBERARRAY))
+        append(text, object<NumberArray>());
+    else  // KIND_STRINGARRAY: the header has answered for texts
+        addTexts(text, object<StringArray>());
     return text.take();
 }
 
@@ -324,20 +319,16 @@ bool PropertyValue::equal(const PropertyValue& a, const PropertyValue& b)
 {
     if (a.kind_ != b.kind_)
         return false;
+    if (a.value_ == nullptr)
+        return true;
     switch (a.kind_) {
-    case KIND_UNKNOWN:
-    case KIND_NUMBER:
-    case KIND_STRING:
-    case KIND_BUFFER:
-        break;
     case KIND_ENUMVALUE:
-        return *a.held<EnumValue>(a.kind_) == *b.held<EnumValue>(b.kind_);
+        return a.object<EnumValue>() == b.object<EnumValue>();
     case KIND_NUMBERARRAY:
-        return *a.held<NumberArray>(a.kind_) == *b.held<NumberArray>(b.kind_);
-    case KIND_STRINGARRAY:
-        return *a.held<StringArray>(a.kind_) == *b.held<StringArray>(b.kind_);
+        return a.object<NumberArray>() == b.object<NumberArray>();
+    default:  // KIND_STRINGARRAY
+        return a.object<StringArray>() == b.object<StringArray>();
     }
-    return true;
 }
 
 // Inline in the header; a program that looks them up in the library finds them all the same.
@@ -349,25 +340,21 @@ bool operator!=(const PropertyValue& a, const PropertyValue& b)
     return !(a == b);
 }
 
+// For two of a kind. The header has compared numbers and texts.
 bool PropertyValue::precedes(const PropertyValue& a, const PropertyValue& b)
 {
-    if (a.kind_ != b.kind_)
-        return false;  // one of them has no object
+    if (a.kind_ != b.kind_ || a.value_ == nullptr)
+        return false;  // one of them or both have no object
     switch (a.kind_) {
-    case KIND_UNKNOWN:
-    case KIND_NUMBER:
-    case KIND_STRING:
-        break;
     case KIND_BUFFER:
-        return lexicographicallyLess(*a.held<Buffer>(a.kind_), *b.held<Buffer>(b.kind_));
+        return lexicographicallyLess(a.object<Buffer>(), b.object<Buffer>());
     case KIND_ENUMVALUE:
-        return *a.held<EnumValue>(a.kind_) < *b.held<EnumValue>(b.kind_);
+        return a.object<EnumValue>() < b.object<EnumValue>();
     case KIND_NUMBERARRAY:
-        return lexicographicallyLess(*a.held<NumberArray>(a.kind_), *b.held<NumberArray>(b.kind_));
-    case KIND_STRINGARRAY:
-        return lexicographicallyLess(*a.held<StringArray>(a.kind_), *b.held<StringArray>(b.kind_));
+        return lexicographicallyLess(a.object<NumberArray>(), b.object<NumberArray>());
+    default:  // KIND_STRINGARRAY
+        return lexicographicallyLess(a.object<StringArray>(), b.object<StringArray>());
     }
-    return false;
 }
 
 bool PropertyValue::less(const PropertyValue& a, const PropertyValue& b)

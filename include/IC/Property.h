@@ -120,8 +120,8 @@ public:
     // A copy has the source's mark; assignment replaces the mark by the source's, whatever it was.
     PropertyValue(const PropertyValue& source) : kind_(source.kind_), readOnly_(source.readOnly_)
     {
-        if (const auto* number = source.held<Number>(KIND_NUMBER))
-            value_ = new Number(*number);
+        if (holds(KIND_NUMBER))
+            value_ = new Number(source.object<Number>());
         else
             copyObject(source);
     }
@@ -133,7 +133,7 @@ public:
             assign(source);
             return *this;
         }
-        *held<Number>(KIND_NUMBER) = *source.held<Number>(KIND_NUMBER);
+        object<Number>() = source.object<Number>();
         readOnly_ = source.readOnly_;
         return *this;
     }
@@ -211,55 +211,30 @@ public:
     //   to StringArray, from texts
     //     "PropertyValue:StringArray: can't return current value as a StringArray, kind="
     //       "Can't return current value as a StringArray"
-    operator double() const
-    {
-        const auto* number = held<Number>(KIND_NUMBER);
-        return number != nullptr ? number->operator double() : toReal();
-    }
+    operator double() const { return holds(KIND_NUMBER) ? object<Number>().operator double() : toReal(); }
     operator unsigned long long() const
     {
-        const auto* number = held<Number>(KIND_NUMBER);
-        return number != nullptr ? number->operator unsigned long long() : toUint64();
+        return holds(KIND_NUMBER) ? object<Number>().operator unsigned long long() : toUint64();
     }
     operator unsigned int() const
     {
-        const auto* number = held<Number>(KIND_NUMBER);
-        return number != nullptr ? number->operator unsigned int() : toUint32();
+        return holds(KIND_NUMBER) ? object<Number>().operator unsigned int() : toUint32();
     }
-    operator bool() const
-    {
-        const auto* number = held<Number>(KIND_NUMBER);
-        return number != nullptr ? number->operator bool() : refuseBool();
-    }
-    operator Number() const
-    {
-        const auto* number = held<Number>(KIND_NUMBER);
-        return number != nullptr ? *number : refuseNumber();
-    }
+    operator bool() const { return holds(KIND_NUMBER) ? object<Number>().operator bool() : refuseBool(); }
+    operator Number() const { return holds(KIND_NUMBER) ? object<Number>() : refuseNumber(); }
     operator Version2() const
     {
-        const auto* number = held<Number>(KIND_NUMBER);
-        return number != nullptr ? number->operator Version2() : refuseVersion();
+        return holds(KIND_NUMBER) ? object<Number>().operator Version2() : refuseVersion();
     }
-    operator EnumValue() const
-    {
-        const auto* value = held<EnumValue>(KIND_ENUMVALUE);
-        return value != nullptr ? *value : refuseEnumValue();
-    }
-    operator Buffer() const
-    {
-        const auto* bytes = held<Buffer>(KIND_BUFFER);
-        return bytes != nullptr ? *bytes : refuseBuffer();
-    }
+    operator EnumValue() const { return holds(KIND_ENUMVALUE) ? object<EnumValue>() : refuseEnumValue(); }
+    operator Buffer() const { return holds(KIND_BUFFER) ? object<Buffer>() : refuseBuffer(); }
     operator NumberArray() const
     {
-        const auto* numbers = held<NumberArray>(KIND_NUMBERARRAY);
-        return numbers != nullptr ? *numbers : refuseNumberArray();
+        return holds(KIND_NUMBERARRAY) ? object<NumberArray>() : refuseNumberArray();
     }
     operator StringArray() const
     {
-        const auto* texts = held<StringArray>(KIND_STRINGARRAY);
-        return texts != nullptr ? *texts : refuseStringArray();
+        return holds(KIND_STRINGARRAY) ? object<StringArray>() : refuseStringArray();
     }
 
     // `int x = value;` would silently be a flag. Write `int x = value.operator IC::Number();`.
@@ -274,11 +249,7 @@ public:
     //   bytes        two hexadecimal digits a byte, and a blank after every fourth byte, also the last
     //   numbers      {1, 2}
     //   texts        {"a\"b", ""}: double quotes inside get a backslash, nothing else is escaped
-    operator std::string() const
-    {
-        const auto* text = held<std::string>(KIND_STRING);
-        return text != nullptr ? *text : toText();
-    }
+    operator std::string() const { return holds(KIND_STRING) ? object<std::string>() : toText(); }
 
 private:
     friend bool operator==(const PropertyValue& a, const PropertyValue& b);
@@ -293,36 +264,35 @@ private:
     {
     }
 
-    // Marks a kind that a refused setKind left without an object: such a kind is none of those below, so that
-    // one comparison tells what is held.
+    // Marks a kind that a refused setKind left without an object: such a kind is none of those above, so that one
+    // comparison tells what is held.
     static constexpr ZQ::Uint32 without = 8;
 
+    bool holds(KindType kind) const noexcept { return kind_ == kind; }
+
+    // The object, for those who have seen that there is one of this type.
     template <class T>
-    T* held(KindType kind) noexcept
+    T& object() noexcept
     {
-        return const_cast<T*>(std::as_const(*this).held<T>(kind));
+        return *static_cast<T*>(value_);
     }
     template <class T>
-    const T* held(KindType kind) const noexcept
+    const T& object() const noexcept
     {
-        if (kind_ != kind)
-            return nullptr;
-        if (value_ == nullptr)
-            __builtin_unreachable();  // saves the caller, who tests what is returned, a second test
-        return static_cast<const T*>(value_);
+        return *static_cast<const T*>(value_);
     }
 
     // Whether both have an object of this kind.
     static bool bothHold(KindType kind, const PropertyValue& a, const PropertyValue& b) noexcept
     {
-        return a.kind_ == kind && b.kind_ == kind;
+        return a.holds(kind) && b.holds(kind);
     }
 
     // Leaves the pointer as it is.
     void release() noexcept
     {
-        if (const auto* number = held<Number>(KIND_NUMBER))
-            delete number;
+        if (holds(KIND_NUMBER))
+            delete &object<Number>();
         else if (value_ != nullptr)
             freeObject();
     }
@@ -360,11 +330,11 @@ private:
 {
     using Value = PropertyValue;
     if (Value::bothHold(Value::KIND_NUMBER, a, b))
-        return *a.held<Number>(Value::KIND_NUMBER) == *b.held<Number>(Value::KIND_NUMBER);
+        return a.object<Number>() == b.object<Number>();
     if (Value::bothHold(Value::KIND_STRING, a, b))
-        return *a.held<std::string>(Value::KIND_STRING) == *b.held<std::string>(Value::KIND_STRING);
+        return a.object<std::string>() == b.object<std::string>();
     if (Value::bothHold(Value::KIND_BUFFER, a, b))
-        return *a.held<Buffer>(Value::KIND_BUFFER) == *b.held<Buffer>(Value::KIND_BUFFER);
+        return a.object<Buffer>() == b.object<Buffer>();
     return Value::equal(a, b);
 }
 bool operator!=(const PropertyValue& a, const PropertyValue& b);
@@ -380,18 +350,18 @@ bool operator!=(const PropertyValue& a, const PropertyValue& b);
 {
     using Value = PropertyValue;
     if (Value::bothHold(Value::KIND_NUMBER, a, b))
-        return *a.held<Number>(Value::KIND_NUMBER) < *b.held<Number>(Value::KIND_NUMBER);
+        return a.object<Number>() < b.object<Number>();
     if (Value::bothHold(Value::KIND_STRING, a, b))
-        return *a.held<std::string>(Value::KIND_STRING) < *b.held<std::string>(Value::KIND_STRING);
+        return a.object<std::string>() < b.object<std::string>();
     return Value::less(a, b);
 }
 [[gnu::visibility("default")]] inline bool operator>(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
     if (Value::bothHold(Value::KIND_NUMBER, a, b))
-        return *a.held<Number>(Value::KIND_NUMBER) > *b.held<Number>(Value::KIND_NUMBER);
+        return a.object<Number>() > b.object<Number>();
     if (Value::bothHold(Value::KIND_STRING, a, b))
-        return *a.held<std::string>(Value::KIND_STRING) > *b.held<std::string>(Value::KIND_STRING);
+        return a.object<std::string>() > b.object<std::string>();
     return Value::greater(a, b);
 }
 
