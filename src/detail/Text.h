@@ -23,31 +23,38 @@ class Number;
 
 namespace IC::detail {
 
-// The two digits of each number that has so many, one number after another.
-template <unsigned int base>
-struct DigitPairs {
-    constexpr DigitPairs()
-    {
-        constexpr char digits[] = "0123456789abcdef";
-        for (std::size_t number = 0; number < base * base; ++number) {
-            pairs[2 * number] = digits[number / base];
-            pairs[2 * number + 1] = digits[number % base];
-        }
-    }
-    char pairs[2 * base * base] = {};
-};
-inline constexpr DigitPairs<10> decimalDigits;
-inline constexpr DigitPairs<16> hexDigits;
+// The two digits of each number below 100, and of each byte.
+inline constexpr char decimalDigits[] = "0001020304050607080910111213141516171819"
+                                        "2021222324252627282930313233343536373839"
+                                        "4041424344454647484950515253545556575859"
+                                        "6061626364656667686970717273747576777879"
+                                        "8081828384858687888990919293949596979899";
+inline constexpr char hexDigits[] = "000102030405060708090a0b0c0d0e0f"
+                                    "101112131415161718191a1b1c1d1e1f"
+                                    "202122232425262728292a2b2c2d2e2f"
+                                    "303132333435363738393a3b3c3d3e3f"
+                                    "404142434445464748494a4b4c4d4e4f"
+                                    "505152535455565758595a5b5c5d5e5f"
+                                    "606162636465666768696a6b6c6d6e6f"
+                                    "707172737475767778797a7b7c7d7e7f"
+                                    "808182838485868788898a8b8c8d8e8f"
+                                    "909192939495969798999a9b9c9d9e9f"
+                                    "a0a1a2a3a4a5a6a7a8a9aaabacadaeaf"
+                                    "b0b1b2b3b4b5b6b7b8b9babbbcbdbebf"
+                                    "c0c1c2c3c4c5c6c7c8c9cacbcccdcecf"
+                                    "d0d1d2d3d4d5d6d7d8d9dadbdcdddedf"
+                                    "e0e1e2e3e4e5e6e7e8e9eaebecedeeef"
+                                    "f0f1f2f3f4f5f6f7f8f9fafbfcfdfeff";
 
 // All of these return the end of what they wrote.
 inline char* writeHex(char* out, unsigned char byte)
 {
-    std::memcpy(out, hexDigits.pairs + 2 * std::size_t {byte}, 2);
+    std::memcpy(out, hexDigits + 2 * std::size_t {byte}, 2);
     return out + 2;
 }
 inline char* writeTwoDigits(char* out, std::uint32_t number)
 {
-    std::memcpy(out, decimalDigits.pairs + 2 * std::size_t {number}, 2);
+    std::memcpy(out, decimalDigits + 2 * std::size_t {number}, 2);
     return out + 2;
 }
 inline char* writeFourDigits(char* out, std::uint32_t number)
@@ -70,14 +77,15 @@ inline char* writeUpToFourDigits(char* out, std::uint32_t number)
 inline char* writeDecimal(char* out, std::uint64_t number)
 {
     constexpr std::uint32_t eightDigits = 100000000;
-    if (number >= eightDigits)
+    if (number >= eightDigits) {
         out = writeDecimal(out, number / eightDigits);
-    const auto low = static_cast<std::uint32_t>(number % eightDigits);
-    if (number >= eightDigits)
+        const auto low = static_cast<std::uint32_t>(number % eightDigits);
         return writeFourDigits(writeFourDigits(out, low / 10000), low % 10000);
-    if (low >= 10000)
-        return writeFourDigits(writeUpToFourDigits(out, low / 10000), low % 10000);
-    return writeUpToFourDigits(out, low);
+    }
+    const auto all = static_cast<std::uint32_t>(number);
+    if (all >= 10000)
+        return writeFourDigits(writeUpToFourDigits(out, all / 10000), all % 10000);
+    return writeUpToFourDigits(out, all);
 }
 
 // The bytes in hexadecimal.
