@@ -7,6 +7,7 @@
 #include <ostream>
 #include <stdexcept>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "detail/Failure.h"
@@ -117,12 +118,60 @@ double integralPart(const Real& real, double limit, const detail::Where& where, 
     return integral;
 }
 
+// Of what integralPart let through. Without the test the result for a NaN would be the processor's or the
+// compiler's choice.
+template <class Integer>
+Integer toInteger(double integral, Integer ofNan)
+{
+    return std::isnan(integral) ? ofNan : static_cast<Integer>(integral);
+}
+
+double realOf(const Version2& version)
+{
+    const double scale = version.minor <= 9 ? 10.0 : version.minor <= 99 ? 100.0 : 1000.0;
+    return version.major + version.minor / scale;
+}
+
+// What two of a kind are compared by, the first field first.
+std::pair<ZQ::Uint8, ZQ::Uint8> fields(const Version2& version)
+{
+    return {version.major, version.minor};
+}
+
+template <class DateTimeFields>
+std::pair<long, ZQ::Uint16> instant(const DateTimeFields& time)
+{
+    return {time.seconds, time.milliseconds};
+}
+
 constexpr char outOfRange32[] = "Uint32: number out of range: ";
 constexpr char outOfRange64[] = "Uint64: number out of range: ";
 constexpr char tooLarge32[] = "The number is too large to convert to a 32-bit integer";
 constexpr char tooLarge64[] = "The number is too large to convert to a 64-bit integer";
 constexpr char negative32[] = "A negative number cannot convert to an unsigned 32-bit integer";
 constexpr char negative64[] = "A negative number cannot convert to an unsigned 64-bit integer";
+
+void addVersion(detail::Text& text, const Version2& version)
+{
+    text.add(static_cast<unsigned int>(version.major));
+    text.add('.');
+    text.add(static_cast<unsigned int>(version.minor));
+}
+
+template <class DateTimeFields>
+void addDateTime(detail::Text& text, const DateTimeFields& content)
+{
+    const ZQ::DateTime time(content.seconds, content.scope);
+    // Each of the three digits is taken from the remainder of the one before it, so only the last digit
+    // of the milliseconds counts. The agent's logs rely on it.
+    const unsigned int remainder = content.milliseconds % 10u;
+    if (remainder != 0)
+        record(here("operator std::string"), detail::failureLevel,
+               "string: conversion failed, remainder not zero, remainder=", remainder);
+    text.add(std::string(time));
+    if (remainder != 0)
+        text.add(".Conversion failed remainder>0");
+}
 
 }  // namespace
 
@@ -204,18 +253,14 @@ ZQ::Uint32 Number::toUint32(const char* function) const
         return load<ZQ::Uint8>() != 0 ? 1 : 0;
     case KIND_UINT32:
         return load<ZQ::Uint32>();
-    case KIND_UINT64: {
-        const auto value = load<ZQ::Uint64>();
-        if (value > std::numeric_limits<ZQ::Uint32>::max())
+    case KIND_UINT64:
+        if (load<ZQ::Uint64>() > std::numeric_limits<ZQ::Uint32>::max())
             detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32, reading<ZQ::Uint64>());
-        return static_cast<ZQ::Uint32>(value);
-    }
-    case KIND_REAL: {
-        const auto integral =
-            integralPart(reading<ZQ::Real64>(), 0x1p32, here(function), outOfRange32, tooLarge32, negative32);
-        // Without the test the result for a NaN would be the processor's or the compiler's choice.
-        return std::isnan(integral) ? 0 : static_cast<ZQ::Uint32>(integral);
-    }
+        return static_cast<ZQ::Uint32>(load<ZQ::Uint64>());
+    case KIND_REAL:
+        return toInteger<ZQ::Uint32>(
+            integralPart(reading<ZQ::Real64>(), 0x1p32, here(function), outOfRange32, tooLarge32, negative32),
+            0);
     default:
         detail::fail<std::out_of_range>(
             here(function), "Can't return current value as a 32-bit integer",
@@ -230,12 +275,11 @@ ZQ::Uint64 Number::toUint64() const
         return load<ZQ::Uint8>() != 0 ? 1 : 0;
     case KIND_UINT32:
         return load<ZQ::Uint32>();
-    case KIND_REAL: {
+    case KIND_REAL:
         // 2^64 is written as a power of two, since the largest 64-bit integer is no double.
-        const auto integral = integralPart(reading<ZQ::Real64>(), 0x1p64, here("operator ZQ::Uint64"),
-                                           outOfRange64, tooLarge64, negative64);
-        return std::isnan(integral) ? ZQ::Uint64 {1} << 63 : static_cast<ZQ::Uint64>(integral);
-    }
+        return toInteger(integralPart(reading<ZQ::Real64>(), 0x1p64, here("operator ZQ::Uint64"),
+                                      outOfRange64, tooLarge64, negative64),
+                         ZQ::Uint64 {1} << 63);
     default:
         detail::fail<std::out_of_range>(
             here("operator ZQ::Uint64"), "Can't return current value as a 64-bit integer",
@@ -256,11 +300,8 @@ ZQ::Real64 Number::toReal() const
         return std::numeric_limits<ZQ::Real64>::quiet_NaN();
     case KIND_INFINITY:
         return std::numeric_limits<ZQ::Real64>::infinity();
-    case KIND_VERSION: {
-        const auto version = load<Version2>();
-        const double scale = version.minor <= 9 ? 10.0 : version.minor <= 99 ? 100.0 : 1000.0;
-        return version.major + version.minor / scale;
-    }
+    case KIND_VERSION:
+        return realOf(load<Version2>());
     default:
         detail::fail<std::out_of_range>(here("operator ZQ::Real64"), "Can't return current value as a Real",
                                         "Real: Can't return current value as a Real, kind=", kind_);
@@ -273,20 +314,16 @@ Version2 Number::toVersion() const
     constexpr char tooLarge[] = "The number is too large to convert to a version";
     constexpr char literal[] = "Version: Number too large for version: ";
     switch (kind_) {
-    case KIND_UINT32: {
-        const auto value = load<ZQ::Uint32>();
-        if (value > largestMajor)
+    case KIND_UINT32:
+        if (load<ZQ::Uint32>() > largestMajor)
             detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal,
                                             reading<ZQ::Uint32>());
-        return {static_cast<ZQ::Uint8>(value), 0};
-    }
-    case KIND_UINT64: {
-        const auto value = load<ZQ::Uint64>();
-        if (value > largestMajor)
+        return {static_cast<ZQ::Uint8>(load<ZQ::Uint32>()), 0};
+    case KIND_UINT64:
+        if (load<ZQ::Uint64>() > largestMajor)
             detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal,
                                             reading<ZQ::Uint64>());
-        return {static_cast<ZQ::Uint8>(value), 0};
-    }
+        return {static_cast<ZQ::Uint8>(load<ZQ::Uint64>()), 0};
     default:
         detail::fail<std::out_of_range>(here("operator IC::Version2"),
                                         "Can't return current value as a Version",
@@ -327,16 +364,10 @@ bool Number::equal(const Number& a, const Number& b)
         return a.load<ZQ::Uint8>() == b.load<ZQ::Uint8>();
     case KIND_UINT64:
         return a.load<ZQ::Uint64>() == b.load<ZQ::Uint64>();
-    case KIND_VERSION: {
-        const auto x = a.load<Version2>();
-        const auto y = b.load<Version2>();
-        return x.major == y.major && x.minor == y.minor;
-    }
-    case KIND_DATETIME: {
-        const auto x = a.load<DateTimeFields>();
-        const auto y = b.load<DateTimeFields>();
-        return x.seconds == y.seconds && x.milliseconds == y.milliseconds;
-    }
+    case KIND_VERSION:
+        return fields(a.load<Version2>()) == fields(b.load<Version2>());
+    case KIND_DATETIME:
+        return instant(a.load<DateTimeFields>()) == instant(b.load<DateTimeFields>());
     default:
         return true;
     }
@@ -359,16 +390,10 @@ bool Number::precedes(const Number& a, const Number& b)
         return a.load<ZQ::Uint8>() < b.load<ZQ::Uint8>();
     case KIND_UINT64:
         return a.load<ZQ::Uint64>() < b.load<ZQ::Uint64>();
-    case KIND_VERSION: {
-        const auto x = a.load<Version2>();
-        const auto y = b.load<Version2>();
-        return x.major != y.major ? x.major < y.major : x.minor < y.minor;
-    }
-    case KIND_DATETIME: {
-        const auto x = a.load<DateTimeFields>();
-        const auto y = b.load<DateTimeFields>();
-        return x.seconds != y.seconds ? x.seconds < y.seconds : x.milliseconds < y.milliseconds;
-    }
+    case KIND_VERSION:
+        return fields(a.load<Version2>()) < fields(b.load<Version2>());
+    case KIND_DATETIME:
+        return instant(a.load<DateTimeFields>()) < instant(b.load<DateTimeFields>());
     default:
         return false;
     }
@@ -444,27 +469,12 @@ void detail::append(Text& text, const Number& number)
     case Number::KIND_INFINITY:
         text.add("infinity");
         return;
-    case Number::KIND_VERSION: {
-        const auto version = number.load<Version2>();
-        text.add(static_cast<unsigned int>(version.major));
-        text.add('.');
-        text.add(static_cast<unsigned int>(version.minor));
+    case Number::KIND_VERSION:
+        addVersion(text, number.load<Version2>());
         return;
-    }
-    case Number::KIND_DATETIME: {
-        const auto content = number.load<Number::DateTimeFields>();
-        const ZQ::DateTime time(content.seconds, content.scope);
-        // Each of the three digits is taken from the remainder of the one before it, so only the last digit
-        // of the milliseconds counts. The agent's logs rely on it.
-        const unsigned int remainder = content.milliseconds % 10u;
-        if (remainder != 0)
-            record(here("operator std::string"), failureLevel,
-                   "string: conversion failed, remainder not zero, remainder=", remainder);
-        text.add(std::string(time));
-        if (remainder != 0)
-            text.add(".Conversion failed remainder>0");
+    case Number::KIND_DATETIME:
+        addDateTime(text, number.load<Number::DateTimeFields>());
         return;
-    }
     case Number::KIND_NODEREF:
         text.add(pst[std::min(number.nodeRef_.type, noSensor)]);
         text.add(':');
