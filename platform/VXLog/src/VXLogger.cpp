@@ -6,6 +6,7 @@
 #include <mutex>
 #include <utility>
 
+#include "Locks.h"
 #include "Printable.h"
 #include "VXLog/RecordSink.h"
 #include "ZQ/DateTime.h"
@@ -29,7 +30,6 @@ void writeLine(const Record& record)
 
 // The sink of the program. It is shared with the calls under way, which go on when it is replaced.
 struct Current {
-    std::mutex mutex;
     std::shared_ptr<const RecordSink> sink = std::make_shared<const RecordSink>(writeLine);
 };
 
@@ -38,7 +38,7 @@ struct Current {
 
 std::shared_ptr<const RecordSink> currentSink()
 {
-    const std::lock_guard<std::mutex> lock(current.mutex);
+    const std::lock_guard<std::mutex> lock(sinkLock);
     return current.sink;
 }
 
@@ -55,7 +55,7 @@ RecordSink setRecordSink(RecordSink sink)
     for (;;) {
         const auto before = currentSink();
         RecordSink copy = *before;  // outside the lock: it may throw, and it is the program's code
-        const std::lock_guard<std::mutex> lock(current.mutex);
+        const std::lock_guard<std::mutex> lock(sinkLock);
         if (current.sink == before) {
             current.sink = std::move(next);
             return copy;

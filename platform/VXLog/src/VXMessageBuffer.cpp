@@ -1,10 +1,14 @@
 #include "VXLog/VXMessageBuffer.h"
 
+#include <array>
 #include <charconv>
+#include <cstddef>
 #include <iterator>
 #include <locale>
-#include <memory>
+#include <mutex>
 #include <streambuf>
+
+#include "Locks.h"
 
 namespace VXLog {
 
@@ -30,12 +34,10 @@ protected:
     }
 };
 
-// Whether the thread's composer is gone already: objects of the program may write records after it.
-thread_local bool isGone = false;
-
 }  // namespace
 
-// A stream is costly to make, so each thread keeps one.
+// A stream is costly to make, so some are kept for the buffers to come. They belong to no thread: a thread that
+// ends would have to release its own, when this library may be unloaded already.
 struct VXMessageBuffer::Composer {
     Composer() : stream(&buffer)
     {
@@ -64,36 +66,69 @@ struct VXMessageBuffer::Composer {
         stream.fill(' ');
     }
 
-    // The one that the thread keeps while no buffer has it.
-    static std::unique_ptr<Composer>& kept();
+    // Null where none is kept.
+    static Composer* takeKept();
+
+    // Whether it is kept from now on. Otherwise it still belongs to the caller.
+    static bool keep(Composer* composer);
 
     TextBuffer buffer;
     std::ostream stream;
     std::string taken;
+
+private:
+    // Never destroyed: objects of the program may write records to the very end.
+    struct Kept {
+        std::array<Composer*, 16> composers {};
+        std::size_t count = 0;
+        bool isClosed = false;
+    };
+    static Kept kept;
+
+    struct Closer {
+        ~Closer();
+    };
+    static const Closer closer;
 };
 
-std::unique_ptr<VXMessageBuffer::Composer>& VXMessageBuffer::Composer::kept()
+VXMessageBuffer::Composer::Kept VXMessageBuffer::Composer::kept;
+
+[[gnu::init_priority(101)]] const VXMessageBuffer::Composer::Closer VXMessageBuffer::Composer::closer;
+
+VXMessageBuffer::Composer::Closer::~Closer()
 {
-    struct Owner {
-        ~Owner() { isGone = true; }
-        std::unique_ptr<Composer> composer;
-    };
-    thread_local Owner owner;
-    return owner.composer;
+    while (const Composer* const composer = takeKept())
+        delete composer;
+    const std::lock_guard<std::mutex> lock(composersLock);
+    kept.isClosed = true;
 }
 
-VXMessageBuffer::VXMessageBuffer()
-    : composer_(!isGone && Composer::kept() ? Composer::kept().release() : new Composer)
+VXMessageBuffer::Composer* VXMessageBuffer::Composer::takeKept()
 {
+    const std::lock_guard<std::mutex> lock(composersLock);
+    return kept.count == 0 ? nullptr : kept.composers.at(--kept.count);
+}
+
+bool VXMessageBuffer::Composer::keep(Composer* composer)
+{
+    const std::lock_guard<std::mutex> lock(composersLock);
+    if (kept.isClosed || kept.count == kept.composers.size())
+        return false;
+    kept.composers.at(kept.count++) = composer;
+    return true;
+}
+
+VXMessageBuffer::VXMessageBuffer() : composer_(Composer::takeKept())
+{
+    if (composer_ == nullptr)
+        composer_ = new Composer;
 }
 
 VXMessageBuffer::~VXMessageBuffer()
 {
     composer_->reset();
-    if (isGone || Composer::kept())
+    if (!Composer::keep(composer_))
         delete composer_;
-    else
-        Composer::kept().reset(composer_);
 }
 
 VXMessageBuffer& VXMessageBuffer::operator<<(const char* text)

@@ -36,7 +36,7 @@ private:
 
     const std::string& take();
 
-    Composer* composer_;  // owned; the thread keeps one for the next buffer
+    Composer* composer_;  // owned; then kept for the next buffer
 };
 
 // Every other type, by its own stream insertion.

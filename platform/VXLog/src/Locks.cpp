@@ -1,0 +1,39 @@
+#include "Locks.h"
+
+#include <pthread.h>
+
+#include <new>
+
+namespace VXLog {
+
+std::mutex sinkLock;
+std::mutex composersLock;
+
+namespace {
+
+void lockAll()
+{
+    composersLock.lock();
+    sinkLock.lock();
+}
+
+void unlockAll()
+{
+    sinkLock.unlock();
+    composersLock.unlock();
+}
+
+// The system forgets the handlers when the library is unloaded.
+struct ForkHandlers {
+    ForkHandlers()
+    {
+        if (pthread_atfork(lockAll, unlockAll, unlockAll) != 0)
+            throw std::bad_alloc();
+    }
+};
+
+[[gnu::init_priority(101)]] const ForkHandlers forkHandlers;
+
+}  // namespace
+
+}  // namespace VXLog

@@ -1,0 +1,117 @@
+// A program that does not know the library loads a plug-in that does, uses it, and unloads it.
+
+#include <dlfcn.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <malloc.h>
+#include <pthread.h>
+
+#include <condition_variable>
+#include <fstream>
+#include <functional>
+#include <iterator>
+#include <mutex>
+#include <string>
+#include <thread>
+
+namespace {
+
+// The files that are mapped, and everything else that the system says of the program's memory.
+std::string mapped()
+{
+    std::ifstream maps("/proc/self/maps");
+    return {std::istreambuf_iterator<char>(maps), {}};
+}
+
+void expectUnmapped()
+{
+    const std::string all = mapped();
+    EXPECT_THAT(all, testing::HasSubstr("Unload_test"));
+    for (const char* name : {"loading_plugin", "libIC.so", "libVXLog.so", "libZQ.so"})
+        EXPECT_THAT(all, testing::Not(testing::HasSubstr(name)));
+}
+
+// A thread that lives on when the library that it has used is gone.
+class Worker {
+public:
+    Worker() : thread_([this] { work(); }) { }
+    ~Worker()
+    {
+        run(nullptr);
+        thread_.join();
+    }
+    Worker(const Worker&) = delete;
+    Worker& operator=(const Worker&) = delete;
+
+    // Waits until the thread has done it. Nothing ends the thread.
+    void run(std::function<void()> task)
+    {
+        std::unique_lock<std::mutex> lock(mutex_);
+        task_ = std::move(task);
+        isWaiting_ = true;
+        changed_.notify_all();
+        changed_.wait(lock, [this] { return !isWaiting_; });
+    }
+
+private:
+    void work()
+    {
+        std::unique_lock<std::mutex> lock(mutex_);
+        for (bool isLast = false; !isLast;) {
+            changed_.wait(lock, [this] { return isWaiting_; });
+            isLast = !task_;
+            if (task_)
+                task_();
+            isWaiting_ = false;
+            changed_.notify_all();
+        }
+    }
+
+    std::mutex mutex_;
+    std::condition_variable changed_;
+    std::function<void()> task_;
+    bool isWaiting_ = false;
+    std::thread thread_;
+};
+
+// Loads the plug-in, uses it on this thread and another, and unloads it.
+void cycle(Worker& worker)
+{
+    void* const plugin = dlopen(PLUGIN, RTLD_NOW | RTLD_LOCAL);
+    ASSERT_NE(plugin, nullptr) << dlerror();
+    const auto use = reinterpret_cast<bool (*)()>(dlsym(plugin, "useLibrary"));
+    ASSERT_NE(use, nullptr) << dlerror();
+    EXPECT_TRUE(use());
+    worker.run([use] { EXPECT_TRUE(use()); });
+    EXPECT_EQ(dlclose(plugin), 0);
+    expectUnmapped();
+}
+
+// The number of the next thread-specific key.
+unsigned int nextKey()
+{
+    pthread_key_t key = 0;
+    EXPECT_EQ(pthread_key_create(&key, nullptr), 0);
+    EXPECT_EQ(pthread_key_delete(key), 0);
+    return key;
+}
+
+TEST(Unload, LeavesNothingMappedAndNothingBehindAThousandTimes)
+{
+    Worker worker;
+    for (int i = 0; i < 10; ++i)
+        ASSERT_NO_FATAL_FAILURE(cycle(worker));
+    const std::size_t memory = mallinfo2().uordblks;
+    const unsigned int key = nextKey();
+    constexpr int cycles = 1000;
+    for (int i = 0; i < cycles; ++i) {
+        ASSERT_NO_FATAL_FAILURE(cycle(worker));
+        ASSERT_FALSE(HasFailure()) << "in cycle " << i;
+    }
+    // Blocks are of slightly different sizes each time, and none is smaller than this.
+    constexpr std::size_t smallestBlock = 32;
+    EXPECT_LT(mallinfo2().uordblks, memory + cycles * smallestBlock);
+    EXPECT_EQ(nextKey(), key);
+}
+
+}  // namespace
