@@ -1,0 +1,3 @@
+#include "Check.h"
+
+static const Check first("first");
