@@ -1,0 +1,84 @@
+// A child of fork() can use the library, whatever the other threads of its parent were doing.
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <sstream>
+#include <string>
+#include <thread>
+
+#include "IC/ICException.h"
+#include "IC/Node.h"
+#include "VXLog/RecordSink.h"
+
+namespace {
+
+using IC::Node;
+using IC::PropertyValue;
+
+class Fan : public Node {
+public:
+    Fan() : Node(SENSOR_FAN) { properties.insert({1u, PropertyValue("old")}); }
+};
+
+// Makes, sets, prints and logs, on objects of its own. What did not go well, or 0.
+int useInChild()
+{
+    Fan fan;
+    const bool isSet =
+        fan.setProperty(1, PropertyValue("new")).getStatus() == 0;  // through the parent's sink
+    int records = 0;
+    VXLog::setRecordSink([&records](const VXLog::Record&) { ++records; });
+    fan.setProperty(2, PropertyValue("new"));
+    bool isRefused = false;
+    try {
+        const Node none(74);
+    } catch (const IC::NodeInvalidSensor&) {
+        isRefused = true;
+    }
+    std::ostringstream text;
+    text << fan << ' ' << fan.getProperties();
+    VXLog::setRecordSink(nullptr);
+    fan.setProperty(1, PropertyValue("newer"));  // through the default sink
+    return (isSet ? 0 : 1) + (isRefused ? 0 : 2) + (records == 6 ? 0 : 4)
+        + (text.str() == "Node  : 20, status = 0 [1 = new]" ? 0 : 8);
+}
+
+TEST(Fork, LeavesAChildThatMakesSetsPrintsAndLogs)
+{
+    const auto before = VXLog::setRecordSink([](const VXLog::Record&) {});
+    std::atomic<bool> isOver {false};
+    std::atomic<long> rounds {0};
+    // Works on records alone, and on no memory of the heap, whose own locks are not the library's business.
+    std::thread working([&] {
+        const PropertyValue value("short");
+        for (Fan fan; !isOver; ++rounds)
+            fan.setProperty(2, value);
+    });
+    while (rounds < 100)
+        std::this_thread::yield();
+    for (int i = 0; i < 200; ++i) {
+        const pid_t child = fork();
+        ASSERT_GE(child, 0);
+        if (child == 0) {
+            alarm(60);  // where a lock is never given back, the child does not end by itself
+            dup2(open("/dev/null", O_WRONLY), STDERR_FILENO);
+            _exit(useInChild());
+        }
+        int status = 0;
+        ASSERT_EQ(waitpid(child, &status, 0), child);
+        ASSERT_TRUE(WIFEXITED(status)) << "child " << i << " did not end: a lock was never given back";
+        ASSERT_EQ(WEXITSTATUS(status), 0);
+        // Each fork meets the thread at another place.
+        for (const long reached = rounds; rounds == reached;)
+            std::this_thread::yield();
+    }
+    isOver = true;
+    working.join();
+    VXLog::setRecordSink(before);
+}
+
+}  // namespace

@@ -1,0 +1,306 @@
+// Eight threads on shared nodes: no value is torn, no change is lost, and what was read had been written.
+//
+// The environment variable IC_TEST_OPERATIONS sets the number of operations, such as 100000000 for a long run. What
+// the threads share besides the nodes is guarded by mutexes, which every tool that looks for races understands.
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <array>
+#include <cstdlib>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <vector>
+
+#include "AtOnce.h"
+#include "IC/Node.h"
+#include "VXLog/RecordSink.h"
+
+namespace {
+
+using IC::Error;
+using IC::Node;
+using IC::Number;
+using IC::PropertyValue;
+
+int operationsPerThread()
+{
+    const char* const wanted = std::getenv("IC_TEST_OPERATIONS");
+    return (wanted != nullptr ? std::atoi(wanted) : OPERATIONS) / threadCount;
+}
+
+enum : unsigned int { MIXED = 1, COUNT = 2, READ_ONLY = 3, MISSING = 4, OWN = 10 };
+
+// What everybody writes to MIXED: of all kinds, and of such lengths that a torn one equals none of them.
+const std::vector<PropertyValue>& mixedValues()
+{
+    static const std::vector<PropertyValue> values {
+        PropertyValue("short"),
+        PropertyValue(std::string(100, 'a')),
+        PropertyValue(std::string(3000, 'b')),
+        PropertyValue(Number(4294967295u)),
+        PropertyValue(Number(0.1)),
+        PropertyValue(IC::Buffer(200, 0xaa)),
+        PropertyValue(IC::NumberArray(30, Number(7u))),
+        PropertyValue(IC::NumberArray(50, Number(8u))),
+        PropertyValue(IC::StringArray(9, std::string(70, 'c'))),
+        PropertyValue(IC::EnumValue(7u)),
+    };
+    return values;
+}
+
+bool isWhole(const PropertyValue& value)
+{
+    const auto& all = mixedValues();
+    return std::find(all.begin(), all.end(), value) != all.end();
+}
+
+class Provider : public Node {
+public:
+    Provider() : Node(SENSOR_FAN)
+    {
+        path = "ab";
+        parent = "a";
+        description = "a description that needs memory of its own";
+        properties.insert({MIXED, mixedValues().front()});
+        properties.insert({COUNT, PropertyValue(Number(0u))});
+        properties.insert({READ_ONLY, PropertyValue("for ever", true)});
+        for (unsigned int number = 0; number < threadCount; ++number)
+            properties.insert({OWN + number, PropertyValue(Number(0u))});
+    }
+
+    // Reads, adds one and writes, as one change.
+    void increment()
+    {
+        const Guard guard(mutex);
+        PropertyValue value("");
+        getProperty(COUNT, value);
+        setProperty(COUNT, PropertyValue(Number(value.operator unsigned int() + 1)));
+    }
+
+protected:
+    class Guard {
+    public:
+        explicit Guard(ZQ::Mutex& mutex) : mutex_(mutex) { mutex_.lock(0xFFFFFFFF); }
+        ~Guard() { mutex_.unlock(); }
+        Guard(const Guard&) = delete;
+        Guard& operator=(const Guard&) = delete;
+
+    private:
+        ZQ::Mutex& mutex_;
+    };
+};
+
+// Every operation that can be overridden is, and calls back into the node while it holds the lock.
+class CallingBack : public Provider {
+public:
+    StatusType getStatus() const override
+    {
+        const Guard guard(mutex);
+        PropertyValue value("");
+        Node::getProperty(READ_ONLY, value);
+        return std::string(value) == "for ever" ? status : STATUS_LARGEST;
+    }
+
+    std::string getDescription() const override
+    {
+        const Guard guard(mutex);
+        return getStatus() == STATUS_INITIAL ? Node::getDescription() : "";
+    }
+
+    Error getProperty(unsigned int key, PropertyValue& value) const override
+    {
+        const Guard guard(mutex);
+        return getProperties().count(key) != 0 ? Node::getProperty(key, value) : Error("", 5);
+    }
+
+    std::map<unsigned int, PropertyValue> getProperties() const override
+    {
+        const Guard guard(mutex);
+        return getStatus() == STATUS_INITIAL ? Node::getProperties()
+                                             : std::map<unsigned int, PropertyValue>();
+    }
+
+    Error setProperty(const unsigned int& key, const PropertyValue& value) override
+    {
+        const Guard guard(mutex);
+        Error outcome = Node::setProperty(key, value);
+        PropertyValue stored("");
+        if (outcome.getStatus() == 0 && Node::getProperty(key, stored).getStatus() == 0 && stored != value)
+            return {"another thread came in between", 1};
+        return outcome;
+    }
+
+    operator std::string() const override
+    {
+        const Guard guard(mutex);
+        return getDescription().empty() ? "" : Node::operator std::string();
+    }
+};
+
+// What went wrong; each thread counts for itself.
+struct Faults {
+    long torn = 0;
+    long outcomes = 0;
+    long backwards = 0;
+};
+
+// The records that the threads have written. The sink counts on the thread that writes.
+thread_local long recordsWritten = 0;
+
+class SharedNodes : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        mixedValues();
+        before_ = VXLog::setRecordSink([](const VXLog::Record&) { ++recordsWritten; });
+    }
+    void TearDown() override { VXLog::setRecordSink(before_); }
+
+private:
+    VXLog::RecordSink before_;
+};
+
+void write(Node& node, int number, int step, Faults& faults)
+{
+    const auto& values = mixedValues();
+    const auto own = OWN + static_cast<unsigned int>(number);
+    const auto expect = [&faults](const Error& outcome, unsigned int status) {
+        faults.outcomes += outcome.getStatus() == status ? 0 : 1;
+    };
+    expect(node.setProperty(MIXED, values[static_cast<std::size_t>(number + step) % values.size()]), 0);
+    expect(node.setProperty(own, PropertyValue(Number(static_cast<unsigned int>(step)))), 0);
+    if (step % 8 == 0) {
+        expect(node.setProperty(READ_ONLY, values.front()), 16);
+        expect(node.setProperty(MISSING, values.front()), 5);
+    }
+}
+
+// `seen` is what this thread has read of each writer's own property before: no writer goes back.
+void read(const Node& node, std::array<unsigned int, threadCount>& seen, Faults& faults)
+{
+    PropertyValue value("");
+    faults.outcomes += node.getProperty(MIXED, value).getStatus() == 0 ? 0 : 1;
+    faults.torn += isWhole(value) ? 0 : 1;
+    const auto all = node.getProperties();
+    faults.torn += all.size() == 3 + threadCount && isWhole(all.at(MIXED)) ? 0 : 1;
+    for (unsigned int number = 0; number < threadCount; ++number) {
+        const unsigned int now = all.at(OWN + number);
+        faults.backwards += now >= seen.at(number) ? 0 : 1;
+        seen.at(number) = now;
+    }
+    faults.torn += node.operator std::string() == "Node 6162 : 20, status = 0" ? 0 : 1;
+    faults.torn += node.getDescription() == "a description that needs memory of its own" ? 0 : 1;
+}
+
+template <class Class>
+void workOnSharedNodes()
+{
+    constexpr int operationsAStep = 8;  // two to five of `write`, three of `read` or of `increment`
+    const int steps = std::max(operationsPerThread() / operationsAStep, 10);
+    std::array<Class, 4> nodes;
+    std::array<Faults, threadCount> faults;
+    std::array<long, threadCount> records {};
+    runAtOnce([&](int number) {
+        const auto self = static_cast<std::size_t>(number);
+        std::array<std::array<unsigned int, threadCount>, 4> seen {};
+        recordsWritten = 0;
+        for (int step = 1; step <= steps; ++step) {
+            const std::size_t which = static_cast<std::size_t>(number + step) % nodes.size();
+            write(nodes.at(which), number, step, faults.at(self));
+            if (number % 2 == 0)
+                read(nodes.at(which), seen.at(which), faults.at(self));
+            for (int i = 0; i < 2; ++i)
+                nodes.at(which).increment();
+        }
+        records.at(self) = recordsWritten;
+    });
+
+    unsigned int increments = 0;
+    for (const Class& node : nodes) {
+        PropertyValue value("");
+        node.getProperty(COUNT, value);
+        increments += value.operator unsigned int();
+        node.getProperty(MIXED, value);
+        EXPECT_TRUE(isWhole(value));
+    }
+    EXPECT_EQ(increments, static_cast<unsigned int>(2 * threadCount * steps));
+    for (int number = 0; number < threadCount; ++number) {
+        SCOPED_TRACE("thread " + std::to_string(number));
+        for (int step = steps; step > steps - 4; --step) {
+            PropertyValue value("");
+            nodes.at(static_cast<std::size_t>(number + step) % nodes.size())
+                .getProperty(OWN + static_cast<unsigned int>(number), value);
+            EXPECT_EQ(value, PropertyValue(Number(static_cast<unsigned int>(step))));
+        }
+        const Faults& its = faults.at(static_cast<std::size_t>(number));
+        EXPECT_EQ(its.torn, 0);
+        EXPECT_EQ(its.outcomes, 0);
+        EXPECT_EQ(its.backwards, 0);
+        // A log and a trace record for each request and for each refusal.
+        EXPECT_EQ(records.at(static_cast<std::size_t>(number)), 2L * (4 * steps + 4 * (steps / 8)));
+    }
+}
+
+TEST_F(SharedNodes, LoseNoChangeAndTearNoValue)
+{
+    workOnSharedNodes<Provider>();
+}
+
+TEST_F(SharedNodes, LoseNoChangeAndTearNoValueWhereOverridesCallBack)
+{
+    workOnSharedNodes<CallingBack>();
+}
+
+// A node that goes with its last user.
+class Shared {
+public:
+    Shared() : node_(std::make_unique<CallingBack>()) { }
+
+    Node& node() const { return *node_; }
+
+    // Whether this was the last user: then the node is gone.
+    bool release()
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        if (--users_ > 0)
+            return false;
+        node_.reset();
+        return true;
+    }
+
+private:
+    std::mutex mutex_;
+    int users_ = threadCount;
+    std::unique_ptr<CallingBack> node_;
+};
+
+TEST_F(SharedNodes, GoWithTheirLastUser)
+{
+    constexpr int operationsAVisit = 5;
+    std::vector<Shared> nodes(
+        static_cast<std::size_t>(std::max(operationsPerThread() / operationsAVisit / 4, 10)));
+    std::array<Faults, threadCount> faults;
+    std::array<std::size_t, threadCount> last {};
+    runAtOnce([&](int number) {
+        const auto self = static_cast<std::size_t>(number);
+        for (std::size_t i = 0; i < nodes.size(); ++i) {
+            Shared& shared = nodes[(i + self) % nodes.size()];
+            std::array<unsigned int, threadCount> seen {};
+            write(shared.node(), number, 1, faults.at(self));
+            read(shared.node(), seen, faults.at(self));
+            last.at(self) += shared.release() ? 1 : 0;
+        }
+    });
+    std::size_t gone = 0;
+    for (const std::size_t count : last)
+        gone += count;
+    EXPECT_EQ(gone, nodes.size());
+    for (const Faults& its : faults) {
+        EXPECT_EQ(its.torn, 0);
+        EXPECT_EQ(its.outcomes, 0);
+    }
+}
+
+}  // namespace
