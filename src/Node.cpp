@@ -23,10 +23,13 @@ detail::Where here(const char* function, int line = __builtin_LINE())
 }
 
 // Holds a node's mutex. Whether the lock was obtained is not asked: with this time-out it waits for ever.
-class Lock {
+class IC_ANNOTATION(scoped_lockable) Lock {
 public:
-    explicit Lock(ZQ::Mutex& mutex) : mutex_(mutex) { mutex_.lock(0xFFFFFFFF); }
-    ~Lock() { mutex_.unlock(); }
+    explicit Lock(ZQ::Mutex& mutex) IC_ANNOTATION(acquire_capability(mutex)) : mutex_(mutex)
+    {
+        mutex_.lock(0xFFFFFFFF);
+    }
+    ~Lock() IC_ANNOTATION(release_capability()) { mutex_.unlock(); }
     Lock(const Lock&) = delete;
     Lock& operator=(const Lock&) = delete;
 

@@ -9,6 +9,11 @@
 #include "ZQ/Mutex.h"
 #include "ZQ/Types.h"
 
+// The library's own build says what clang is to check (-Wthread-safety); for everybody else this is empty.
+#ifndef IC_ANNOTATION
+#define IC_ANNOTATION(attribute)
+#endif
+
 #pragma GCC visibility push(default)
 
 namespace IC {
@@ -171,7 +176,7 @@ public:
 
 protected:
     mutable ZQ::Mutex mutex;  // guards status, description and properties
-    StatusType status = STATUS_INITIAL;
+    StatusType status IC_ANNOTATION(guarded_by(mutex)) = STATUS_INITIAL;
 
 private:
     friend bool operator==(const Node& a, const Node& b);
@@ -180,8 +185,8 @@ private:
     SensorType sensor_ = SENSOR_UNKNOWN;
 
 protected:
-    std::string description;
-    std::map<unsigned int, PropertyValue> properties;
+    std::string description IC_ANNOTATION(guarded_by(mutex));
+    std::map<unsigned int, PropertyValue> properties IC_ANNOTATION(guarded_by(mutex));
     std::string path;
     std::string parent;
 };

@@ -3,12 +3,15 @@
 #include <mutex>
 
 #pragma GCC visibility push(default)
+#pragma GCC diagnostic push
+// Only clang knows a capability; its -Wthread-safety follows it.
+#pragma GCC diagnostic ignored "-Wattributes"
 
 namespace ZQ {
 
 // A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as often.
 // Every operation may be called from any thread.
-class __attribute__((visibility("default"))) Mutex {
+class __attribute__((visibility("default"))) __attribute__((capability("mutex"))) Mutex {
 public:
     Mutex() = default;
     Mutex(const Mutex&) = delete;
@@ -38,4 +41,5 @@ private:
 
 }  // namespace ZQ
 
+#pragma GCC diagnostic pop
 #pragma GCC visibility pop
