@@ -1,6 +1,7 @@
 #include "IC/Number.h"
 
 #include <algorithm>
+#include <cfloat>
 #include <cmath>
 #include <ctime>
 #include <limits>
@@ -118,6 +119,18 @@ double integralPart(const Real& real, double limit, const detail::Where& where, 
     return integral;
 }
 
+// The result of a step as a double. The x87 calculates in more digits, and what it returns keeps them unless it has
+// been through memory.
+double rounded(double result)
+{
+    if constexpr (FLT_EVAL_METHOD == 0) {
+        return result;
+    } else {
+        const volatile double stored = result;
+        return stored;
+    }
+}
+
 // Of what integralPart let through. Without the test the result for a NaN would be the processor's or the
 // compiler's choice.
 template <class Integer>
@@ -129,7 +142,7 @@ Integer toInteger(double integral, Integer ofNan)
 double realOf(const Version2& version)
 {
     const double scale = version.minor <= 9 ? 10.0 : version.minor <= 99 ? 100.0 : 1000.0;
-    return version.major + version.minor / scale;
+    return rounded(version.major + rounded(version.minor / scale));
 }
 
 // What two of a kind are compared by, the first field first.

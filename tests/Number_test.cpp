@@ -1033,13 +1033,32 @@ TEST(NumberToReal, AVersionIsItsMajorNumberAndTheMinorOneAsDecimals)
         SCOPED_TRACE(row.expected);
         EXPECT_DOUBLE_EQ(to<double>(Number(row.version)), row.expected);
     }
+    // Through memory, since some processors calculate in more digits than a double has.
     for (unsigned int major = 0; major <= 255; ++major) {
         for (unsigned int minor = 0; minor <= 255; ++minor) {
             const double divisor = minor <= 9 ? 10.0 : minor <= 99 ? 100.0 : 1000.0;
-            ASSERT_EQ(to<double>(Number(Version2 {byte(major), byte(minor)})), major + minor / divisor)
+            const volatile double decimals = minor / divisor;
+            const volatile double sum = major + decimals;
+            const double expected = sum;
+            ASSERT_EQ(to<double>(Number(Version2 {byte(major), byte(minor)})), expected)
                 << major << '.' << minor;
         }
     }
+}
+
+// Where the processor calculates in more digits than a double has, the quotient was not rounded before the sum, nor
+// the sum before the program calculated with it.
+TEST(NumberToReal, AVersionHadOtherDigitsOnTheX87)
+{
+    EXPECT_EQ(to<double>(Number(Version2 {1, 14})), 0x1.23d70a3d70a3ep+0);
+    EXPECT_EQ(to<double>(Number(Version2 {1, 36})), 0x1.5c28f5c28f5c2p+0);
+    EXPECT_EQ(to<double>(Number(Version2 {2, 15})) - 2.0, 0x1.333333333333p-3);
+}
+
+TEST(NumberToReal, AnIntegerIsRoundedBeforeTheProgramCalculatesWithIt)
+{
+    EXPECT_EQ(static_cast<ZQ::Uint64>(to<double>(Number(9007199254740993ull))), 9007199254740992ull);
+    EXPECT_EQ(static_cast<ZQ::Uint64>(to<double>(Number(9223372036854776833ull))), 9223372036854777856ull);
 }
 
 TEST(NumberToVersion, GivesBackEveryVersion)
