@@ -226,7 +226,8 @@ void Number::initKind(const KindType& kind)
         store(Version2 {0, 0});
         return;
     case KIND_DATETIME:
-        storeDateTime(std::time(nullptr), 0, defaultScope);
+        // Where time_t is the wider type, a date-time's seconds still are a long.
+        storeDateTime(static_cast<long>(std::time(nullptr)), 0, defaultScope);
         return;
     case KIND_INT:
     case KIND_NODEREF:
