@@ -76,12 +76,13 @@ DateTime::operator long() const
 
 DateTime::operator std::string() const
 {
-    if (seconds_ < firstSecond || seconds_ > lastSecond)
-        return std::string("@").append(std::to_string(seconds_));
+    const long long seconds = seconds_;  // a long of 32 bits ends long before the years do
+    if (seconds < firstSecond || seconds > lastSecond)
+        return std::string("@").append(std::to_string(seconds));
 
     // Counted from the year 400 before year 0, so that nothing below is negative.
     constexpr long long daysToMarch = 146097 - 60;
-    const long long sinceFirst = seconds_ - firstSecond;
+    const long long sinceFirst = seconds - firstSecond;
     Date date = dateOf(sinceFirst / secondsADay + daysToMarch);
     date.year -= 400;
     const long long second = sinceFirst % secondsADay;
