@@ -4,7 +4,9 @@ foreach(name ZQ VXLog)
     if(TARGET IC::${name})
         continue()
     endif()
-    find_library(IC_PLATFORM_${name} ${name} PATHS ${IC_PLATFORM_DIR}/lib NO_DEFAULT_PATH NO_CACHE)
+    # The folder is named in full, also where a toolchain file has libraries looked for in another system's root.
+    find_library(IC_PLATFORM_${name} ${name} PATHS ${IC_PLATFORM_DIR}/lib
+                 NO_DEFAULT_PATH NO_CMAKE_FIND_ROOT_PATH NO_CACHE)
     if(NOT IC_PLATFORM_${name} OR NOT IS_DIRECTORY ${IC_PLATFORM_DIR}/include/${name})
         message(FATAL_ERROR "IC: no ${name} library in '${IC_PLATFORM_DIR}' (IC_PLATFORM_DIR): "
                             "lib/ must hold the library and include/${name}/ its headers")
