@@ -8,6 +8,7 @@
 #   SHARED         whether the library is shared: then the plug-in is tried too
 #   GENERATOR      what to build every project with
 #   SETTINGS       the file of cache variables to configure every project with
+#   EMULATOR       what runs a program of another machine; empty for this one
 file(REMOVE_RECURSE ${WORK})
 set(prefix ${WORK}/prefix)
 set(configure ${CMAKE_COMMAND} -G ${GENERATOR} -C ${SETTINGS})
@@ -50,7 +51,8 @@ if(SHARED)
     set(plugin ${WORK}/build/libplugin.so)
     string(APPEND expected "from the plug-in: Can't return current value as a Number\n")
 endif()
-execute_process(COMMAND ${WORK}/build/consumer ${plugin}
+separate_arguments(emulator UNIX_COMMAND "${EMULATOR}")
+execute_process(COMMAND ${emulator} ${WORK}/build/consumer ${plugin}
                 OUTPUT_VARIABLE output ERROR_VARIABLE records RESULT_VARIABLE result)
 if(NOT result EQUAL 0 OR NOT output STREQUAL expected)
     message(FATAL_ERROR "The consumer ended with ${result}\n${records}\nprinted\n${output}\ninstead of\n${expected}")
