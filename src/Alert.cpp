@@ -33,6 +33,12 @@ Alert::Alert(unsigned char severity, unsigned char alertClass, std::vector<std::
     init(now, severity, alertClass, std::move(nodePaths), status, std::move(message));
 }
 
+Alert& Alert::operator=(const Alert& source)
+{
+    // The copy may fail, and so may the first step of its move, the assignment of the time stamp.
+    return *this = Alert(source);
+}
+
 void Alert::init(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
                  std::vector<std::string> nodePaths, unsigned int status, std::string message)
 {

@@ -40,6 +40,11 @@ Error::Error(const std::string& message, unsigned char status)
     initStatus(status);
 }
 
+Error& Error::operator=(const Error& source)
+{
+    return *this = Error(source);  // the copy may fail, moving it cannot
+}
+
 void Error::refuse(unsigned char status)
 {
     detail::fail<std::invalid_argument>(here("initStatus"), "Invalid error status",

@@ -214,6 +214,24 @@ TEST(Alert, IsCopiedDeeply)
     EXPECT_EQ(observe::dateTimesAlive(), alive);
 }
 
+TEST(Alert, AssignedWhereMemoryRunsOutWasAMixtureOfTwoAlerts)
+{
+    const Alert source = alertOf(3, 5, 85, "a message that needs memory of its own",
+                                 {"/a/path/that/needs/memory/of/its/own", "/b"});
+    const Alert old(1, 2, {"/c"}, 4, "short");
+    for (long allowed = 0;; ++allowed) {
+        SCOPED_TRACE("memory for " + std::to_string(allowed) + " allocations");
+        ASSERT_LT(allowed, 100);
+        Alert target(old);
+        if (allocation::completesWith(allowed, [&] { target = source; })) {
+            EXPECT_EQ(target.operator std::string(), source.operator std::string());
+            EXPECT_GT(allowed, 0);
+            break;
+        }
+        EXPECT_EQ(target.operator std::string(), old.operator std::string());
+    }
+}
+
 TEST(AlertClock, IsNotReadForACallersTimeStamp)
 {
     alertOf(0, 0, 0);

@@ -176,6 +176,16 @@ TEST(ErrorCopy, IsIndependentAndWhole)
     EXPECT_EQ(copy.getMessage(), "a message that needs memory of its own");
 }
 
+TEST(ErrorCopy, AssignedWhereMemoryRunsOutWasTheNewStatusWithTheOldMessage)
+{
+    const Error source(16, Number(3600u), "a message that needs memory of its own");
+    Error target(5, Number(true), "short");
+    EXPECT_FALSE(allocation::completesWith(0, [&] { target = source; }));
+    EXPECT_EQ(target.operator std::string(), "5 - true - short");
+    EXPECT_TRUE(allocation::completesWith(1, [&] { target = source; }));
+    EXPECT_EQ(target.operator std::string(), source.operator std::string());
+}
+
 TEST(ErrorText, HasTheNumberAndTheMessageOnlyWhereThereIsOne)
 {
     Number invalid(none);

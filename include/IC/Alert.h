@@ -47,6 +47,12 @@ public:
     Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
           unsigned int status, std::string message);
 
+    // When anything throws in an assignment, the alert is as it was.
+    Alert(const Alert&) = default;
+    Alert(Alert&&) = default;
+    Alert& operator=(const Alert& source);
+    Alert& operator=(Alert&&) = default;
+
     ZQ::DateTime getTimeStamp() const { return timeStamp_; }
 
     SeverityType getSeverity() const noexcept { return severity_; }

@@ -40,6 +40,12 @@ public:
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
 
+    // Where memory runs out in an assignment, std::bad_alloc is thrown and the error is as it was.
+    Error(const Error&) = default;
+    Error(Error&&) noexcept = default;
+    Error& operator=(const Error& source);
+    Error& operator=(Error&&) noexcept = default;
+
     StatusType getStatus() const noexcept { return status_; }
     operator StatusType() const noexcept { return status_; }
     operator unsigned char() const noexcept { return status_; }
