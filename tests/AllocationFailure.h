@@ -15,7 +15,9 @@
 // first gives its lists room by using them.
 namespace allocation {
 
-inline thread_local long allowedNow = -1;  // how many more allocations succeed; below 0: all
+inline thread_local long allowedNow = -1;    // how many more allocations succeed; below 0: all
+inline thread_local bool failsOnce = false;  // the allocations after the first that fails succeed again
+inline thread_local bool failedNow = false;
 inline thread_local long madeSoFar = 0;
 inline thread_local long aliveNow = 0;
 inline thread_local void (*onRelease)() = nullptr;  // called before each release of memory
@@ -36,6 +38,22 @@ bool completesWith(long allowed, Operation operation)
         return false;
     }
     return true;
+}
+
+// Makes the n-th allocation from now on (from 1) throw std::bad_alloc, and every one after it unless `once`.
+inline void failFrom(long nth, bool once)
+{
+    failsOnce = once;
+    failedNow = false;
+    allowedNow = nth - 1;
+}
+
+// Ends that. Whether an allocation failed.
+inline bool stopFailing()
+{
+    allowedNow = -1;
+    failsOnce = false;
+    return failedNow;
 }
 
 // How many allocations the operation makes.
@@ -75,8 +93,12 @@ void expectTextWholeOrNotAtAll(const Value& value, const std::string& whole)
 // Never inlined: the compiler would see free() on what came from operator new, and warn.
 [[gnu::noinline]] void* operator new(std::size_t size)
 {
-    if (allocation::allowedNow == 0)
+    if (allocation::allowedNow == 0) {
+        allocation::failedNow = true;
+        if (allocation::failsOnce)
+            allocation::allowedNow = -1;
         throw std::bad_alloc();
+    }
     void* const memory = std::malloc(size == 0 ? 1 : size);
     if (memory == nullptr)
         throw std::bad_alloc();

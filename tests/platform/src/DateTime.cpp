@@ -16,16 +16,19 @@ DateTime::DateTime() : DateTime(0, 3) { }
 
 DateTime::DateTime(long seconds, unsigned int scope) : fields_(new Fields {seconds, 0, scope})
 {
+    observe::reached(observe::Call::dateTime);
     observe::count(&observe::Observed::dateTimesAlive, 1);
 }
 
 DateTime::DateTime(const DateTime& other) : fields_(new Fields(*other.fields_))
 {
+    observe::reached(observe::Call::dateTime);
     observe::count(&observe::Observed::dateTimesAlive, 1);
 }
 
 DateTime& DateTime::operator=(const DateTime& other)
 {
+    observe::reached(observe::Call::dateTime);
     *fields_ = *other.fields_;
     return *this;
 }
@@ -46,6 +49,7 @@ DateTime DateTime::now()
 
 void DateTime::setMillisecond(unsigned int millisecond)
 {
+    observe::reached(observe::Call::dateTime);
     fields_->milliseconds = millisecond;
 }
 

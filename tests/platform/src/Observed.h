@@ -9,6 +9,9 @@ namespace observe {
 
 // Everything that reset() resets.
 struct State {
+    // A lock is obtained and given back without memory; so it is here, but for the calls after these.
+    State() { lockCalls.reserve(64); }
+
     std::vector<Record> records;
     std::function<void(const Record&)> action;
     std::function<void(bool)> lockAction;
@@ -18,6 +21,7 @@ struct State {
     unsigned int clockMilliseconds = 0;
     int clockReadings = 0;
     Call throwingCall = Call::any;
+    int throwingNth = 0;
     int callsUntilThrow = 0;
     bool thrown = false;
 };

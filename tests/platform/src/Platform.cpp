@@ -40,11 +40,13 @@ void reached(Call call)
 {
     guarded([&](Observed& all) {
         State& state = all.state;
-        if (state.callsUntilThrow == 0 || (state.throwingCall != Call::any && state.throwingCall != call))
+        const bool counts =
+            state.throwingCall == Call::any ? call != Call::dateTime : state.throwingCall == call;
+        if (state.callsUntilThrow == 0 || !counts)
             return;
         if (--state.callsUntilThrow == 0) {
             state.thrown = true;
-            throw Thrown();
+            throw Thrown {state.throwingCall, state.throwingNth};
         }
     });
 }
@@ -118,6 +120,7 @@ void throwAt(Call call, int nth)
 {
     guarded([&](Observed& all) {
         all.state.throwingCall = call;
+        all.state.throwingNth = nth;
         all.state.callsUntilThrow = nth;
         all.state.thrown = false;
     });

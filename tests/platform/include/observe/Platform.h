@@ -63,11 +63,16 @@ int clockReadings();
 int buffersAlive();
 int dateTimesAlive();
 
-// Makes the platform throw observe::Thrown at its `nth` call (from 1) of these from now on, once.
-enum class Call { any, bufferConstructor, insertion, str, log, trace, now, dateTimeText, lock };
+// Makes the platform throw observe::Thrown at its `nth` call (from 1) of these from now on, once. `dateTime` is
+// whatever makes or changes a DateTime; `any` leaves it out.
+enum class Call { any, bufferConstructor, insertion, str, log, trace, now, dateTimeText, lock, dateTime };
 void throwAt(Call call, int nth);
 // Whether the call that was to throw has been reached.
 bool thrown();
-struct Thrown { };
+// What throwAt was given.
+struct Thrown {
+    Call call;
+    int nth;
+};
 
 }  // namespace observe
