@@ -1,0 +1,71 @@
+#pragma once
+
+#include <optional>
+#include <sstream>
+#include <string>
+#include <vector>
+
+// The rules of the values once more, as plainly as they can be said: slow, and sharing no code with the library, so
+// that what the two agree on was worked out twice.
+namespace model {
+
+// A log record and the trace record that repeats it.
+struct Record {
+    std::string function;
+    std::string file;
+    std::string category;
+    int level = 0;
+    std::string text;
+};
+
+inline bool operator==(const Record& a, const Record& b)
+{
+    return a.text == b.text && a.function == b.function && a.file == b.file && a.category == b.category
+        && a.level == b.level;
+}
+
+// How an operation ended: a value, or an exception of this class that says this sentence. And what it logged.
+template <class T>
+struct Outcome {
+    std::optional<T> value;
+    std::string exception;
+    std::string sentence;
+    std::vector<Record> records;
+};
+
+struct Nothing { };
+
+inline bool operator==(Nothing, Nothing)
+{
+    return true;
+}
+
+template <class T>
+Outcome<T> returned(const T& value)
+{
+    Outcome<T> outcome;
+    outcome.value = value;
+    return outcome;
+}
+
+template <class T>
+Outcome<T> refused(const Record& record, const std::string& exception, const std::string& sentence)
+{
+    Outcome<T> outcome;
+    outcome.exception = exception;
+    outcome.sentence = sentence;
+    outcome.records.push_back(record);
+    return outcome;
+}
+
+// What a record says of a number: plain, whatever the locale of the program.
+template <class T>
+std::string plain(const T& number)
+{
+    std::ostringstream out;
+    out.imbue(std::locale::classic());
+    out << number;
+    return out.str();
+}
+
+}  // namespace model

@@ -1,0 +1,27 @@
+#include <utility>
+
+#include "Agreement.h"
+#include "VXLog/RecordSink.h"
+
+namespace agreement {
+
+namespace {
+
+std::vector<LoggerCall> calls;
+
+// The program's first look at its records is after its first operation at the latest.
+const VXLog::RecordSink before = VXLog::setRecordSink([](const VXLog::Record& record) {
+    calls.push_back({record.kind == VXLog::Record::Kind::trace,
+                     record.line,
+                     record.data == nullptr && record.a == 0 && record.b == 0,
+                     {record.function, record.file, record.logger, record.level, record.message}});
+});
+
+}  // namespace
+
+std::vector<LoggerCall> takeLoggerCalls()
+{
+    return std::exchange(calls, {});
+}
+
+}  // namespace agreement
