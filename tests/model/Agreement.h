@@ -129,7 +129,10 @@ inline std::string shown(const std::vector<std::string>& value)
 }
 inline std::string shown(const std::vector<unsigned char>& value)
 {
-    return shown(std::string(value.begin(), value.end()));
+    std::string all;
+    for (const unsigned char byte : value)
+        all += model::hexadecimal(byte);
+    return all;
 }
 inline std::string shown(const model::Version& value)
 {

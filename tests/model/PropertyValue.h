@@ -297,8 +297,9 @@ inline bool equal(const PropertyValue& a, const PropertyValue& b)
     }
 }
 
-// Texts of bytes that count as unsigned.
-inline bool precedes(const std::string& a, const std::string& b)
+// Of texts and buffers: their bytes count as unsigned.
+template <class Bytes>
+bool precedesByBytes(const Bytes& a, const Bytes& b)
 {
     for (std::size_t i = 0; i < std::min(a.size(), b.size()); ++i) {
         const auto left = static_cast<unsigned char>(a[i]);
@@ -328,7 +329,7 @@ inline bool precedes(const std::vector<std::string>& a, const std::vector<std::s
 {
     for (std::size_t i = 0; i < std::min(a.size(), b.size()); ++i)
         if (a[i] != b[i])
-            return precedes(a[i], b[i]);
+            return precedesByBytes(a[i], b[i]);
     return a.size() < b.size();
 }
 
@@ -339,10 +340,9 @@ inline Outcome<bool> precedes(const PropertyValue& a, const PropertyValue& b)
         return returned(false);
     switch (a.kind) {
     case TEXT:
-        return returned(precedes(a.text, b.text));
+        return returned(precedesByBytes(a.text, b.text));
     case BUFFER:
-        return returned(precedes(std::string(a.buffer.begin(), a.buffer.end()),
-                                 std::string(b.buffer.begin(), b.buffer.end())));
+        return returned(precedesByBytes(a.buffer, b.buffer));
     case ENUM_VALUE:
         return returned(a.enumValue < b.enumValue);
     case NUMBER_ARRAY:

@@ -1,0 +1,52 @@
+// Two containers of one kind: text, comparison and copies are the model's, and a copy is independent.
+#include <utility>
+
+#include "AnyValue.h"
+#include "Check.h"
+
+namespace {
+
+using agreement::ValuePair;
+
+// Empties what the value gave back, and takes the value by move and by copy.
+template <class Container>
+void requireIndependent(const ValuePair& pair)
+{
+    Container given = pair.library.operator Container();
+    const IC::PropertyValue copy(pair.library);
+    IC::PropertyValue moved(Container(given), pair.expected.readOnly);
+    requireNone(agreement::differenceInContent(moved, pair.expected));
+    given.clear();
+    moved.setKind(IC::PropertyValue::KIND_UNKNOWN);
+    requireNone(agreement::differenceInContent(pair.library, pair.expected));
+    requireNone(agreement::differenceInContent(copy, pair.expected));
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
+{
+    FuzzedDataProvider bytes(data, size);
+    constexpr unsigned int containers[] = {model::BUFFER, model::NUMBER_ARRAY, model::TEXT_ARRAY};
+    const unsigned int kind = bytes.PickValueInArray(containers);
+    ValuePair a = anyValueOfKind(bytes, kind, 5);
+    const ValuePair b = bytes.ConsumeBool() ? anyValueOfKind(bytes, kind, 5) : a;
+
+    requireNone(agreement::differenceInConversion(a.library, a.expected, agreement::PROPERTY_TEXT));
+    const auto comparison = bytes.ConsumeIntegralInRange(0u, agreement::comparisons - 1);
+    requireNone(agreement::differenceInComparison(a.library, b.library, a.expected, b.expected, comparison));
+    requireNone(
+        agreement::differenceInComparison(a.library, b.library, a.expected, b.expected, agreement::EQUAL));
+
+    if (kind == model::BUFFER)
+        requireIndependent<IC::Buffer>(a);
+    else if (kind == model::NUMBER_ARRAY)
+        requireIndependent<IC::NumberArray>(a);
+    else
+        requireIndependent<IC::StringArray>(a);
+
+    a.library = b.library;
+    requireNone(agreement::differenceInContent(a.library, b.expected));
+    requireNone(agreement::differenceInContent(b.library, b.expected));
+    return 0;
+}

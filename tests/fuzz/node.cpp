@@ -1,0 +1,185 @@
+// A node under a program of operations: results, properties, texts and records are those of a map that the same is
+// done to.
+#include <iterator>
+#include <map>
+
+#include "AnyValue.h"
+#include "Check.h"
+#include "IC/Node.h"
+
+namespace {
+
+using agreement::ValuePair;
+using Records = std::vector<model::Record>;
+
+class ProgrammedNode : public IC::Node {
+public:
+    ProgrammedNode(unsigned int sensor, const std::string& ownPath) : Node(sensor) { path = ownPath; }
+
+    void add(unsigned int key, const IC::PropertyValue& value) { properties.insert_or_assign(key, value); }
+    void setStatus(unsigned int code) { status = static_cast<StatusType>(code); }
+    void describe(const std::string& text) { description = text; }
+};
+
+struct Expected {
+    unsigned int sensor;
+    std::string path;
+    unsigned int status = 0;
+    std::string description;
+    std::map<unsigned int, model::PropertyValue> properties;
+};
+
+model::Record nodeRecord(int level, const std::string& text)
+{
+    return {"setProperty", "Node", "Vexilon.IC.Node", level, text};
+}
+
+// The pairs of records of one file among the calls. A request's text is composed while its two records are written,
+// and so records of Number stand between them.
+Records recordsOf(const std::string& file, const std::vector<agreement::LoggerCall>& calls)
+{
+    std::vector<agreement::LoggerCall> ofFile;
+    for (const agreement::LoggerCall& call : calls)
+        if (call.record.file == file)
+            ofFile.push_back(call);
+    return agreement::inPairs(ofFile);
+}
+
+void requireError(const IC::Error& error, unsigned int status)
+{
+    require(error.getStatus() == status, "the status that a node returns");
+    require(error.getValue().getKind() == IC::Number::KIND_UNKNOWN && error.getMessage().empty(),
+            "a node returns neither value nor message");
+}
+
+void setProperty(IC::Node& node, Expected& expected, unsigned int key, const ValuePair& value)
+{
+    const auto text = model::textOf(value.expected);
+    const std::string start = "setProperty: " + std::to_string(key);
+    Records records = {nodeRecord(3000, start + ' ' + *text.value)};
+    unsigned int status = 0;
+    const auto found = expected.properties.find(key);
+    if (found == expected.properties.end()) {
+        status = 5;
+        records.push_back(nodeRecord(6000, start + " does not exist"));
+    } else if (found->second.readOnly) {
+        status = 16;
+        records.push_back(nodeRecord(6000, start + " read-only"));
+    } else {
+        found->second = value.expected;
+    }
+    Records ofText = text.records;
+    ofText.insert(ofText.end(), text.records.begin(), text.records.end());
+
+    agreement::takeLoggerCalls();
+    requireError(node.setProperty(key, value.library), status);
+    const auto calls = agreement::takeLoggerCalls();
+    require(recordsOf("Node", calls) == records, "the records of a node");
+    require(recordsOf("Number", calls) == ofText, "the records of a value's text in a node's");
+    require(calls.size() == 2 * (records.size() + ofText.size()), "no records but these");
+}
+
+void getProperty(const IC::Node& node, const Expected& expected, unsigned int key, ValuePair value)
+{
+    const auto found = expected.properties.find(key);
+    agreement::takeLoggerCalls();
+    requireError(node.getProperty(key, value.library), found == expected.properties.end() ? 5 : 0);
+    require(agreement::takeLoggerCalls().empty(), "reading a property leaves no record");
+    requireNone(agreement::differenceInContent(
+        value.library, found == expected.properties.end() ? value.expected : found->second));
+}
+
+void requireAsExpected(const IC::Node& node, const Expected& expected)
+{
+    const auto properties = node.getProperties();
+    require(properties.size() == expected.properties.size(), "as many properties");
+    auto wanted = expected.properties.begin();
+    for (const auto& [key, value] : properties) {
+        require(key == wanted->first, "the same keys");
+        requireNone(agreement::differenceInContent(value, wanted->second));
+        ++wanted;
+    }
+    require(node.getSensor() == expected.sensor && node.getStatus() == expected.status
+                && node.operator IC::Node::StatusType() == expected.status,
+            "sensor and status");
+    requireSame(node.getDescription(), expected.description, "description");
+    requireSame(node.getPath(), expected.path, "path");
+    std::string hexadecimal;
+    for (const char character : expected.path)
+        hexadecimal += model::hexadecimal(static_cast<unsigned char>(character));
+    requireSame(node.operator std::string(),
+                "Node " + hexadecimal + " : " + std::to_string(expected.sensor)
+                    + ", status = " + std::to_string(expected.status),
+                "text of a node");
+}
+
+void requireCompared(const IC::Node& a, const IC::Node& b)
+{
+    const int order = a.getPath().compare(b.getPath());
+    require((a == b) == (order == 0) && (a != b) == (order != 0) && (a < b) == (order < 0)
+                && (a <= b) == (order <= 0) && (a > b) == (order > 0) && (a >= b) == (order >= 0),
+            "nodes compare by their paths");
+}
+
+void requireSensorRefused(unsigned int sensor)
+{
+    agreement::takeLoggerCalls();
+    try {
+        const IC::Node node(sensor);
+        fail("a sensor type that there is not");
+    } catch (const IC::NodeInvalidSensor& refusal) {
+        requireSame(refusal.what(),
+                    std::to_string(sensor) + " is not a valid sensor. The largest possible sensor is 73",
+                    "refusal of a sensor type");
+    }
+    const Records expected = {{"Node", "Node", "Vexilon.IC.Node", 6000,
+                               "Node: Sensor value out of range: " + std::to_string(sensor)}};
+    require(agreement::inPairs(agreement::takeLoggerCalls()) == expected, "the record of a sensor type");
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
+{
+    FuzzedDataProvider bytes(data, size);
+    const auto sensor = anyInteger<unsigned int>(bytes);
+    if (sensor > 73) {
+        requireSensorRefused(sensor);
+        return 0;
+    }
+    Expected expected {sensor, bytes.ConsumeRandomLengthString(12), 0, {}, {}};
+    ProgrammedNode node(sensor, expected.path);
+
+    for (int step = 0; step < 10 && bytes.remaining_bytes() != 0; ++step) {
+        const auto key = bytes.ConsumeIntegralInRange(0u, 3u);
+        switch (bytes.ConsumeIntegralInRange(0u, 6u)) {
+        case 0:
+        case 1: {
+            const ValuePair value = anyValue(bytes);
+            node.add(key, value.library);
+            expected.properties[key] = value.expected;
+            break;
+        }
+        case 2:
+        case 3:
+            setProperty(node, expected, key, anyValue(bytes));
+            break;
+        case 4:
+            getProperty(node, expected, key, anyValue(bytes));
+            break;
+        case 5:
+            expected.status = anyInteger<unsigned int>(bytes);
+            node.setStatus(expected.status);
+            expected.description = bytes.ConsumeRandomLengthString(12);
+            node.describe(expected.description);
+            break;
+        default: {
+            const ProgrammedNode other(0, bytes.ConsumeRandomLengthString(12));
+            requireCompared(node, other);
+            requireCompared(node, node);
+        }
+        }
+    }
+    requireAsExpected(node, expected);
+    return 0;
+}

@@ -1,0 +1,133 @@
+// Property values and a number under a program of operations: after each, what it touched is as the model has it, and
+// what it did not touch is as before.
+#include <array>
+#include <utility>
+
+#include "AnyValue.h"
+#include "Check.h"
+
+namespace {
+
+using agreement::NumberPair;
+using agreement::ValuePair;
+
+void requireAsExpected(const ValuePair& pair)
+{
+    requireNone(agreement::differenceInContent(pair.library, pair.expected));
+}
+
+void setKind(ValuePair& pair, unsigned char code)
+{
+    const auto expected = model::setKind(pair.expected, code);
+    requireNone(agreement::difference("setKind", expected, agreement::outcomeOf([&] {
+                                          pair.library.setKind(code);
+                                          return model::Nothing();
+                                      })));
+}
+
+void construct(FuzzedDataProvider& bytes, ValuePair& pair)
+{
+    const auto code = bytes.ConsumeIntegral<unsigned char>();
+    const bool readOnly = bytes.ConsumeBool();
+    model::PropertyValue made = pair.expected;
+    const auto expected = model::makeKind(made, code, readOnly);
+    requireNone(agreement::difference("from a kind code", expected, agreement::outcomeOf([&] {
+                                          pair.library = IC::PropertyValue(code, readOnly);
+                                          return model::Nothing();
+                                      })));
+    pair.expected = made;  // refused: the assignment never began
+}
+
+void changeNumber(FuzzedDataProvider& bytes, NumberPair& pair)
+{
+    const auto code = bytes.ConsumeIntegral<unsigned char>();
+    if (bytes.ConsumeBool()) {
+        const auto expected = model::setKind(pair.expected, code);
+        requireNone(agreement::difference("setKind of a number", expected, agreement::outcomeOf([&] {
+                                              pair.library.setKind(code);
+                                              return model::Nothing();
+                                          })));
+    } else if (code != model::DATE_TIME) {  // which begins with the time of day
+        const auto expected = model::initKind(pair.expected, code, 0);
+        requireNone(agreement::difference("initKind of a number", expected, agreement::outcomeOf([&] {
+                                              pair.library.initKind(static_cast<IC::Number::KindType>(code));
+                                              return model::Nothing();
+                                          })));
+    }
+    requireNone(agreement::differenceInContent(pair.library, pair.expected));
+}
+
+// A value without an object is neither copied nor moved: it is given another one.
+void fill(FuzzedDataProvider& bytes, ValuePair& pair)
+{
+    if (pair.expected.empty)
+        pair = anyValue(bytes);
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
+{
+    FuzzedDataProvider bytes(data, size);
+    std::array<ValuePair, 3> slots = {anyValue(bytes), anyValue(bytes), agreement::pairOfNothing(false)};
+    NumberPair number = anyNumber(bytes);
+
+    for (int step = 0; step < 12 && bytes.remaining_bytes() != 0; ++step) {
+        ValuePair& a = slots[bytes.ConsumeIntegralInRange<std::size_t>(0, slots.size() - 1)];
+        ValuePair& b = slots[bytes.ConsumeIntegralInRange<std::size_t>(0, slots.size() - 1)];
+        switch (bytes.ConsumeIntegralInRange(0u, 9u)) {
+        case 0:
+            a = anyValue(bytes);
+            break;
+        case 1:
+            fill(bytes, b);
+            a.library = b.library;
+            a.expected = b.expected;
+            break;
+        case 2: {
+            fill(bytes, b);
+            ValuePair taken {IC::PropertyValue(std::move(b.library)), b.expected};
+            b.expected = model::firstValue(model::NOTHING, b.expected.readOnly);
+            requireAsExpected(taken);
+            requireAsExpected(b);
+            b = std::move(taken);
+            break;
+        }
+        case 3:
+            fill(bytes, a);
+            fill(bytes, b);
+            swap(a.library, b.library);
+            std::swap(a.expected, b.expected);
+            break;
+        case 4:
+            setKind(a, bytes.ConsumeIntegralInRange<unsigned char>(0, 6));
+            break;
+        case 5:
+            setKind(a, bytes.ConsumeIntegral<unsigned char>());
+            break;
+        case 6:
+            construct(bytes, a);
+            break;
+        case 7: {
+            fill(bytes, a);
+            const IC::PropertyValue copy(a.library);
+            requireNone(agreement::differenceInContent(copy, a.expected));
+            requireSame(copy.operator std::string(), a.library.operator std::string(), "text of a copy");
+            break;
+        }
+        case 8:
+            changeNumber(bytes, number);
+            a.library = IC::PropertyValue(number.library, a.expected.readOnly);
+            a.expected = agreement::pairOf(number, a.expected.readOnly).expected;
+            break;
+        default:
+            requireNone(agreement::differenceInConversion(
+                a.library, a.expected, bytes.ConsumeIntegralInRange(0u, agreement::propertyTargets - 1)));
+        }
+        requireAsExpected(a);
+        requireAsExpected(b);
+    }
+    for (const ValuePair& pair : slots)
+        requireAsExpected(pair);
+    return 0;
+}
