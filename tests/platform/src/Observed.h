@@ -9,9 +9,6 @@ namespace observe {
 
 // Everything that reset() resets.
 struct State {
-    // A lock is obtained and given back without memory; so it is here, but for the calls after these.
-    State() { lockCalls.reserve(64); }
-
     std::vector<Record> records;
     std::function<void(const Record&)> action;
     std::function<void(bool)> lockAction;
@@ -27,6 +24,9 @@ struct State {
 };
 
 struct Observed {
+    // A lock is obtained and given back without memory; so it is here, but for the calls after these.
+    Observed() { state.lockCalls.reserve(64); }
+
     std::mutex mutex;
     State state;
     // Not reset: these live as long as the objects that they count.

@@ -53,7 +53,12 @@ void reached(Call call)
 
 void reset()
 {
-    guarded([](Observed& all) { all.state = State(); });
+    guarded([](Observed& all) {
+        State fresh;
+        fresh.lockCalls.swap(all.state.lockCalls);  // with its room
+        fresh.lockCalls.clear();
+        all.state = std::move(fresh);
+    });
 }
 
 std::vector<Record> records()

@@ -1,0 +1,79 @@
+#include <iostream>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "Operations.h"
+#include "Sweep.h"
+
+// Every call of the platform in every operation throws in turn: that very exception reaches the caller, what the
+// operation had begun is undone, and the platform is left balanced.
+
+namespace {
+
+const struct {
+    const char* name;
+    observe::Call call;
+} calls[] = {{"construction of a buffer", observe::Call::bufferConstructor},
+             {"insertion into a buffer", observe::Call::insertion},
+             {"str", observe::Call::str},
+             {"log record", observe::Call::log},
+             {"trace record", observe::Call::trace},
+             {"reading of the clock", observe::Call::now},
+             {"text of a date-time", observe::Call::dateTimeText},
+             {"making or changing of a date-time", observe::Call::dateTime},
+             {"lock", observe::Call::lock}};
+
+// Lets the first call throw, then the second, until there are no more. How many there were.
+long sweep(const Operation& operation, const Outcome& undisturbed, observe::Call call,
+           const std::string& name)
+{
+    for (int nth = 1;; ++nth) {
+        const Fault fault {[=] { observe::throwAt(call, nth); },
+                           [] {
+                               const bool struck = observe::thrown();
+                               observe::throwAt(observe::Call::any, 0);
+                               return struck;
+                           }};
+        const std::string thrown =
+            "observe::Thrown: call " + std::to_string(static_cast<int>(call)) + ", " + std::to_string(nth);
+        const std::string where = operation.name + ": " + name + " " + std::to_string(nth) + " throws";
+        if (!tryWith(fault, thrown, false, operation, undisturbed, where))
+            return nth - 1;
+    }
+}
+
+TEST(PlatformSweep, EveryCallThrows)
+{
+    const auto all = operations();
+    long points = 0;
+    for (const auto& row : calls) {
+        long ofCall = 0;
+        for (const Operation& operation : all)
+            ofCall += sweep(operation, operation.run(noFault()), row.call, row.name);
+        std::cout << ofCall << " times: " << row.name << " throws\n";
+        EXPECT_GT(ofCall, 0) << row.name;
+        points += ofCall;
+    }
+    EXPECT_GE(points, 300);
+}
+
+TEST(PlatformSweep, NobodyAsksWhetherTheLockWasObtained)
+{
+    long locks = 0;
+    for (const Operation& operation : operations()) {
+        const Fault fault {[] { observe::setLockResult(false); },
+                           [&locks] {
+                               for (const observe::LockCall& call : observe::lockCalls())
+                                   locks += call.lock ? 1 : 0;
+                               observe::setLockResult(true);
+                               return false;
+                           }};
+        tryWith(fault, "", false, operation, operation.run(noFault()),
+                operation.name + ": lock returns false");
+    }
+    std::cout << locks << " locks returned false\n";
+    EXPECT_GE(locks, 200);
+}
+
+}  // namespace

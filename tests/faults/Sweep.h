@@ -1,0 +1,35 @@
+#pragma once
+
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "AllocationFailure.h"
+#include "Refusal.h"
+#include "Trial.h"
+
+// Tries the operation with the fault and adds a failure, which names `where`, for anything that is wrong then.
+// Right is what wrongAfterFault says, or, if `mayGoOn`, that all went as undisturbed. Whether the fault was reached.
+inline bool tryWith(const Fault& fault, const std::string& exception, bool mayGoOn,
+                    const Operation& operation, const Outcome& undisturbed, const std::string& where)
+{
+    const int dateTimes = observe::dateTimesAlive();
+    const long alive = allocation::aliveNow;
+    bool struck = false;
+    const std::string wrong = [&] {
+        const Outcome tried = operation.run(fault);
+        struck = tried.struck;
+        std::string different = difference(tried, undisturbed);
+        if (!struck || (mayGoOn && different.empty()))
+            return different;
+        return wrongAfterFault(tried, undisturbed, exception);
+    }();
+    EXPECT_EQ(wrong, "") << where;
+    if (wrong.empty()) {  // its text would be counted
+        EXPECT_EQ(allocation::aliveNow, alive) << "allocations alive: " << where;
+    }
+    EXPECT_EQ(observe::dateTimesAlive(), dateTimes) << where;
+    EXPECT_EQ(observe::buffersAlive(), 0) << where;
+    EXPECT_EQ(observe::locksHeld(), 0) << where;
+    return struck;
+}
