@@ -1,0 +1,89 @@
+// Whatever bytes a record is made of, the default sink writes one line of printable text for it.
+
+#include "HostileTexts.h"
+
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <clocale>
+#include <cstdio>
+#include <cstdlib>
+#include <cwchar>
+
+#include "IC/Node.h"
+#include "VXLog/VXLogger.h"
+
+namespace {
+
+// Three records for each text: a request and its refusal, and one whose every field is hostile.
+void writeRecords()
+{
+    IC::Node node(20);
+    for (const std::string& text : hostileTexts()) {
+        node.setProperty(7, IC::PropertyValue(text));
+        VXLog::VXLogger::logLevelMessage(text.c_str(), text.c_str(), 1, text, 6000, nullptr, 0, 0, text);
+    }
+}
+
+// What a child process that runs `write` leaves on its standard error.
+std::string standardErrorOf(void (*write)())
+{
+    std::FILE* const file = std::tmpfile();
+    const pid_t child = fork();
+    if (child == 0) {
+        dup2(fileno(file), STDERR_FILENO);
+        write();
+        _exit(0);
+    }
+    int status = -1;
+    EXPECT_EQ(waitpid(child, &status, 0), child);
+    EXPECT_EQ(status, 0);
+    std::string all;
+    std::rewind(file);
+    char part[65536];
+    for (std::size_t length = 1; length > 0;) {
+        length = std::fread(part, 1, sizeof part, file);
+        all.append(part, length);
+    }
+    std::fclose(file);
+    return all;
+}
+
+// Whether the system's own reading of UTF-8 finds characters, and no control, in the whole line.
+bool isPrintable(const std::string& line)
+{
+    std::mbstate_t state {};
+    for (std::size_t i = 0; i < line.size();) {
+        wchar_t character = 0;
+        const std::size_t length = std::mbrtowc(&character, &line[i], line.size() - i, &state);
+        if (length == 0 || length > line.size() || character < 0x20 || (character >= 0x7f && character < 0xa0)
+            || character == 0x2028 || character == 0x2029)
+            return false;
+        i += length;
+    }
+    return true;
+}
+
+TEST(HostileRecords, AreOnePrintableLineEach)
+{
+    const std::string before = std::setlocale(LC_CTYPE, nullptr);
+    ASSERT_NE(std::setlocale(LC_CTYPE, "C.UTF-8"), nullptr);
+    const std::string all = standardErrorOf(writeRecords);
+    std::size_t lines = 0;
+    for (std::size_t begin = 0; begin < all.size(); ++lines) {
+        const std::size_t end = all.find('\n', begin);
+        ASSERT_NE(end, std::string::npos);
+        const std::string line = all.substr(begin, end - begin);
+        EXPECT_TRUE(isPrintable(line)) << line;
+        const char* const category = lines % 3 == 2 ? "Z 6000 "
+            : lines % 3 == 1                        ? "Z 6000 Vexilon.IC.Node Node:"
+                                                    : "Z 3000 Vexilon.IC.Node Node:";
+        EXPECT_EQ(line.find(category), line.find('Z')) << line;
+        begin = end + 1;
+    }
+    EXPECT_EQ(lines, 3 * hostileTexts().size());
+    std::setlocale(LC_CTYPE, before.c_str());
+}
+
+}  // namespace
