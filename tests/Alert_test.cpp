@@ -293,6 +293,8 @@ TEST(AlertText, HasEveryPart)
         {alertOf(1, 2, 3, "", {";{} "}), "Alert 1; 2; 3; ; " + someTimeText + "; { 3b7b7d20 }"},
         {alertOf(1, 2, 3, std::string("\0", 1), {std::string("\0\xff", 2)}),
          "Alert 1; 2; 3; " + std::string("\0", 1) + "; " + someTimeText + "; { 00ff }"},
+        {alertOf(1, 2, 3, std::string("\0a", 2), {std::string("\0a", 2)}),
+         "Alert 1; 2; 3; " + std::string("\0a", 2) + "; " + someTimeText + "; { 0061 }"},
     };
     for (const auto& row : rows) {
         SCOPED_TRACE(row.text);

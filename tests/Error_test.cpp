@@ -158,6 +158,13 @@ TEST(ErrorConstructor, KeepsEveryByteOfAStringAndEndsCharactersAtTheFirstNul)
     EXPECT_EQ(Error(message, 5).operator std::string(), std::string("5 - a\0b", 7));
 }
 
+TEST(ErrorText, WritesAMessageThatBeginsWithNul)
+{
+    const std::string message("\0a", 2);
+    EXPECT_EQ(Error(message, 5).operator std::string(), "5 - " + message);
+    EXPECT_EQ(Error(5, Number(17u), message).operator std::string(), "5 - 17 - " + message);
+}
+
 TEST(ErrorCopy, IsIndependentAndWhole)
 {
     const Error source(16, Number(17u), "a message that needs memory of its own");

@@ -565,6 +565,13 @@ TEST(FailurePath, TheExceptionIsBuiltAfterBothRecords)
     }
 }
 
+// It is too long for a string's own buffer, so composing it needs memory.
+TEST(FailurePath, TheTextOfARefusedSensorIsNotComposedBeforeTheRecords)
+{
+    observe::throwAt(observe::Call::bufferConstructor, 1);
+    EXPECT_EQ(allocation::countOf([] { EXPECT_THROW(refuseNode(), observe::Thrown); }), 0);
+}
+
 TEST(ExceptionClasses, WhatStandsAfterTheTwoDestructors)
 {
     std::ptrdiff_t parts[2];

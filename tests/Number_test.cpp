@@ -1718,6 +1718,48 @@ TEST(NumberText, IsThatOfAFreshStreamUnderEveryLocale)
     }
 }
 
+// A program's own way of writing whole numbers and reals.
+class Bracketed : public std::num_put<char> {
+private:
+    iter_type do_put(iter_type out, std::ios_base&, char, long value) const override
+    {
+        return put(out, std::to_string(value));
+    }
+    iter_type do_put(iter_type out, std::ios_base&, char, unsigned long value) const override
+    {
+        return put(out, std::to_string(value));
+    }
+    iter_type do_put(iter_type out, std::ios_base&, char, unsigned long long value) const override
+    {
+        return put(out, std::to_string(value));
+    }
+    iter_type do_put(iter_type out, std::ios_base&, char, double value) const override
+    {
+        return put(out, std::to_string(value));
+    }
+
+    static iter_type put(iter_type out, const std::string& digits)
+    {
+        const std::string text = '<' + digits + '>';
+        return std::copy(text.begin(), text.end(), out);
+    }
+};
+
+TEST(NumberText, IsWrittenAsTheProgramsOwnLocaleWritesNumbers)
+{
+    const TextRow rows[] = {{Number(-7), "<-7>"},
+                            {Number(intSmallest), "<-2147483648>"},
+                            {Number(7), "<7>"},
+                            {Number(7u), "<7>"},
+                            {Number(18446744073709551615ull), "<18446744073709551615>"},
+                            {Number(-0.5), "<-0.500000>"},
+                            {Number(Version2 {2, 15}), "<2>.<15>"},
+                            {Number(sNodeRef {4, 7}), "CPU:<7>"}};
+    const GlobalLocale locale(std::locale(std::locale::classic(), new Bracketed));
+    for (const TextRow& row : rows)
+        EXPECT_EQ(text(row.number), row.expected);
+}
+
 TEST(NumberStream, InsertsTheTextWhateverTheStreamsSettings)
 {
     for (const TextRow& row : textRows) {

@@ -367,11 +367,9 @@ TEST(PropertyText, KeepsEveryByteOfATextAndOfTheElements)
 
 TEST(PropertyText, OfNumbersWritesOtherKindsAmongRunsOf32BitNumbers)
 {
-    EXPECT_EQ(numbers({Number(1u), Number(4294967295u), Number(12345ull), Number(true), Number(77777777u),
-                       Number(-1), Number(0u)})
-                  .
-                  operator std::string(),
-              "{1, 4294967295, 12345, true, 77777777, -1, 0}");
+    const PropertyValue mixed = numbers({Number(1u), Number(4294967295u), Number(12345ull), Number(true),
+                                         Number(77777777u), Number(-1), Number(0u)});
+    EXPECT_EQ(mixed.operator std::string(), "{1, 4294967295, 12345, true, 77777777, -1, 0}");
     EXPECT_EQ(numbers({Number(2.5), Number(100u), Number(99u)}).operator std::string(), "{2.5, 100, 99}");
 }
 
@@ -387,6 +385,19 @@ TEST(PropertyText, OfManyNumbersIsTheirTextsOneAfterAnother)
             SCOPED_TRACE(i);
             EXPECT_EQ(PropertyValue(numbers).operator std::string(), expected + "}");
         }
+    }
+}
+
+TEST(PropertyText, OfBytesHasABlankAfterEveryFourthWhateverTheLength)
+{
+    Buffer values;
+    std::string whole;
+    for (unsigned int length = 1; length <= 1024; ++length) {
+        values.push_back(0xa5);
+        whole += "a5";
+        if (length % 4 == 0)
+            whole += ' ';
+        ASSERT_EQ(bytes(values).operator std::string(), whole) << "of " << length << " bytes";
     }
 }
 
