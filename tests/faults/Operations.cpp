@@ -76,6 +76,8 @@ std::vector<Named<PropertyValue>> properties(std::vector<PropertyValue> ofEachKi
     for (const char* const name : names)
         all.push_back({name, ofEachKind[all.size()]});
     all.push_back({"date", PropertyValue(Number(1234567890L, 123), true)});
+    // Its strings have to grow, one after another, when longer ones are assigned.
+    all.push_back({"short texts", IC::StringArray {"a", "b", "c", "d"}});
     all.push_back({"dates", IC::NumberArray {Number(1234567890L, 123), Number(1L, 7), Number(5.25)}});
     for (const char* const name : {"text", "numbers"}) {
         PropertyValue empty = name == std::string("text") ? ofEachKind[2] : ofEachKind[5];
