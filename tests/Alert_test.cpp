@@ -312,7 +312,7 @@ TEST(AlertText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
     {
         const GlobalGroupingLocale grouping(1);
         EXPECT_EQ(alert.operator std::string(),
-                  "Alert 3; 5; 8,5; 1234567; " + someTimeText + "; { 31323334 }");
+                  "Alert 3; 5; 8,5; 1234567; <1,2,3,4,5,6,7,8,9,0.2,5,0/2>; { 31323334 }");
     }
     EXPECT_EQ(alert.operator std::string(), "Alert 3; 5; 85; 1234567; " + someTimeText + "; { 31323334 }");
 }
@@ -333,7 +333,8 @@ TEST(AlertText, IsWholeOrNotAtAllWhenMemoryRunsOut)
         alert, "Alert 3; 5; 85; a message that needs memory of its own; " + someTimeText + paths);
     const GlobalGroupingLocale grouping(1);
     allocation::expectTextWholeOrNotAtAll(
-        alert, "Alert 3; 5; 8,5; a message that needs memory of its own; " + someTimeText + paths);
+        alert,
+        "Alert 3; 5; 8,5; a message that needs memory of its own; <1,2,3,4,5,6,7,8,9,0.2,5,0/2>" + paths);
 }
 
 TEST(AlertStream, InsertsTheAlertAsOneText)

@@ -285,6 +285,24 @@ TEST(PropertyComparison, OfDifferentKindsIsUnequalAndNotOrdered)
     }
 }
 
+TEST(PropertyComparison, OfDifferentKindsIsUnequalAlsoWhereTheContentsLookAlike)
+{
+    const PropertyValue alike[][2] = {
+        {number(Number(3u)), PropertyValue(EnumValue(Number::KIND_UINT32))},
+        {bytes({}), numbers({})},
+        {bytes({}), texts({})},
+        {numbers({}), texts({})},
+        {text("{}"), texts({})},
+        {bytes({}), PropertyValue(PropertyValue::KIND_UNKNOWN)},
+    };
+    for (const auto& [a, b] : alike) {
+        SCOPED_TRACE(seen(a) + " and " + seen(b));
+        EXPECT_FALSE(a == b);
+        EXPECT_FALSE(b == a);
+        EXPECT_TRUE(a != b);
+    }
+}
+
 TEST(PropertyComparison, OfATextAndANumberNamesBothKinds)
 {
     expectRefusal<PropertyValueInvalidKind>(

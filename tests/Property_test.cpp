@@ -405,6 +405,17 @@ TEST(PropertyKind, RefusedChangeLeavesAValueThatCanBeDestroyed)
     }
 }
 
+TEST(PropertyKind, RefusedChangeCanBeRefusedAgain)
+{
+    for (const PropertyValue& original : samples()) {
+        SCOPED_TRACE(seen(original));
+        PropertyValue value(original);
+        expectInvalidKind([&] { value.setKind(7); }, 7);
+        expectInvalidKind([&] { value.setKind(255); }, 255);
+        EXPECT_EQ(value.getKind(), original.getKind());
+    }
+}
+
 TEST(PropertyKind, RefusedChangeLeavesAValueThatCanBeAssigned)
 {
     for (const PropertyValue& original : samples()) {

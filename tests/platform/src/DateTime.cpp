@@ -77,8 +77,8 @@ DateTime::operator std::string() const
 std::ostream& operator<<(std::ostream& out, const DateTime& time)
 {
     observe::reached(observe::Call::dateTimeText);
-    return out << '<' + std::to_string(static_cast<long>(time)) + '.' + std::to_string(time.getMillisecond())
-        + '/' + std::to_string(time.getScope()) + '>';
+    return out << '<' << static_cast<long>(time) << '.' << time.getMillisecond() << '/' << time.getScope()
+               << '>';
 }
 
 }  // namespace ZQ

@@ -7,7 +7,8 @@
 namespace ZQ {
 
 // A date-time whose two texts differ, so that a test sees which of them was asked for: std::string gives
-// "1234567890/3" (seconds and scope), the stream operator "<1234567890.250/3>" (milliseconds too).
+// "1234567890/3" (seconds and scope), the stream operator "<1234567890.250/3>" (milliseconds too;
+// its numbers follow the stream).
 // now() is the clock that the test has set (observe/Platform.h). Objects are counted.
 class DateTime {
 public:
