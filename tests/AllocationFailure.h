@@ -81,6 +81,7 @@ void expectTextWholeOrNotAtAll(const Value& value, const std::string& whole)
         ASSERT_LT(allowed, 1000);
         std::ostringstream out;
         const bool completed = completesWith(allowed, [&] { out << value; });
+        EXPECT_TRUE(completed || out.str().empty()) << "with memory for " << allowed << " allocations";
         if (completed && out.good()) {
             EXPECT_EQ(out.str(), whole) << "with memory for " << allowed << " allocations";
             return;

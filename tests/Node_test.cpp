@@ -1,5 +1,6 @@
 #include <algorithm>
 #include <atomic>
+#include <csignal>
 #include <cstddef>
 #include <cstring>
 #include <functional>
@@ -429,6 +430,16 @@ TEST(NodeDestructor, GoesOnWhenTheLockSaysNo)
         observe::reset();
     }
     EXPECT_EQ(allocation::aliveNow, before);
+}
+
+TEST(NodeDestructor, EndsTheProgramWhereTheLockThrows)
+{
+    EXPECT_EXIT(
+        {
+            observe::throwAt(observe::Call::lock, 1);
+            const FilledProbe node;
+        },
+        testing::KilledBySignal(SIGABRT), "observe::Thrown");
 }
 
 TEST(NodeStatus, IsReadUnderBothNames)
