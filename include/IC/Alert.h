@@ -16,6 +16,10 @@ namespace IC {
 // nodes, and a text.
 //
 // Checked once, when it is built, and then read. A plain value; one object belongs to one thread at a time.
+// Every refusal writes a log record and a trace record and then throws; what the platform throws while it
+// writes them comes instead. Whatever needs memory may throw std::bad_alloc; what makes, copies, moves or
+// assigns an alert, or gives its time stamp or its text, passes on what ZQ::DateTime throws. Whatever is
+// thrown, nothing has changed.
 //
 //   IC::Alert alert(2, 1, {"/fan/1"}, 5, "Fan failed");
 //   std::cout << alert;                        // Alert 2; 1; 5; Fan failed; <time>; { 2f66616e2f31 }
@@ -43,11 +47,11 @@ public:
     Alert(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
           std::vector<std::string> nodePaths, unsigned int status, std::string message);
 
-    // An event now. The clock is read before the codes are checked.
+    // An event now. The clock is read before the codes are checked; what it throws comes before any refusal.
     Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
           unsigned int status, std::string message);
 
-    // When anything throws in an assignment, the alert is as it was.
+    // Assignment leaves the old alert or the new one, never parts of both.
     Alert(const Alert&) = default;
     Alert(Alert&&) = default;
     Alert& operator=(const Alert& source);
@@ -87,7 +91,8 @@ private:
     std::string message_;
 };
 
-// Inserts std::string(alert) as one text: width and fill apply to the whole of it.
+// Inserts std::string(alert) as one text: width and fill apply to the whole of it. Where the text throws,
+// nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const Alert& alert);
 
 }  // namespace IC

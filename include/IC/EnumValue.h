@@ -13,7 +13,9 @@ namespace IC {
 // One member of some enumeration as a plain unsigned number; it does not know which enumeration.
 //
 // A plain value, trivially copyable; one object belongs to one thread at a time. Every refusal writes a log
-// record and a trace record (category "Vexilon.IC.EnumValue", level 6000) and then throws.
+// record and a trace record (category "Vexilon.IC.EnumValue", level 6000) and then throws; what the platform
+// throws while it writes them comes instead. Refusals apart, only a text may throw, and that std::bad_alloc.
+// Whatever is thrown, nothing has changed.
 //
 //   IC::EnumValue state(7u);
 //   unsigned char code = state;                // 7
@@ -62,7 +64,8 @@ bool operator<=(const EnumValue& a, const EnumValue& b);
 bool operator>(const EnumValue& a, const EnumValue& b);
 bool operator>=(const EnumValue& a, const EnumValue& b);
 
-// Inserts std::string(value) as one text: width and fill apply to the whole of it.
+// Inserts std::string(value) as one text: width and fill apply to the whole of it. Where the text throws,
+// nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const EnumValue& value);
 
 }  // namespace IC

@@ -12,7 +12,10 @@ namespace IC {
 
 // How an operation went, without an exception: a status, perhaps a number that goes with it, perhaps a text.
 //
-// Built once and read. A plain value; one object belongs to one thread at a time.
+// Built once and read. A plain value; one object belongs to one thread at a time. The refusal writes a log
+// record and a trace record and then throws; what the platform throws while it writes them comes instead.
+// Where a message or a text finds no memory, std::bad_alloc is thrown; the text of a date-time throws as in
+// Number. Whatever is thrown, nothing has changed.
 //
 //   IC::Error error("no such property", IC::Error::STATUS_NO_SUCH_PROPERTY);
 //   std::cout << error;                        // 5 - no such property
@@ -40,7 +43,7 @@ public:
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
 
-    // Where memory runs out in an assignment, std::bad_alloc is thrown and the error is as it was.
+    // Assignment leaves the old error or the new one, never parts of both.
     Error(const Error&) = default;
     Error(Error&&) noexcept = default;
     Error& operator=(const Error& source);
@@ -74,7 +77,8 @@ private:
     std::string message_;
 };
 
-// Inserts std::string(error) as one text: width and fill apply to the whole of it.
+// Inserts std::string(error) as one text: width and fill apply to the whole of it. Where the text throws,
+// nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const Error& error);
 
 }  // namespace IC

@@ -7,6 +7,9 @@
 namespace IC {
 
 // The root of the library's own exceptions. It has no base: handlers of std::exception do not see it.
+//
+// To build one, copy or assign one, or ask it what() needs memory: std::bad_alloc may be thrown, and then
+// nothing has changed. One object belongs to one thread at a time. So it is for the classes derived from it.
 class __attribute__((visibility("default"))) ICException {
 public:
     explicit ICException(const std::string& text = std::string());

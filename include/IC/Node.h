@@ -25,7 +25,13 @@ namespace IC {
 // is neither copied nor assigned. It may be shared between threads: status, description and properties are
 // read and changed under its lock, and what is read is a copy. Sensor type, path and parent are read without
 // the lock; they are taken as fixed once the node is built. No operation holds the locks of two nodes. The
-// lock is given back on every way out, exceptions included.
+// lock is given back on every way out, also by an exception and where the thread is cancelled. One thread
+// destroys the node, when no other uses it any more. A child of fork() must not use a node that another
+// thread of its parent held.
+//
+// What locks passes on what the lock throws, what writes a record what the platform throws there, what calls
+// an override what that throws; whatever makes or copies a value, a map or a text may throw std::bad_alloc.
+// Then nothing has changed. Comparisons and the readers of the sensor type throw nothing.
 //
 //   class Fan : public IC::Node {
 //   public:
@@ -141,7 +147,7 @@ public:
     virtual std::string getDescription() const;
 
     // Copies the property into `value`, read-only mark included. Returns STATUS_SUCCESS, or
-    // STATUS_NO_SUCH_PROPERTY with `value` untouched. Writes no record.
+    // STATUS_NO_SUCH_PROPERTY with `value` untouched, as it is where anything throws. Writes no record.
     virtual Error getProperty(unsigned int key, PropertyValue& value) const;
 
     virtual std::map<unsigned int, PropertyValue> getProperties() const;
@@ -156,7 +162,7 @@ public:
     //
     // Whatever the outcome, the request is logged before the lock is taken: "setProperty: ", the key, a blank
     // and the value, at level 3000. Every log record is followed by its trace record; the category is
-    // "Vexilon.IC.Node". When anything throws, the property is as it was.
+    // "Vexilon.IC.Node". Where anything throws, the property is as it was; the records before it stay.
     virtual Error setProperty(const unsigned int& key, const PropertyValue& value);
 
     // "Node 6162 : 20, status = 0": the path in hexadecimal, the sensor code, the status as getStatus gives
@@ -171,11 +177,12 @@ public:
     // The status of this very object, under the lock, also where a derived class overrides getStatus.
     operator StatusType() const;
 
-    // Two lower-case hexadecimal digits for each byte, NUL bytes included.
+    // Two lower-case hexadecimal digits for each byte, NUL bytes included. Without the lock.
     std::string hexstring(std::string bytes) const;
 
 protected:
-    mutable ZQ::Mutex mutex;  // guards status, description and properties
+    // Guards status, description and properties. Who holds it may call every operation: it is re-entrant.
+    mutable ZQ::Mutex mutex;
     StatusType status IC_ANNOTATION(guarded_by(mutex)) = STATUS_INITIAL;
 
 private:
@@ -192,7 +199,7 @@ protected:
 };
 
 // Compare the paths, byte by byte as unsigned values, and nothing else: nodes with the same path are equal.
-// Without any lock.
+// Without any lock; nothing is thrown.
 bool operator==(const Node& a, const Node& b);
 bool operator!=(const Node& a, const Node& b);
 bool operator<(const Node& a, const Node& b);
@@ -201,6 +208,7 @@ bool operator>(const Node& a, const Node& b);
 bool operator>=(const Node& a, const Node& b);
 
 // Inserts the node's text, as its class writes it, as one text: width and fill apply to the whole of it.
+// Where the text throws, nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const Node& node);
 
 }  // namespace IC

@@ -31,7 +31,8 @@ void append(Text& text, const std::vector<Number>& numbers);
 namespace IC {
 
 // The display names of the sensor types, indexed by Node::SensorType. Entry 74, "invalid", is no sensor type.
-// Programs hold a copy of the table, so its size never changes.
+// Programs hold a copy of the table, so its size never changes. It is filled before the program's own objects
+// are built, and then any thread may read it.
 extern const std::string pst[75];
 
 // A version of two numbers; its text is "2.15".
@@ -51,7 +52,9 @@ using NodeRef = sNodeRef;
 //
 // A plain value, trivially copyable; one object belongs to one thread at a time. It has no default
 // constructor. Every refusal writes a log record and a trace record (category "Vexilon.IC.Number", level
-// 6000) and then throws; a refused conversion or comparison changes nothing.
+// 6000) and then throws; what the platform throws while it writes them comes instead. Refusals apart, only
+// two things throw: a text, std::bad_alloc; and what takes, gives or prints a date-time, what the platform
+// throws. Whatever is thrown, nothing has changed, but for a refused initKind.
 //
 //   IC::Number speed(3600u);
 //   unsigned int rpm = speed;                  // 3600
@@ -130,8 +133,8 @@ public:
     //     "initkind: invalid kind of number ", and the kind
     //       "Invalid kind of number"
     //
-    // The refused kind stays stored (deliberate). A kind of 11 or more then behaves like KIND_UNKNOWN in
-    // conversions and comparisons, and its text is "invalid".
+    // The refused kind stays stored (deliberate), whatever the platform throws. A kind of 11 or more then
+    // behaves like KIND_UNKNOWN in conversions and comparisons, and its text is "invalid".
     void initKind(const KindType& kind);
 
     // Replaces the kind and keeps the bytes of the value as they lie in storage: a reinterpretation, no
@@ -284,9 +287,9 @@ static_assert(std::is_trivially_copyable_v<Number>);
 static_assert(std::is_trivially_copyable_v<Version2>);
 static_assert(std::is_trivially_copyable_v<sNodeRef>);
 
-// Equality never fails. Numbers of different kinds are unequal. Signed numbers are all equal, and so are node
-// references, and the kinds without a value. Date-times are equal whatever their scope; a real NaN equals
-// nothing.
+// Equality never throws. Numbers of different kinds are unequal. Signed numbers are all equal, and so are
+// node references, and the kinds without a value. Date-times are equal whatever their scope; a real NaN
+// equals nothing.
 [[gnu::visibility("default")]] inline bool operator==(const Number& a, const Number& b)
 {
     if (Number::both(Number::KIND_UINT32, a, b))
@@ -331,7 +334,8 @@ bool operator!=(const Number& a, const Number& b);
 bool operator<=(const Number& a, const Number& b);
 bool operator>=(const Number& a, const Number& b);
 
-// Inserts std::string(number) as one text: width and fill apply to the whole of it.
+// Inserts std::string(number) as one text: width and fill apply to the whole of it. Where the text throws,
+// nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const Number& number);
 
 }  // namespace IC

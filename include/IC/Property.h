@@ -24,8 +24,10 @@ using StringArray = std::vector<std::string>;
 //
 // A value type: a copy is independent of its source. One object belongs to one thread at a time. Every
 // refusal but one (to EnumValue) writes a log record and a trace record (category "Vexilon.IC.Property",
-// level 6000) and then throws. Where memory runs out, std::bad_alloc is thrown and, but for a
-// refused setKind, the value is as it was.
+// level 6000) and then throws; what the platform throws while it writes them comes instead. Refusals apart,
+// what makes, copies or assigns a value, a container or a text, and a change of kind, may throw
+// std::bad_alloc; moving, swapping, comparing and the other conversions need no memory. A date-time's text
+// throws as in Number. Whatever is thrown, the value is as it was, but for a refused setKind.
 //
 //   IC::PropertyValue model("DCS8000Z", true); // a read-only text
 //   std::string text = model;                  // DCS8000Z
@@ -172,9 +174,11 @@ public:
     // Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
     // keeps the value. Codes of 7 and above are refused as by the constructor from a kind.
     //
-    // A refused code still costs the old value (deliberate): the kind stays, without an object. Give such a
-    // value another kind, or assign to it. Until then conversions to a native type refuse it as they refuse
-    // another kind, its text is "invalid", and it is neither less nor greater than any value of its kind.
+    // A refused code still costs the old value (deliberate), whatever the platform throws meanwhile: the kind
+    // stays, without an object. Give such a value another kind, or assign to it. Until then conversions to a
+    // native type refuse it as they refuse another kind, its text is "invalid", and it is neither less nor
+    // greater than any value of its kind. A kind that is not refused leaves all as it was where it finds no
+    // memory.
     void setKind(const unsigned char& kind);
 
     // The conversions. A number converts as Number does, refusals included; an enumerated value answers as an
@@ -324,7 +328,7 @@ private:
     [[maybe_unused]] ZQ::Uint32 reserved_ = 0;
 };
 
-// Equality never fails. Values of different kinds are unequal; the read-only mark is not compared. Numbers
+// Equality never throws. Values of different kinds are unequal; the read-only mark is not compared. Numbers
 // and enumerated values compare as Number and EnumValue do, everything else by its bytes or elements.
 [[gnu::visibility("default")]] inline bool operator==(const PropertyValue& a, const PropertyValue& b)
 {
@@ -340,9 +344,9 @@ private:
 bool operator!=(const PropertyValue& a, const PropertyValue& b);
 
 // Within one kind: numbers and enumerated values as Number and EnumValue do, refusals included; the others
-// lexicographically, bytes unsigned. Nothing is neither less nor greater than nothing. Different kinds are
-// refused with PropertyValueInvalidKind: what is logged (for > it begins with ">"), and below it what the
-// exception says.
+// lexicographically, bytes unsigned, numbers in an array by their own <, refusals included. Nothing is
+// neither less nor greater than nothing. Different kinds are refused with PropertyValueInvalidKind: what is
+// logged (for > it begins with ">"), and below it what the exception says.
 //
 //     "<: cannot compare two different kinds of properties, kind1=2, kind2=1"
 //       "Cannot compare two different kinds of properties"
@@ -372,10 +376,12 @@ bool operator>=(const PropertyValue& a, const PropertyValue& b);
 // The byte as two lower-case hexadecimal digits.
 std::string pB(unsigned char byte);
 
-// Inserts std::string(value) as one text: width and fill apply to the whole of it.
+// Inserts std::string(value) as one text: width and fill apply to the whole of it. Where the text throws,
+// nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const PropertyValue& value);
 
-// "7 = " and the value, piece by piece; the number follows the stream's own settings.
+// "7 = " and the value, piece by piece; the number follows the stream's own settings. What was inserted
+// before a piece throws stays, here and for a map.
 std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, PropertyValue>& property);
 
 // "[1 = abc], [7 = {1, 2}]" in the order of the numbers, piece by piece. An empty map writes nothing.

@@ -37,7 +37,8 @@ struct Record {
 using RecordSink = std::function<void(const Record&)>;
 
 // Replaces the sink of the whole program and returns the one before it; an empty `sink` restores the default.
-// Any thread may call at any time; a call of the old sink that has begun runs to its end.
+// Any thread may call at any time; a call of the old sink that has begun runs to its end. Where the old sink
+// cannot be copied, or memory runs out, what that throws is thrown and the old sink stays.
 //
 // The default sink writes each log record to standard error as one line: time, level, category, file and
 // line, function, text. Control characters, backslashes and bytes that are not UTF-8 are written escaped, so

@@ -7,7 +7,8 @@
 namespace VXLog {
 
 // Writes records: each call hands one to the current sink (RecordSink.h), on the calling thread. Any thread
-// may call at any time. What the sink throws reaches the caller.
+// may call at any time, and so may a child of fork(), whatever the other threads of its parent were doing.
+// What the sink throws reaches the caller.
 class __attribute__((visibility("default"))) VXLogger {
 public:
     // `function` and `file` name the place in the source together with `line`; `logger` is the category.

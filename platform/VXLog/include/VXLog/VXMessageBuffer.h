@@ -9,9 +9,10 @@ namespace VXLog {
 
 // Composes the text of a record: pieces go in with <<, the text comes out with str.
 //
-// Numbers are written in the classic locale, so that a record reads the same in every program; unsigned int and
-// double take no heed of what manipulators have set. Where memory
-// runs out, the insertion throws std::bad_alloc; a text is never cut short. One buffer belongs to one thread.
+// Numbers are written in the classic locale, so that a record reads the same in every program; unsigned int
+// and double take no heed of what manipulators have set. Where memory runs out, the construction or the
+// insertion throws std::bad_alloc; a text is never cut short. One buffer belongs to one thread at a time;
+// several may be composed at once.
 class __attribute__((visibility("default"))) VXMessageBuffer {
 public:
     VXMessageBuffer();

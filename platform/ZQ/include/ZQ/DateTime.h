@@ -9,9 +9,9 @@ namespace ZQ {
 
 // A point in time: seconds since the epoch (UTC), milliseconds beside them, and a scope code.
 //
-// A plain value; one object belongs to one thread at a time. Nothing is checked or normalised: what is given
-// is what is given back. The scope says how its owner means the time; it is carried for the owner and changes
-// neither the seconds nor the text.
+// A plain value; one object belongs to one thread at a time. Only the text needs memory and may throw
+// std::bad_alloc. Nothing is checked or normalised: what is given is what is given back. The scope says how
+// its owner means the time; it is carried for the owner and changes neither the seconds nor the text.
 //
 //   ZQ::DateTime time(1234567890, 3);
 //   time.setMillisecond(123);

@@ -9,8 +9,9 @@
 
 namespace ZQ {
 
-// A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as often.
-// Every operation may be called from any thread.
+// A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as often. Every
+// operation may be called from any thread. It is destroyed when no thread holds it, and a child of fork()
+// must not use one that another thread of its parent held.
 class __attribute__((visibility("default"))) __attribute__((capability("mutex"))) Mutex {
 public:
     Mutex() = default;
@@ -28,7 +29,7 @@ public:
         return true;
     }
 
-    // Gives back one lock. The calling thread must hold the mutex.
+    // Gives back one lock; throws nothing. The calling thread must hold the mutex.
     void unlock() { mutex_.unlock(); }
 
 private:
