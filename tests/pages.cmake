@@ -1,0 +1,30 @@
+# The pages whose programs are files: each page, and what it shows, in its order.
+
+# ic_test_page(NAME PAGE EXAMPLE...): an example is a source below examples/ or tests/, or SOURCE=TARGET for one that
+# is run.
+function(ic_test_page name page)
+    set(examples)
+    foreach(example IN LISTS ARGN)
+        string(REGEX REPLACE "=(.*)" "|$<TARGET_FILE:\\1>" example ${example})
+        list(APPEND examples ${PROJECT_SOURCE_DIR}/${example})
+    endforeach()
+    add_test(NAME ${name} COMMAND ${CMAKE_COMMAND} -D PAGE=${PROJECT_SOURCE_DIR}/${page} -D "EXAMPLES=${examples}"
+        -D EMULATOR=${emulator} -P ${CMAKE_CURRENT_FUNCTION_LIST_DIR}/page.cmake)
+endfunction()
+
+if(TARGET fan)
+    ic_test_page(readme README.md examples/fan/fan.cpp=fan)
+endif()
+
+if(TARGET guide-01-derive-a-node)
+    set(examples)
+    foreach(step 01-derive-a-node Fan.h 02-fill-it 03-read-and-convert 04-change-a-property 05-handle-a-refusal
+                 06-write-to-the-log 07-connect-your-logging 08-share-a-node 09-raise-an-alert)
+        if(step MATCHES "\\.h$")
+            list(APPEND examples examples/guide/${step})
+        else()
+            list(APPEND examples examples/guide/${step}.cpp=guide-${step})
+        endif()
+    endforeach()
+    ic_test_page(guide docs/guide.md ${examples})
+endif()
