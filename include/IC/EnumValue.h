@@ -20,6 +20,9 @@ namespace IC {
 //   IC::EnumValue state(7u);
 //   unsigned char code = state;                // 7
 //   std::cout << state;                        // 7
+//
+// `state == 7u` does not compile, since each side converts to the other: write `state == EnumValue(7u)`. Nor does
+// `state = 7`, with a signed number.
 class __attribute__((visibility("default"))) EnumValue {
 public:
     EnumValue() noexcept : value_(0) { }

@@ -22,7 +22,7 @@ namespace IC {
 //
 // Mind the order of the arguments: the constructor of three takes the status first, the others last. A literal 0
 // for the number is taken for a null text: write Number(0). The status is a byte: it prints as a character; write
-// `out << +error.getStatus()`, or the error itself.
+// `out << +error.getStatus()`, or the error itself. `error == 5` does not compile: compare with an enumerator.
 class __attribute__((visibility("default"))) Error {
 public:
     // 1 to 4 and 6 to 15 are valid as well; their meaning is the caller's.

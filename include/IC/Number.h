@@ -66,6 +66,9 @@ using NodeRef = sNodeRef;
 // - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
 // - A signed number converts to int and to nothing else; a real of -1 or less converts to no integer.
 // - Two signed numbers are always equal and never ordered; so are two node references.
+// - `number < 5u` does not compile, since each side converts to the other: write `number < Number(5u)`. Nor do
+//   `x += number`, a conversion to long or float, and `text = number` for an existing std::string: name the
+//   type, as in `text = std::string(number)`.
 class __attribute__((visibility("default"))) Number {
 public:
     enum KindType : ZQ::Uint32 {

@@ -40,6 +40,8 @@ using StringArray = std::vector<std::string>;
 //   PropertyValue(IC::Number(5)) for the number.
 // - Write `IC::StringArray texts = value;`, never `{value}`: braces make an array of one element.
 //   To an existing std::string assign `std::string(value)`; `text = value` does not compile.
+// - `value == Number(5u)` does not compile, since each side converts to the other: write
+//   `value == PropertyValue(Number(5u))`. A text compares as it stands: `value == "AFB0812"`.
 // - No operation here looks at the read-only mark; assignment replaces it.
 class __attribute__((visibility("default"))) PropertyValue {
 public:

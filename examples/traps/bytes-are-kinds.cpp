@@ -1,0 +1,15 @@
+#include "IC/Number.h"
+#include <cstdint>
+#include <iostream>
+
+int main()
+{
+    const std::uint8_t byte = 3;
+    const std::uint16_t word = 3;
+    const IC::Number fromByte(byte);  // the kind with the code 3, and its first value
+    const IC::Number fromWord(word);  // a signed number
+    const IC::Number wanted(static_cast<unsigned int>(byte));
+    std::cout << fromByte << " of kind " << fromByte.getKind() << '\n';
+    std::cout << fromWord << " of kind " << fromWord.getKind() << '\n';
+    std::cout << wanted << " of kind " << wanted.getKind() << '\n';
+}
