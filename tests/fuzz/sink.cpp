@@ -15,6 +15,7 @@
 #include "VXLog/VXLogger.h"
 #include "VXLog/VXMessageBuffer.h"
 #include "model/Outcome.h"
+#include "model/PropertyValue.h"
 
 namespace {
 
@@ -95,13 +96,11 @@ std::string escaped(std::string_view text)
             out += code == '\\' ? "\\\\" : std::string(text.substr(0, length));
         } else {
             length = 1;
-            char digits[5];
-            std::snprintf(digits, sizeof digits, "\\x%02x",
-                          static_cast<unsigned int>(static_cast<unsigned char>(text.front())));
-            out += text.front() == '\n' ? "\\n"
-                : text.front() == '\r'  ? "\\r"
-                : text.front() == '\t'  ? "\\t"
-                                        : digits;
+            const char byte = text.front();
+            out += byte == '\n' ? "\\n"
+                : byte == '\r'  ? "\\r"
+                : byte == '\t'  ? "\\t"
+                                : "\\x" + model::hexadecimal(static_cast<unsigned char>(byte));
         }
         text.remove_prefix(length);
     }

@@ -72,7 +72,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     std::array<ValuePair, 3> slots = {anyValue(bytes), anyValue(bytes), agreement::pairOfNothing(false)};
     NumberPair number = anyNumber(bytes);
 
-    for (int step = 0; step < 12 && bytes.remaining_bytes() != 0; ++step) {
+    for (int step = 0; step < 6 && bytes.remaining_bytes() != 0; ++step) {
         ValuePair& a = slots[bytes.ConsumeIntegralInRange<std::size_t>(0, slots.size() - 1)];
         ValuePair& b = slots[bytes.ConsumeIntegralInRange<std::size_t>(0, slots.size() - 1)];
         switch (bytes.ConsumeIntegralInRange(0u, 9u)) {
