@@ -187,10 +187,13 @@ Number ofKind(ZQ::Uint32 code)
 
 using Bytes = std::array<unsigned char, sizeof(Number)>;
 
+// But for the padding between the kind and the content, which has no value.
 Bytes bytesOf(const Number& number)
 {
     Bytes bytes;
     std::memcpy(bytes.data(), &number, sizeof number);
+    std::fill(bytes.begin() + sizeof(Number::KindType), bytes.begin() + alignof(Number),
+              static_cast<ZQ::Uint8>(0));
     return bytes;
 }
 
