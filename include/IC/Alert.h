@@ -57,18 +57,25 @@ public:
     Alert& operator=(const Alert& source);
     Alert& operator=(Alert&&) = default;
 
+    // When it happened.
     ZQ::DateTime getTimeStamp() const { return timeStamp_; }
 
+    // 0 to 3, under two names.
     SeverityType getSeverity() const noexcept { return severity_; }
     operator SeverityType() const noexcept { return severity_; }
 
+    // 0 to 5, under two names.
     ClassType getClass() const noexcept { return alertClass_; }
     operator ClassType() const noexcept { return alertClass_; }
 
+    // The status that it reports of the nodes, 0 to 85, under two names.
     Node::StatusType getStatus() const noexcept { return status_; }
     operator Node::StatusType() const noexcept { return status_; }
 
+    // Which nodes it is about, in the order given.
     std::vector<std::string> getNodePaths() const { return nodePaths_; }
+
+    // What it says, perhaps nothing.
     std::string getMessage() const { return message_; }
 
     // Two lower-case hexadecimal digits for each byte of the text, NUL bytes included.

@@ -25,6 +25,7 @@ namespace IC {
 // `state = 7`, with a signed number.
 class __attribute__((visibility("default"))) EnumValue {
 public:
+    // 0, or the value given.
     EnumValue() noexcept : value_(0) { }
     EnumValue(const unsigned char& value) noexcept : value_(value) { }
     EnumValue(const unsigned short& value) noexcept : value_(value) { }

@@ -49,13 +49,16 @@ public:
     Error& operator=(const Error& source);
     Error& operator=(Error&&) noexcept = default;
 
+    // 0 to 16, under three names.
     StatusType getStatus() const noexcept { return status_; }
     operator StatusType() const noexcept { return status_; }
     operator unsigned char() const noexcept { return status_; }
 
+    // The number that goes with the status, of kind Number::KIND_UNKNOWN where there is none.
     Number getValue() const noexcept { return value_; }
     operator Number() const noexcept { return value_; }
 
+    // The text, empty where there is none.
     std::string getMessage() const { return message_; }
 
     // The status; " - " and the number unless its kind is KIND_UNKNOWN; " - " and the message unless it is

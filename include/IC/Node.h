@@ -16,6 +16,7 @@
 
 #pragma GCC visibility push(default)
 
+// The machine that a hardware-management agent manages, as nodes, values, errors and alerts.
 namespace IC {
 
 // A managed object: one component of the machine, with a sensor type, a status, a description, its own path
@@ -143,6 +144,7 @@ public:
     // Empties the properties under the lock. The program ends (std::terminate) should the lock throw here.
     virtual ~Node();
 
+    // Read under the lock.
     virtual StatusType getStatus() const;
     virtual std::string getDescription() const;
 
@@ -150,6 +152,7 @@ public:
     // STATUS_NO_SUCH_PROPERTY with `value` untouched, as it is where anything throws. Writes no record.
     virtual Error getProperty(unsigned int key, PropertyValue& value) const;
 
+    // A copy of all of them, made under the lock.
     virtual std::map<unsigned int, PropertyValue> getProperties() const;
 
     // Replaces the property by a copy of `value`, its read-only mark included; the mark of the stored value
@@ -169,6 +172,7 @@ public:
     // it, which is called under the lock. As a fresh std::ostringstream writes it under the global locale.
     virtual operator std::string() const;
 
+    // Fixed once the node is built, and read without the lock.
     SensorType getSensor() const noexcept { return sensor_; }
     operator SensorType() const noexcept { return sensor_; }
     std::string getPath() const { return path; }
@@ -183,7 +187,7 @@ public:
 protected:
     // Guards status, description and properties. Who holds it may call every operation: it is re-entrant.
     mutable ZQ::Mutex mutex;
-    StatusType status IC_ANNOTATION(guarded_by(mutex)) = STATUS_INITIAL;
+    StatusType status IC_ANNOTATION(guarded_by(mutex)) = STATUS_INITIAL;  // see getStatus
 
 private:
     friend bool operator==(const Node& a, const Node& b);
@@ -192,10 +196,10 @@ private:
     SensorType sensor_ = SENSOR_UNKNOWN;
 
 protected:
-    std::string description IC_ANNOTATION(guarded_by(mutex));
-    std::map<unsigned int, PropertyValue> properties IC_ANNOTATION(guarded_by(mutex));
-    std::string path;
-    std::string parent;
+    std::string description IC_ANNOTATION(guarded_by(mutex));                           // see getDescription
+    std::map<unsigned int, PropertyValue> properties IC_ANNOTATION(guarded_by(mutex));  // by their numbers
+    std::string path;    // what tells one node from another
+    std::string parent;  // the path of the node that this one is part of
 };
 
 // Compare the paths, byte by byte as unsigned values, and nothing else: nodes with the same path are equal.

@@ -37,15 +37,17 @@ extern const std::string pst[75];
 
 // A version of two numbers; its text is "2.15".
 struct Version2 {
-    ZQ::Uint8 major;
-    ZQ::Uint8 minor;
+    ZQ::Uint8 major;  // before the dot
+    ZQ::Uint8 minor;  // behind it
 };
 
 // A reference to a node: its sensor type (an index into `pst`) and its number.
 struct sNodeRef {
-    ZQ::Uint32 type;
-    ZQ::Uint32 id;
+    ZQ::Uint32 type;  // an index into `pst`
+    ZQ::Uint32 id;    // which of that type
 };
+
+// The same under another name.
 using NodeRef = sNodeRef;
 
 // One number of one of eleven kinds, which gives itself back only as what it is.
@@ -71,6 +73,7 @@ using NodeRef = sNodeRef;
 //   type, as in `text = std::string(number)`.
 class __attribute__((visibility("default"))) Number {
 public:
+    // What a number can be. Records name a kind by its code.
     enum KindType : ZQ::Uint32 {
         KIND_UNKNOWN = 0,   // no value
         KIND_BOOL = 1,      // a flag
@@ -85,6 +88,7 @@ public:
         KIND_NODEREF = 10   // an sNodeRef
     };
 
+    // A number of the kind that the type of `value` names.
     Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL) { store(static_cast<ZQ::Uint8>(value)); }
     Number(const int& value) noexcept : Number(Tag(), KIND_INT) { store(value); }
     Number(const unsigned int& value) noexcept : Number(Tag(), KIND_UINT32) { store(value); }
@@ -126,6 +130,7 @@ public:
     template <class T, std::enable_if_t<std::is_enum_v<T> && sizeof(T) == 1, int> = 0>
     Number(T) = delete;
 
+    // The kind, under two names.
     KindType getKind() const noexcept { return kind_; }
     operator KindType() const noexcept { return kind_; }
 

@@ -15,6 +15,7 @@
 
 namespace IC {
 
+// What a value holds where it holds more than one.
 using Buffer = std::vector<unsigned char>;
 using NumberArray = std::vector<Number>;
 using StringArray = std::vector<std::string>;
@@ -45,6 +46,7 @@ using StringArray = std::vector<std::string>;
 // - No operation here looks at the read-only mark; assignment replaces it.
 class __attribute__((visibility("default"))) PropertyValue {
 public:
+    // What a value can hold. Records name a kind by its code.
     enum KindType : ZQ::Uint32 {
         KIND_UNKNOWN = 0,      // nothing
         KIND_NUMBER = 1,       // a Number
@@ -55,6 +57,7 @@ public:
         KIND_STRINGARRAY = 6   // a StringArray
     };
 
+    // A value of the kind that the type of `value` names; `readOnly` is its mark.
     PropertyValue(const std::string& value, const bool& readOnly = false)
         : PropertyValue(new std::string(value), KIND_STRING, readOnly)
     {
@@ -169,8 +172,11 @@ public:
 
     ~PropertyValue() { release(); }
 
+    // The kind, under two names.
     KindType getKind() const noexcept { return static_cast<KindType>(kind_ & ~without); }
     operator KindType() const noexcept { return getKind(); }
+
+    // Whether Node::setProperty refuses to replace it.
     bool readOnly() const noexcept { return readOnly_; }
 
     // Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
