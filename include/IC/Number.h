@@ -30,171 +30,178 @@ void append(Text& text, const std::vector<Number>& numbers);
 
 namespace IC {
 
-// The display names of the sensor types, indexed by Node::SensorType. Entry 74, "invalid", is no sensor type.
-// Programs hold a copy of the table, so its size never changes. It is filled before the program's own objects
-// are built, and then any thread may read it.
+/// The display names of the sensor types, indexed by Node::SensorType. Entry 74, "invalid", is no sensor type.
+/// Programs hold a copy of the table, so its size never changes. It is filled before the program's own objects
+/// are built, and then any thread may read it.
 extern const std::string pst[75];
 
-// A version of two numbers; its text is "2.15".
+/// A version of two numbers; its text is "2.15".
 struct Version2 {
-    ZQ::Uint8 major;  // before the dot
-    ZQ::Uint8 minor;  // behind it
+    ZQ::Uint8 major;  ///< before the dot
+    ZQ::Uint8 minor;  ///< behind it
 };
 
-// A reference to a node: its sensor type (an index into `pst`) and its number.
+/// A reference to a node: its sensor type (an index into `pst`) and its number.
 struct sNodeRef {
-    ZQ::Uint32 type;  // an index into `pst`
-    ZQ::Uint32 id;    // which of that type
+    ZQ::Uint32 type;  ///< an index into `pst`
+    ZQ::Uint32 id;    ///< which of that type
 };
 
-// The same under another name.
+/// The same under another name.
 using NodeRef = sNodeRef;
 
-// One number of one of eleven kinds, which gives itself back only as what it is.
-//
-// A plain value, trivially copyable; one object belongs to one thread at a time. It has no default
-// constructor. Every refusal writes a log record and a trace record (category "Vexilon.IC.Number", level
-// 6000) and then throws; what the platform throws while it writes them comes instead. Refusals apart, only
-// two things throw: a text, std::bad_alloc; and what takes, gives or prints a date-time, what the platform
-// throws. Whatever is thrown, nothing has changed, but for a refused initKind.
-//
-//   IC::Number speed(3600u);
-//   unsigned int rpm = speed;                  // 3600
-//   std::cout << speed;                        // 3600
-//
-// Rules that look odd and are meant:
-// - unsigned char is a kind code: Number(static_cast<unsigned char>(3)) is the kind KIND_UINT32 with 0.
-//   unsigned short and char widen to int and give a signed number.
-// - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
-// - A signed number converts to int and to nothing else; a real of -1 or less converts to no integer.
-// - Two signed numbers are always equal and never ordered; so are two node references.
-// - `number < 5u` does not compile, since each side converts to the other: write `number < Number(5u)`. Nor do
-//   `x += number`, a conversion to long or float, and `text = number` for an existing std::string: name the
-//   type, as in `text = std::string(number)`.
+/// One number of one of eleven kinds, which gives itself back only as what it is.
+///
+/// A plain value, trivially copyable; one object belongs to one thread at a time. It has no default
+/// constructor. Every refusal writes a log record and a trace record (category "Vexilon.IC.Number", level
+/// 6000) and then throws; what the platform throws while it writes them comes instead. Refusals apart, only
+/// two things throw: a text, std::bad_alloc; and what takes, gives or prints a date-time, what the platform
+/// throws. Whatever is thrown, nothing has changed, but for a refused initKind.
+///
+///     IC::Number speed(3600u);
+///     unsigned int rpm = speed;                  // 3600
+///     std::cout << speed;                        // 3600
+///
+/// Rules that look odd and are meant:
+/// - unsigned char is a kind code: Number(static_cast<unsigned char>(3)) is the kind KIND_UINT32 with 0.
+///   unsigned short and char widen to int and give a signed number.
+/// - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
+/// - A signed number converts to int and to nothing else; a real of -1 or less converts to no integer.
+/// - Two signed numbers are always equal and never ordered; so are two node references.
+/// - `number < 5u` does not compile, since each side converts to the other: write `number < Number(5u)`. Nor do
+///   `x += number`, a conversion to long or float, and `text = number` for an existing std::string: name the
+///   type, as in `text = std::string(number)`.
 class __attribute__((visibility("default"))) Number {
 public:
-    // What a number can be. Records name a kind by its code.
+    /// What a number can be. Records name a kind by its code.
     enum KindType : ZQ::Uint32 {
-        KIND_UNKNOWN = 0,   // no value
-        KIND_BOOL = 1,      // a flag
-        KIND_INT = 2,       // a signed 32-bit integer
-        KIND_UINT32 = 3,    // an unsigned 32-bit integer
-        KIND_UINT64 = 4,    // an unsigned 64-bit integer
-        KIND_REAL = 5,      // a 64-bit real, NaN and infinities included
-        KIND_NAN = 6,       // no value: "not a number"
-        KIND_INFINITY = 7,  // no value: positive infinity
-        KIND_VERSION = 8,   // a Version2
-        KIND_DATETIME = 9,  // seconds, milliseconds and scope
-        KIND_NODEREF = 10   // an sNodeRef
+        KIND_UNKNOWN = 0,   ///< no value
+        KIND_BOOL = 1,      ///< a flag
+        KIND_INT = 2,       ///< a signed 32-bit integer
+        KIND_UINT32 = 3,    ///< an unsigned 32-bit integer
+        KIND_UINT64 = 4,    ///< an unsigned 64-bit integer
+        KIND_REAL = 5,      ///< a 64-bit real, NaN and infinities included
+        KIND_NAN = 6,       ///< no value: "not a number"
+        KIND_INFINITY = 7,  ///< no value: positive infinity
+        KIND_VERSION = 8,   ///< a Version2
+        KIND_DATETIME = 9,  ///< seconds, milliseconds and scope
+        KIND_NODEREF = 10   ///< an sNodeRef
     };
 
-    // A number of the kind that the type of `value` names.
+    ///@{
+    /// A number of the kind that the type of `value` names.
     Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL) { store(static_cast<ZQ::Uint8>(value)); }
     Number(const int& value) noexcept : Number(Tag(), KIND_INT) { store(value); }
     Number(const unsigned int& value) noexcept : Number(Tag(), KIND_UINT32) { store(value); }
     Number(const unsigned long long& value) noexcept : Number(Tag(), KIND_UINT64) { store(value); }
-    // The kind is KIND_REAL for a NaN and for infinities too.
+    /// The kind is KIND_REAL for a NaN and for infinities too.
     Number(const double& value) noexcept : Number(Tag(), KIND_REAL) { store(value); }
     Number(const Version2& value) noexcept : Number(Tag(), KIND_VERSION) { store(value); }
     Number(const sNodeRef& value) noexcept : Number(Tag(), KIND_NODEREF) { nodeRef_ = value; }
+    ///@}
 
-    // A date-time of scope 3. Seconds since the epoch.
+    /// A date-time of scope 3. Seconds since the epoch.
     Number(long seconds, unsigned short milliseconds) noexcept : Number(Tag(), KIND_DATETIME)
     {
         storeDateTime(seconds, milliseconds, defaultScope);
     }
 
-    // A date-time; the scope is cut to 8 bits and the milliseconds to 16.
+    /// A date-time; the scope is cut to 8 bits and the milliseconds to 16.
     Number(const ZQ::DateTime& value);
 
-    // A number of the kind with this code, with the content that initKind gives. Codes of 11 and above are
-    // refused with std::invalid_argument: what is logged, with the code, and below it what the exception says;
-    // 2 and 10 are refused by initKind.
-    //
-    //     "Number: wrong kind of number: "
-    //       "Invalid kind of number"
+    /// A number of the kind with this code, with the content that initKind gives. Codes of 11 and above are
+    /// refused with std::invalid_argument: what is logged, with the code, and below it what the exception says;
+    /// 2 and 10 are refused by initKind.
+    ///
+    ///     "Number: wrong kind of number: "
+    ///       "Invalid kind of number"
     Number(const unsigned char& code);
 
-    // The same; every refusal is initKind's.
+    /// The same; every refusal is initKind's.
     Number(const KindType& kind) : Number(Tag(), kind)
     {
         if (kind != KIND_UNKNOWN)
             initKind(kind);
     }
 
-    // A pointer would silently become a flag, and an enumeration of one byte (such as Error::StatusType) a kind
-    // code. Write Number(static_cast<unsigned int>(value)).
+    ///@{
+    /// A pointer would silently become a flag, and an enumeration of one byte (such as Error::StatusType) a kind
+    /// code. Write Number(static_cast<unsigned int>(value)).
     template <class T>
     Number(T*) = delete;
     Number(std::nullptr_t) = delete;
     template <class T, std::enable_if_t<std::is_enum_v<T> && sizeof(T) == 1, int> = 0>
     Number(T) = delete;
+    ///@}
 
-    // The kind, under two names.
+    ///@{
+    /// The kind, under two names.
     KindType getKind() const noexcept { return kind_; }
     operator KindType() const noexcept { return kind_; }
+    ///@}
 
-    // Stores the kind and gives the value that kind's first content: 0, 0.0, version 0.0, or the current time
-    // in whole seconds with scope 3. For the kinds 0, 1, 6 and 7 the flag byte is cleared and the rest is kept.
-    // The kinds 2, 10, and 11 and above are refused with std::invalid_argument:
-    //
-    //     "initkind: invalid kind of number ", and the kind
-    //       "Invalid kind of number"
-    //
-    // The refused kind stays stored (deliberate), whatever the platform throws. A kind of 11 or more then
-    // behaves like KIND_UNKNOWN in conversions and comparisons, and its text is "invalid".
+    /// Stores the kind and gives the value that kind's first content: 0, 0.0, version 0.0, or the current time
+    /// in whole seconds with scope 3. For the kinds 0, 1, 6 and 7 the flag byte is cleared and the rest is kept.
+    /// The kinds 2, 10, and 11 and above are refused with std::invalid_argument:
+    ///
+    ///     "initkind: invalid kind of number ", and the kind
+    ///       "Invalid kind of number"
+    ///
+    /// The refused kind stays stored (deliberate), whatever the platform throws. A kind of 11 or more then
+    /// behaves like KIND_UNKNOWN in conversions and comparisons, and its text is "invalid".
     void initKind(const KindType& kind);
 
-    // Replaces the kind and keeps the bytes of the value as they lie in storage: a reinterpretation, no
-    // conversion. All kinds from 0 to 10 are taken. A flag byte above 1 made this way converts to true, 1 and
-    // 1.0, and prints "true". Codes of 11 and above are refused with std::invalid_argument, and nothing changes:
-    //
-    //     "setKind: invalid kind ", and the code
-    //       "Invalid kind"
+    /// Replaces the kind and keeps the bytes of the value as they lie in storage: a reinterpretation, no
+    /// conversion. All kinds from 0 to 10 are taken. A flag byte above 1 made this way converts to true, 1 and
+    /// 1.0, and prints "true". Codes of 11 and above are refused with std::invalid_argument, and nothing changes:
+    ///
+    ///     "setKind: invalid kind ", and the code
+    ///       "Invalid kind"
     void setKind(const unsigned char& code);
 
-    // The conversions. Each takes the kinds in its row and refuses the others with std::out_of_range. A real
-    // is cut toward zero and refused where the target cannot hold it; nothing is saturated.
-    //
-    //   to                  takes
-    //   bool                flag; uint32, uint64 and real, whether not 0 (NaN is true)
-    //   int                 flag, int; and what unsigned int takes, with the 32 bits taken as signed; its
-    //                       refusals are those of unsigned int
-    //   unsigned int        flag, uint32; uint64 below 2^32; reals above -1 and below 2^32
-    //   unsigned long long  flag, uint32, uint64; reals above -1 and below 2^64
-    //   double              flag, uint32, uint64, real, NaN, infinity; a version as major.minor (2.15)
-    //   Version2            version; uint32 and uint64 up to 255, as the major number
-    //   ZQ::DateTime        date-time of scope 1 to 3
-    //   sNodeRef            node reference
-    //
-    // A real NaN passes both range checks: it gives 0 for the 32-bit integers and 2^63 for the 64-bit one.
-    //
-    // The refusals: what is logged, and below it what the exception says.
-    //
-    //   another kind, which is logged behind the text
-    //     "bool: Can't return current value as a Boolean, kind="
-    //       "Can't return current value as a Boolean"
-    //     "Uint32: Can't return current value as a 32-bit integer, kind="
-    //       "Can't return current value as a 32-bit integer"
-    //     "Uint64: Can't return current value as a 64-bit integer, kind="
-    //       "Can't return current value as a 64-bit integer"
-    //     "Real: Can't return current value as a Real, kind="
-    //       "Can't return current value as a Real"
-    //     "Version: Can't return current value as a Version, kind="
-    //       "Can't return current value as a Version"
-    //     "DateTime: Can't return current value as a DateTime, kind="
-    //       "Can't return current value as a DateTime"
-    //     "NodeRef: Can't return current value as a pair, kind="
-    //       "Can't return current value as pair"
-    //   too large, or below 0; the value is logged behind the text
-    //     "Uint32: number out of range: "
-    //       "The number is too large to convert to a 32-bit integer"
-    //       "A negative number cannot convert to an unsigned 32-bit integer"
-    //     "Uint64: number out of range: "
-    //       "The number is too large to convert to a 64-bit integer"
-    //       "A negative number cannot convert to an unsigned 64-bit integer"
-    //     "Version: Number too large for version: "
-    //       "The number is too large to convert to a version"
+    ///@{
+    /// The conversions. Each takes the kinds in its row and refuses the others with std::out_of_range. A real
+    /// is cut toward zero and refused where the target cannot hold it; nothing is saturated.
+    ///
+    ///     to                  takes
+    ///     bool                flag; uint32, uint64 and real, whether not 0 (NaN is true)
+    ///     int                 flag, int; and what unsigned int takes, with the 32 bits taken as signed; its
+    ///                         refusals are those of unsigned int
+    ///     unsigned int        flag, uint32; uint64 below 2^32; reals above -1 and below 2^32
+    ///     unsigned long long  flag, uint32, uint64; reals above -1 and below 2^64
+    ///     double              flag, uint32, uint64, real, NaN, infinity; a version as major.minor (2.15)
+    ///     Version2            version; uint32 and uint64 up to 255, as the major number
+    ///     ZQ::DateTime        date-time of scope 1 to 3
+    ///     sNodeRef            node reference
+    ///
+    /// A real NaN passes both range checks: it gives 0 for the 32-bit integers and 2^63 for the 64-bit one.
+    ///
+    /// The refusals: what is logged, and below it what the exception says.
+    ///
+    ///     another kind, which is logged behind the text
+    ///       "bool: Can't return current value as a Boolean, kind="
+    ///         "Can't return current value as a Boolean"
+    ///       "Uint32: Can't return current value as a 32-bit integer, kind="
+    ///         "Can't return current value as a 32-bit integer"
+    ///       "Uint64: Can't return current value as a 64-bit integer, kind="
+    ///         "Can't return current value as a 64-bit integer"
+    ///       "Real: Can't return current value as a Real, kind="
+    ///         "Can't return current value as a Real"
+    ///       "Version: Can't return current value as a Version, kind="
+    ///         "Can't return current value as a Version"
+    ///       "DateTime: Can't return current value as a DateTime, kind="
+    ///         "Can't return current value as a DateTime"
+    ///       "NodeRef: Can't return current value as a pair, kind="
+    ///         "Can't return current value as pair"
+    ///     too large, or below 0; the value is logged behind the text
+    ///       "Uint32: number out of range: "
+    ///         "The number is too large to convert to a 32-bit integer"
+    ///         "A negative number cannot convert to an unsigned 32-bit integer"
+    ///       "Uint64: number out of range: "
+    ///         "The number is too large to convert to a 64-bit integer"
+    ///         "A negative number cannot convert to an unsigned 64-bit integer"
+    ///       "Version: Number too large for version: "
+    ///         "The number is too large to convert to a version"
     operator bool() const { return kind_ == KIND_BOOL ? load<ZQ::Uint8>() != 0 : toBool(); }
     operator int() const
     {
@@ -209,14 +216,15 @@ public:
     operator Version2() const { return kind_ == KIND_VERSION ? load<Version2>() : toVersion(); }
     operator ZQ::DateTime() const;
     operator sNodeRef() const { return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef(); }
+    ///@}
 
-    // The text, as a fresh std::ostringstream writes it under the global locale: "unknown", "true", decimal
-    // digits, a real with six significant digits, "not a number", "infinity", "2.15", a date-time,
-    // "CPU:7" for a node reference (a sensor type above 74 takes the name of entry 74), "invalid".
-    //
-    // Milliseconds that are a multiple of 10 do not appear in the text of a date-time. Others print as
-    // ".Conversion failed remainder>0", after the records "string: conversion failed, remainder not zero,
-    // remainder=" and the last digit (deliberate). Nothing is refused.
+    /// The text, as a fresh std::ostringstream writes it under the global locale: "unknown", "true", decimal
+    /// digits, a real with six significant digits, "not a number", "infinity", "2.15", a date-time,
+    /// "CPU:7" for a node reference (a sensor type above 74 takes the name of entry 74), "invalid".
+    ///
+    /// Milliseconds that are a multiple of 10 do not appear in the text of a date-time. Others print as
+    /// ".Conversion failed remainder>0", after the records "string: conversion failed, remainder not zero,
+    /// remainder=" and the last digit (deliberate). Nothing is refused.
     operator std::string() const;
 
 private:
@@ -295,9 +303,10 @@ static_assert(std::is_trivially_copyable_v<Number>);
 static_assert(std::is_trivially_copyable_v<Version2>);
 static_assert(std::is_trivially_copyable_v<sNodeRef>);
 
-// Equality never throws. Numbers of different kinds are unequal. Signed numbers are all equal, and so are
-// node references, and the kinds without a value. Date-times are equal whatever their scope; a real NaN
-// equals nothing.
+///@{
+/// Equality never throws. Numbers of different kinds are unequal. Signed numbers are all equal, and so are
+/// node references, and the kinds without a value. Date-times are equal whatever their scope; a real NaN
+/// equals nothing.
 [[gnu::visibility("default")]] inline bool operator==(const Number& a, const Number& b)
 {
     if (Number::both(Number::KIND_UINT32, a, b))
@@ -307,20 +316,22 @@ static_assert(std::is_trivially_copyable_v<sNodeRef>);
     return Number::equal(a, b);
 }
 bool operator!=(const Number& a, const Number& b);
+///@}
 
-// Less-than and greater-than, within one kind. Kinds without a value, signed numbers and node references are
-// neither less nor greater. KIND_INFINITY on the left is never less, and greater than every other kind but
-// KIND_NAN; on the right of another kind it is refused.
-//
-// The refusals, with std::invalid_argument: what is logged (for > it begins with ">"), and below it what the
-// exception says.
-//
-//   one of the kinds is KIND_NAN
-//     "<: invalid operation when kind is NaN"
-//       "Invalid operation when kind is NaN"
-//   the kinds differ
-//     "<: cannot compare two different kinds of number, kind1=3, kind2=4"
-//       "Cannot compare two different kinds of number"
+///@{
+/// Less-than and greater-than, within one kind. Kinds without a value, signed numbers and node references are
+/// neither less nor greater. KIND_INFINITY on the left is never less, and greater than every other kind but
+/// KIND_NAN; on the right of another kind it is refused.
+///
+/// The refusals, with std::invalid_argument: what is logged (for > it begins with ">"), and below it what the
+/// exception says.
+///
+///     one of the kinds is KIND_NAN
+///       "<: invalid operation when kind is NaN"
+///         "Invalid operation when kind is NaN"
+///     the kinds differ
+///       "<: cannot compare two different kinds of number, kind1=3, kind2=4"
+///         "Cannot compare two different kinds of number"
 [[gnu::visibility("default")]] inline bool operator<(const Number& a, const Number& b)
 {
     if (Number::both(Number::KIND_UINT32, a, b))
@@ -337,13 +348,16 @@ bool operator!=(const Number& a, const Number& b);
         return a.load<ZQ::Real64>() > b.load<ZQ::Real64>();
     return Number::greater(a, b);
 }
+///@}
 
-// a == b, or else a < b (a > b): equal numbers are never refused.
+///@{
+/// a == b, or else a < b (a > b): equal numbers are never refused.
 bool operator<=(const Number& a, const Number& b);
 bool operator>=(const Number& a, const Number& b);
+///@}
 
-// Inserts std::string(number) as one text: width and fill apply to the whole of it. Where the text throws,
-// nothing is inserted.
+/// Inserts std::string(number) as one text: width and fill apply to the whole of it. Where the text throws,
+/// nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const Number& number);
 
 }  // namespace IC

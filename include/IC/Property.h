@@ -15,49 +15,52 @@
 
 namespace IC {
 
-// What a value holds where it holds more than one.
+///@{
+/// What a value holds where it holds more than one.
 using Buffer = std::vector<unsigned char>;
 using NumberArray = std::vector<Number>;
 using StringArray = std::vector<std::string>;
+///@}
 
-// The value of a node's property: a text, a number, an enumerated value, bytes, an array of numbers or of
-// texts, or nothing yet; and a mark that says whether Node::setProperty may replace it.
-//
-// A value type: a copy is independent of its source. One object belongs to one thread at a time. Every
-// refusal but one (to EnumValue) writes a log record and a trace record (category "Vexilon.IC.Property",
-// level 6000) and then throws; what the platform throws while it writes them comes instead. Refusals apart,
-// what makes, copies or assigns a value, a container or a text, and a change of kind, may throw
-// std::bad_alloc; moving, swapping, comparing and the other conversions need no memory. A date-time's text
-// throws as in Number. Whatever is thrown, the value is as it was, but for a refused setKind.
-//
-//   IC::PropertyValue model("DCS8000Z", true); // a read-only text
-//   std::string text = model;                  // DCS8000Z
-//   IC::PropertyValue speed(IC::Number(3600u));
-//   unsigned int rpm = speed;                  // 3600
-//   IC::Buffer bytes = IC::PropertyValue(IC::Buffer {0x0a, 0xff});
-//
-// Rules that look odd and are meant:
-// - PropertyValue(5) is an empty array of numbers: an integer, as a byte, is a kind code. Write
-//   PropertyValue(IC::Number(5)) for the number.
-// - Write `IC::StringArray texts = value;`, never `{value}`: braces make an array of one element.
-//   To an existing std::string assign `std::string(value)`; `text = value` does not compile.
-// - `value == Number(5u)` does not compile, since each side converts to the other: write
-//   `value == PropertyValue(Number(5u))`. A text compares as it stands: `value == "AFB0812"`.
-// - No operation here looks at the read-only mark; assignment replaces it.
+/// The value of a node's property: a text, a number, an enumerated value, bytes, an array of numbers or of
+/// texts, or nothing yet; and a mark that says whether Node::setProperty may replace it.
+///
+/// A value type: a copy is independent of its source. One object belongs to one thread at a time. Every
+/// refusal but one (to EnumValue) writes a log record and a trace record (category "Vexilon.IC.Property",
+/// level 6000) and then throws; what the platform throws while it writes them comes instead. Refusals apart,
+/// what makes, copies or assigns a value, a container or a text, and a change of kind, may throw
+/// std::bad_alloc; moving, swapping, comparing and the other conversions need no memory. A date-time's text
+/// throws as in Number. Whatever is thrown, the value is as it was, but for a refused setKind.
+///
+///     IC::PropertyValue model("DCS8000Z", true); // a read-only text
+///     std::string text = model;                  // DCS8000Z
+///     IC::PropertyValue speed(IC::Number(3600u));
+///     unsigned int rpm = speed;                  // 3600
+///     IC::Buffer bytes = IC::PropertyValue(IC::Buffer {0x0a, 0xff});
+///
+/// Rules that look odd and are meant:
+/// - PropertyValue(5) is an empty array of numbers: an integer, as a byte, is a kind code. Write
+///   PropertyValue(IC::Number(5)) for the number.
+/// - Write `IC::StringArray texts = value;`, never `{value}`: braces make an array of one element.
+///   To an existing std::string assign `std::string(value)`; `text = value` does not compile.
+/// - `value == Number(5u)` does not compile, since each side converts to the other: write
+///   `value == PropertyValue(Number(5u))`. A text compares as it stands: `value == "AFB0812"`.
+/// - No operation here looks at the read-only mark; assignment replaces it.
 class __attribute__((visibility("default"))) PropertyValue {
 public:
-    // What a value can hold. Records name a kind by its code.
+    /// What a value can hold. Records name a kind by its code.
     enum KindType : ZQ::Uint32 {
-        KIND_UNKNOWN = 0,      // nothing
-        KIND_NUMBER = 1,       // a Number
-        KIND_STRING = 2,       // a std::string
-        KIND_BUFFER = 3,       // a Buffer
-        KIND_ENUMVALUE = 4,    // an EnumValue
-        KIND_NUMBERARRAY = 5,  // a NumberArray
-        KIND_STRINGARRAY = 6   // a StringArray
+        KIND_UNKNOWN = 0,      ///< nothing
+        KIND_NUMBER = 1,       ///< a Number
+        KIND_STRING = 2,       ///< a std::string
+        KIND_BUFFER = 3,       ///< a Buffer
+        KIND_ENUMVALUE = 4,    ///< an EnumValue
+        KIND_NUMBERARRAY = 5,  ///< a NumberArray
+        KIND_STRINGARRAY = 6   ///< a StringArray
     };
 
-    // A value of the kind that the type of `value` names; `readOnly` is its mark.
+    ///@{
+    /// A value of the kind that the type of `value` names; `readOnly` is its mark.
     PropertyValue(const std::string& value, const bool& readOnly = false)
         : PropertyValue(new std::string(value), KIND_STRING, readOnly)
     {
@@ -66,7 +69,7 @@ public:
         : PropertyValue(new std::string(std::move(value)), KIND_STRING, readOnly)
     {
     }
-    // Up to the terminating NUL. Throws std::logic_error for a null pointer.
+    /// Up to the terminating NUL. Throws std::logic_error for a null pointer.
     PropertyValue(const char* value, const bool& readOnly = false);
     PropertyValue(const Number& value, const bool& readOnly = false)
         : PropertyValue(new Number(value), KIND_NUMBER, readOnly)
@@ -100,16 +103,17 @@ public:
         : PropertyValue(new StringArray(std::move(value)), KIND_STRINGARRAY, readOnly)
     {
     }
+    ///@}
 
-    // The first value of the kind with this code: a Number of kind 0, an EnumValue of 0, or an empty text,
-    // buffer or array. Codes of 7 and above are refused with PropertyValueInvalidKind: what is logged, with the
-    // code, and below it what the exception says.
-    //
-    //     "PropertyValue:initKind: invalid kind of property: "
-    //       "Invalid kind of property"
+    /// The first value of the kind with this code: a Number of kind 0, an EnumValue of 0, or an empty text,
+    /// buffer or array. Codes of 7 and above are refused with PropertyValueInvalidKind: what is logged, with the
+    /// code, and below it what the exception says.
+    ///
+    ///     "PropertyValue:initKind: invalid kind of property: "
+    ///       "Invalid kind of property"
     PropertyValue(const unsigned char& kind, const bool& readOnly = false);
 
-    // The same. The code is cut to its low 8 bits first, so 257 is KIND_NUMBER (deliberate).
+    /// The same. The code is cut to its low 8 bits first, so 257 is KIND_NUMBER (deliberate).
     PropertyValue(const KindType& kind, const bool& readOnly = false);
 
 private:
@@ -119,12 +123,13 @@ private:
                            std::conjunction<std::is_enum<T>, std::negation<std::is_same<T, KindType>>>>;
 
 public:
-    // Flags, reals and other enumerations would silently become a kind code. Write Number(value) or
-    // EnumValue(value).
+    /// Flags, reals and other enumerations would silently become a kind code. Write Number(value) or
+    /// EnumValue(value).
     template <class T, std::enable_if_t<notAKind<T>, int> = 0>
     PropertyValue(T, const bool& = false) = delete;
 
-    // A copy has the source's mark; assignment replaces the mark by the source's, whatever it was.
+    ///@{
+    /// A copy has the source's mark; assignment replaces the mark by the source's, whatever it was.
     PropertyValue(const PropertyValue& source) : kind_(source.kind_), readOnly_(source.readOnly_)
     {
         if (holds(KIND_NUMBER))
@@ -144,8 +149,10 @@ public:
         readOnly_ = source.readOnly_;
         return *this;
     }
+    ///@}
 
-    // Moves allocate nothing. The source is left with KIND_UNKNOWN and its mark.
+    ///@{
+    /// Moves allocate nothing. The source is left with KIND_UNKNOWN and its mark.
     PropertyValue(PropertyValue&& source) noexcept
         : value_(std::exchange(source.value_, nullptr)),
           kind_(std::exchange(source.kind_, KIND_UNKNOWN)),
@@ -169,60 +176,64 @@ public:
         std::swap(readOnly_, other.readOnly_);
     }
     friend void swap(PropertyValue& a, PropertyValue& b) noexcept { a.swap(b); }
+    ///@}
 
     ~PropertyValue() { release(); }
 
-    // The kind, under two names.
+    ///@{
+    /// The kind, under two names.
     KindType getKind() const noexcept { return static_cast<KindType>(kind_ & ~without); }
     operator KindType() const noexcept { return getKind(); }
+    ///@}
 
-    // Whether Node::setProperty refuses to replace it.
+    /// Whether Node::setProperty refuses to replace it.
     bool readOnly() const noexcept { return readOnly_; }
 
-    // Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
-    // keeps the value. Codes of 7 and above are refused as by the constructor from a kind.
-    //
-    // A refused code still costs the old value (deliberate), whatever the platform throws meanwhile: the kind
-    // stays, without an object. Give such a value another kind, or assign to it. Until then conversions to a
-    // native type refuse it as they refuse another kind, its text is "invalid", and it is neither less nor
-    // greater than any value of its kind. A kind that is not refused leaves all as it was where it finds no
-    // memory.
+    /// Changes the kind; the value becomes the first value of the new kind, and the mark stays. The same kind
+    /// keeps the value. Codes of 7 and above are refused as by the constructor from a kind.
+    ///
+    /// A refused code still costs the old value (deliberate), whatever the platform throws meanwhile: the kind
+    /// stays, without an object. Give such a value another kind, or assign to it. Until then conversions to a
+    /// native type refuse it as they refuse another kind, its text is "invalid", and it is neither less nor
+    /// greater than any value of its kind. A kind that is not refused leaves all as it was where it finds no
+    /// memory.
     void setKind(const unsigned char& kind);
 
-    // The conversions. A number converts as Number does, refusals included; an enumerated value answers as an
-    // unsigned 32-bit number. Containers are copied. Other kinds are refused with PropertyValueInvalidKind: what
-    // is logged, with the kind, and below it what the exception says.
-    //
-    //   to double, from a number or an enumerated value
-    //     "PropertyValue:Real64: can't return current value as a Real64, kind="
-    //       "Can't return current value as a Number"
-    //   to unsigned long long, from a number or an enumerated value
-    //     "PropertyValue:Uint64: can't return current value as a Uint64, kind="
-    //       "Can't return current value as a Number"
-    //   to unsigned int, from a number or an enumerated value
-    //     "PropertyValue::Uint32: can't return current value as a Uint32, kind="
-    //       "Can't return current value as a Number"
-    //   to bool, from a number
-    //     "PropertyValue::bool: can't return current value as a bool, kind="
-    //       "Can't return current value as a Number"
-    //   to Number, from a number
-    //     "PropertyValue:Number: can't return current value as a Number, kind="
-    //       "Can't return current value as a Number"
-    //   to Version2, from a number
-    //     "PropertyValue:Version2: can't return current value as a Version2, kind="
-    //       "Can't return current value as a Number"
-    //   to EnumValue, from an enumerated value
-    //     nothing is logged (deliberate)
-    //       "Can't return current value as a EnumValue"
-    //   to Buffer, from bytes
-    //     "PropertyValue:Buffer: can't return current value as a Buffer, kind="
-    //       "Can't return current value as a Buffer"
-    //   to NumberArray, from numbers
-    //     "PropertyValue:NumberArray: can't return current value as a NumberArray, kind="
-    //       "Can't return current value as a NumberArray"
-    //   to StringArray, from texts
-    //     "PropertyValue:StringArray: can't return current value as a StringArray, kind="
-    //       "Can't return current value as a StringArray"
+    ///@{
+    /// The conversions. A number converts as Number does, refusals included; an enumerated value answers as an
+    /// unsigned 32-bit number. Containers are copied. Other kinds are refused with PropertyValueInvalidKind: what
+    /// is logged, with the kind, and below it what the exception says.
+    ///
+    ///     to double, from a number or an enumerated value
+    ///       "PropertyValue:Real64: can't return current value as a Real64, kind="
+    ///         "Can't return current value as a Number"
+    ///     to unsigned long long, from a number or an enumerated value
+    ///       "PropertyValue:Uint64: can't return current value as a Uint64, kind="
+    ///         "Can't return current value as a Number"
+    ///     to unsigned int, from a number or an enumerated value
+    ///       "PropertyValue::Uint32: can't return current value as a Uint32, kind="
+    ///         "Can't return current value as a Number"
+    ///     to bool, from a number
+    ///       "PropertyValue::bool: can't return current value as a bool, kind="
+    ///         "Can't return current value as a Number"
+    ///     to Number, from a number
+    ///       "PropertyValue:Number: can't return current value as a Number, kind="
+    ///         "Can't return current value as a Number"
+    ///     to Version2, from a number
+    ///       "PropertyValue:Version2: can't return current value as a Version2, kind="
+    ///         "Can't return current value as a Number"
+    ///     to EnumValue, from an enumerated value
+    ///       nothing is logged (deliberate)
+    ///         "Can't return current value as a EnumValue"
+    ///     to Buffer, from bytes
+    ///       "PropertyValue:Buffer: can't return current value as a Buffer, kind="
+    ///         "Can't return current value as a Buffer"
+    ///     to NumberArray, from numbers
+    ///       "PropertyValue:NumberArray: can't return current value as a NumberArray, kind="
+    ///         "Can't return current value as a NumberArray"
+    ///     to StringArray, from texts
+    ///       "PropertyValue:StringArray: can't return current value as a StringArray, kind="
+    ///         "Can't return current value as a StringArray"
     operator double() const { return holds(KIND_NUMBER) ? object<Number>().operator double() : toReal(); }
     operator unsigned long long() const
     {
@@ -248,19 +259,20 @@ public:
     {
         return holds(KIND_STRINGARRAY) ? object<StringArray>() : refuseStringArray();
     }
+    ///@}
 
-    // `int x = value;` would silently be a flag. Write `int x = value.operator IC::Number();`.
+    /// `int x = value;` would silently be a flag. Write `int x = value.operator IC::Number();`.
     operator int() const = delete;
 
-    // The text, as a fresh std::ostringstream writes it under the global locale; never refused.
-    //
-    //   nothing      unknown
-    //   text         the text itself
-    //   number       as Number
-    //   enumerated   as EnumValue
-    //   bytes        two hexadecimal digits a byte, and a blank after every fourth byte, also the last
-    //   numbers      {1, 2}
-    //   texts        {"a\"b", ""}: double quotes inside get a backslash, nothing else is escaped
+    /// The text, as a fresh std::ostringstream writes it under the global locale; never refused.
+    ///
+    ///     nothing      unknown
+    ///     text         the text itself
+    ///     number       as Number
+    ///     enumerated   as EnumValue
+    ///     bytes        two hexadecimal digits a byte, and a blank after every fourth byte, also the last
+    ///     numbers      {1, 2}
+    ///     texts        {"a\"b", ""}: double quotes inside get a backslash, nothing else is escaped
     operator std::string() const { return holds(KIND_STRING) ? object<std::string>() : toText(); }
 
 private:
@@ -336,8 +348,9 @@ private:
     [[maybe_unused]] ZQ::Uint32 reserved_ = 0;
 };
 
-// Equality never throws. Values of different kinds are unequal; the read-only mark is not compared. Numbers
-// and enumerated values compare as Number and EnumValue do, everything else by its bytes or elements.
+///@{
+/// Equality never throws. Values of different kinds are unequal; the read-only mark is not compared. Numbers
+/// and enumerated values compare as Number and EnumValue do, everything else by its bytes or elements.
 [[gnu::visibility("default")]] inline bool operator==(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
@@ -350,14 +363,16 @@ private:
     return Value::equal(a, b);
 }
 bool operator!=(const PropertyValue& a, const PropertyValue& b);
+///@}
 
-// Within one kind: numbers and enumerated values as Number and EnumValue do, refusals included; the others
-// lexicographically, bytes unsigned, numbers in an array by their own <, refusals included. Nothing is
-// neither less nor greater than nothing. Different kinds are refused with PropertyValueInvalidKind: what is
-// logged (for > it begins with ">"), and below it what the exception says.
-//
-//     "<: cannot compare two different kinds of properties, kind1=2, kind2=1"
-//       "Cannot compare two different kinds of properties"
+///@{
+/// Within one kind: numbers and enumerated values as Number and EnumValue do, refusals included; the others
+/// lexicographically, bytes unsigned, numbers in an array by their own <, refusals included. Nothing is
+/// neither less nor greater than nothing. Different kinds are refused with PropertyValueInvalidKind: what is
+/// logged (for > it begins with ">"), and below it what the exception says.
+///
+///     "<: cannot compare two different kinds of properties, kind1=2, kind2=1"
+///       "Cannot compare two different kinds of properties"
 [[gnu::visibility("default")]] inline bool operator<(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
@@ -376,23 +391,26 @@ bool operator!=(const PropertyValue& a, const PropertyValue& b);
         return a.object<std::string>() > b.object<std::string>();
     return Value::greater(a, b);
 }
+///@}
 
-// a == b, or else a < b (a > b): equal values are never refused.
+///@{
+/// a == b, or else a < b (a > b): equal values are never refused.
 bool operator<=(const PropertyValue& a, const PropertyValue& b);
 bool operator>=(const PropertyValue& a, const PropertyValue& b);
+///@}
 
-// The byte as two lower-case hexadecimal digits.
+/// The byte as two lower-case hexadecimal digits.
 std::string pB(unsigned char byte);
 
-// Inserts std::string(value) as one text: width and fill apply to the whole of it. Where the text throws,
-// nothing is inserted.
+/// Inserts std::string(value) as one text: width and fill apply to the whole of it. Where the text throws,
+/// nothing is inserted.
 std::ostream& operator<<(std::ostream& out, const PropertyValue& value);
 
-// "7 = " and the value, piece by piece; the number follows the stream's own settings. What was inserted
-// before a piece throws stays, here and for a map.
+/// "7 = " and the value, piece by piece; the number follows the stream's own settings. What was inserted
+/// before a piece throws stays, here and for a map.
 std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, PropertyValue>& property);
 
-// "[1 = abc], [7 = {1, 2}]" in the order of the numbers, piece by piece. An empty map writes nothing.
+/// "[1 = abc], [7 = {1, 2}]" in the order of the numbers, piece by piece. An empty map writes nothing.
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties);
 
 }  // namespace IC
