@@ -92,7 +92,9 @@ TEST(HostileContent, ComesBackFromAnArrayByteByByte)
 TEST(HostileContent, ComesBackFromBytesAsTheyAre)
 {
     forEachText([](const std::string& text) {
-        const IC::Buffer bytes(text.begin(), text.end());
+        IC::Buffer bytes;
+        for (const char byte : text)
+            bytes.push_back(static_cast<unsigned char>(byte));
         const IC::Buffer back = PropertyValue(bytes);
         EXPECT_EQ(back, bytes);
     });

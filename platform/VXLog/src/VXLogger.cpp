@@ -1,5 +1,7 @@
 #include "VXLog/VXLogger.h"
 
+#include <pthread.h>
+
 #include <cstdio>
 #include <cstdlib>
 #include <memory>
@@ -24,8 +26,13 @@ void writeLine(const Record& record)
     line += ' ' + std::to_string(record.level) + (trace ? " trace " : " ");
     line += printable(record.logger) + ' ' + printable(record.file) + ':' + std::to_string(record.line) + ' '
         + printable(record.function) + ": " + printable(record.message) + '\n';
+    // A thread that is cancelled writes its line first: clang takes fwrite for a function that nothing leaves by
+    // unwinding, so being cancelled in it would end the program.
+    int before = 0;
+    pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, &before);
     // In one call, so that the lines of several threads do not mix. There is nobody to tell of a failure.
     static_cast<void>(std::fwrite(line.data(), 1, line.size(), stderr));
+    pthread_setcancelstate(before, nullptr);
 }
 
 // The sink of the program. It is shared with the calls under way, which go on when it is replaced.
