@@ -176,6 +176,15 @@ TEST(Alert, KeepsWhatItWasGiven)
     EXPECT_EQ(alert.getMessage(), "Fan failed");
 }
 
+TEST(Alert, KeepsEveryByteOfMessageAndPaths)
+{
+    const std::string message("\0a\0", 3);
+    const Paths paths = {std::string("\0b", 2), std::string("b\0", 2)};
+    const Alert alert = alertOf(0, 0, 0, message, paths);
+    EXPECT_EQ(alert.getMessage(), message);
+    EXPECT_EQ(alert.getNodePaths(), paths);
+}
+
 TEST(Alert, LeavesTheCallersTimeStampAlone)
 {
     ZQ::DateTime time = someTime();

@@ -232,6 +232,16 @@ TEST(ErrorText, HasTheNumberAndTheMessageOnlyWhereThereIsOne)
     EXPECT_TRUE(observe::records().empty());
 }
 
+TEST(ErrorText, IsWholeWhateverItsLength)
+{
+    for (std::size_t length = 0; length <= 400; ++length) {
+        const std::string message(length, 'm');
+        ASSERT_EQ(Error(5, Number(17u), message).operator std::string(),
+                  length == 0 ? "5 - 17" : "5 - 17 - " + message)
+            << length;
+    }
+}
+
 TEST(ErrorText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
 {
     const Error error(16, Number(1234567u), "1234567");

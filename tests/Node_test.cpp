@@ -869,6 +869,20 @@ TEST(NodeText, IsWholeOrNotAtAllWhenMemoryRunsOut)
     allocation::expectTextWholeOrNotAtAll(node, "Node 2f612f6c6f6e6765722f70617468 : 20, status = 1234567");
 }
 
+TEST(NodeText, IsMadeWithoutTheLock)
+{
+    const Probe node(20, "a path");
+    makeRoomForLockCalls(node);
+    long atLastUnlock = 0;
+    observe::onLock([&](bool lock) {
+        if (!lock)
+            atLastUnlock = allocation::madeSoFar;
+    });
+    const std::string text = node.operator std::string();
+    // What needs memory is the text itself, when it is complete.
+    EXPECT_GT(allocation::madeSoFar, atLastUnlock);
+}
+
 TEST(NodeStream, InsertsTheNodeAsOneText)
 {
     std::ostringstream out;
