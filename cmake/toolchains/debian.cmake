@@ -15,4 +15,5 @@ set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
 
 # What is left out for these machines: examples, and tests by the names that CTest lists.
 set(IC_LEFT_OUT
-    inventory)  # the libraries that it reads this machine with, and umockdev, are installed for this machine alone
+    inventory     # the libraries that it reads this machine with, and umockdev, are installed for this machine alone
+    link_orders)  # links and starts programs by itself; an order of objects is the same for the linker everywhere

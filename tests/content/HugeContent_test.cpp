@@ -23,7 +23,7 @@ constexpr std::size_t million = 1000000;
 std::size_t manyBytes()
 {
     const char* const wanted = std::getenv("IC_TEST_BYTES");
-    return wanted != nullptr ? std::strtoull(wanted, nullptr, 10) : std::size_t(64) << 20;
+    return wanted != nullptr ? std::strtoul(wanted, nullptr, 10) : std::size_t(64) << 20;
 }
 
 // The text of an element, too long for a string's own buffer.

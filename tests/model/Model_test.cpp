@@ -307,7 +307,7 @@ TEST(ModelOfNumber, MakesOrRefusesEveryKindCode)
 
 TEST(ModelOfNumber, MakesTheKindOfDateTimesFromTheCurrentTime)
 {
-    const long before = std::time(nullptr);
+    const std::time_t before = std::time(nullptr);
     const IC::Number number(IC::Number::KIND_DATETIME);
     const auto seconds = static_cast<long>(number.operator ZQ::DateTime());
     EXPECT_LE(before, seconds);

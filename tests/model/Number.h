@@ -332,11 +332,10 @@ inline Outcome<double> toReal(const Number& number)
     case VERSION: {
         const double major = number.read<unsigned char>(0);
         const double minor = number.read<unsigned char>(1);
-        if (minor <= 9.0)
-            return returned(major + minor / 10.0);
-        if (minor <= 99.0)
-            return returned(major + minor / 100.0);
-        return returned(major + minor / 1000.0);
+        // Each step through memory, since some processors calculate in more digits than a double has.
+        const volatile double decimals = minor / (minor <= 9.0 ? 10.0 : minor <= 99.0 ? 100.0 : 1000.0);
+        const volatile double sum = major + decimals;
+        return returned(static_cast<double>(sum));
     }
     default:
         return refusedKind<double>(number, "operator ZQ::Real64", "Real", "Real");
