@@ -85,7 +85,8 @@ TEST(HostileContent, ComesBackFromAnArrayByteByByte)
         const PropertyValue value(IC::StringArray {text, "", text});
         const IC::StringArray texts = value;
         EXPECT_EQ(texts, (IC::StringArray {text, "", text}));
-        EXPECT_EQ(std::string(value), "{" + quoted(text) + ", \"\", " + quoted(text) + "}");
+        EXPECT_EQ(std::string(value),
+                  std::string("{").append(quoted(text)).append(", \"\", ").append(quoted(text)).append("}"));
     });
 }
 

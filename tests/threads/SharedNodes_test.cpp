@@ -60,8 +60,8 @@ class Provider : public Node {
 public:
     Provider() : Node(SENSOR_FAN)
     {
-        path = "ab";
-        parent = "a";
+        path = std::string("ab");
+        parent = std::string("a");
         description = "a description that needs memory of its own";
         properties.insert({MIXED, mixedValues().front()});
         properties.insert({COUNT, PropertyValue(Number(0u))});
