@@ -871,9 +871,9 @@ TEST(NodeText, IsWholeOrNotAtAllWhenMemoryRunsOut)
 
 TEST(NodeText, IsMadeWithoutTheLock)
 {
+    long atLastUnlock = 0;  // written until the node is gone
     const Probe node(20, "a path");
     makeRoomForLockCalls(node);
-    long atLastUnlock = 0;
     observe::onLock([&](bool lock) {
         if (!lock)
             atLastUnlock = allocation::madeSoFar;
