@@ -21,6 +21,7 @@
 #include "AllocationFailure.h"
 #include "IC/Number.h"
 #include "Refusal.h"
+#include "SensorNames.h"
 #include "ZQ/DateTime.h"
 
 namespace {
@@ -1819,82 +1820,7 @@ TEST(SensorNames, AreReadyBeforeTheProgramsOwnObjects)
 
 TEST(SensorNames, AreTheseSeventyFive)
 {
-    const char* const names[] = {"Unknown",
-                                 "Chassis",
-                                 "BIOS",
-                                 "Firmware",
-                                 "CPU",
-                                 "USB Controller",
-                                 "USB Port",
-                                 "Serial Port",
-                                 "Parallel Port",
-                                 "Video",
-                                 "Floppy Drive",
-                                 "Hard Drive",
-                                 "Network Port",
-                                 "BMC",
-                                 "Tolk",
-                                 "SMBIOS",
-                                 "VPD",
-                                 "OS",
-                                 "RAM",
-                                 "DIMM",
-                                 "Fan",
-                                 "Voltage Sensor",
-                                 "Temperature Sensor",
-                                 "Intrusion",
-                                 "PFA",
-                                 "Power Supply",
-                                 "Blue Light",
-                                 "Front Panel",
-                                 "Back Panel",
-                                 "Network IP Configuration",
-                                 "System",
-                                 "Cache",
-                                 "Memory Array",
-                                 "Memory Device",
-                                 "IPMI",
-                                 "Log",
-                                 "Glimtrace",
-                                 "Service Processor",
-                                 "OsHw",
-                                 "OsSw",
-                                 "Computer",
-                                 "Planar",
-                                 "CPU Core",
-                                 "Application",
-                                 "Driver",
-                                 "Partition",
-                                 "User",
-                                 "LogEntry",
-                                 "PFASensor",
-                                 "Network Controller",
-                                 "Disk Controller",
-                                 "Group",
-                                 "Pellion Alert Config",
-                                 "Diagnostics",
-                                 "SMBIOS Data",
-                                 "SMBIOS Table",
-                                 "Network Teaming",
-                                 "ScalablePartition",
-                                 "ScalableSystem",
-                                 "ROOT",
-                                 "ModularChassis",
-                                 "SlotGroup",
-                                 "Slot",
-                                 "CMM",
-                                 "IO Module",
-                                 "CoolingDomain",
-                                 "PowerDomain",
-                                 "Chassis MidPlane Card",
-                                 "ModularGroup",
-                                 "AlertIndication",
-                                 "Connector",
-                                 "BMCUser",
-                                 "Drive Slot Sensor",
-                                 "LAN End Point",
-                                 "invalid"};
-    EXPECT_THAT(IC::pst, testing::ElementsAreArray(names));
+    EXPECT_THAT(IC::pst, testing::ElementsAreArray(sensorNames));
 }
 
 }  // namespace

@@ -106,13 +106,13 @@ inline agreement::NumberPair anyNumber(FuzzedDataProvider& bytes)
         return pair;
     if (change < 248) {
         const auto kind = static_cast<unsigned char>(change % model::numberKinds);
-        pair.library.setKind(kind);
+        pair.actual.setKind(kind);
         model::setKind(pair.expected, kind);
         return pair;
     }
     const auto kind = change % 2 == 0 ? 11u : 4294967295u;
     try {
-        pair.library.initKind(static_cast<IC::Number::KindType>(kind));
+        pair.actual.initKind(static_cast<IC::Number::KindType>(kind));
     } catch (const std::invalid_argument&) {  // which another target looks at
     }
     model::initKind(pair.expected, kind, 0);

@@ -12,13 +12,13 @@ using agreement::ValuePair;
 template <class Container>
 void requireIndependent(const ValuePair& pair)
 {
-    Container given = pair.library.operator Container();
-    const IC::PropertyValue copy(pair.library);
+    Container given = pair.actual.operator Container();
+    const IC::PropertyValue copy(pair.actual);
     IC::PropertyValue moved(Container(given), pair.expected.readOnly);
     requireNone(agreement::differenceInContent(moved, pair.expected));
     given.clear();
     moved.setKind(IC::PropertyValue::KIND_UNKNOWN);
-    requireNone(agreement::differenceInContent(pair.library, pair.expected));
+    requireNone(agreement::differenceInContent(pair.actual, pair.expected));
     requireNone(agreement::differenceInContent(copy, pair.expected));
 }
 
@@ -32,11 +32,11 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     ValuePair a = anyValueOfKind(bytes, kind, 5);
     const ValuePair b = bytes.ConsumeBool() ? anyValueOfKind(bytes, kind, 5) : a;
 
-    requireNone(agreement::differenceInConversion(a.library, a.expected, agreement::PROPERTY_TEXT));
+    requireNone(agreement::differenceInConversion(a.actual, a.expected, agreement::PROPERTY_TEXT));
     const auto comparison = bytes.ConsumeIntegralInRange(0u, agreement::comparisons - 1);
-    requireNone(agreement::differenceInComparison(a.library, b.library, a.expected, b.expected, comparison));
+    requireNone(agreement::differenceInComparison(a.actual, b.actual, a.expected, b.expected, comparison));
     requireNone(
-        agreement::differenceInComparison(a.library, b.library, a.expected, b.expected, agreement::EQUAL));
+        agreement::differenceInComparison(a.actual, b.actual, a.expected, b.expected, agreement::EQUAL));
 
     if (kind == model::BUFFER)
         requireIndependent<IC::Buffer>(a);
@@ -45,8 +45,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     else
         requireIndependent<IC::StringArray>(a);
 
-    a.library = b.library;
-    requireNone(agreement::differenceInContent(a.library, b.expected));
-    requireNone(agreement::differenceInContent(b.library, b.expected));
+    a.actual = b.actual;
+    requireNone(agreement::differenceInContent(a.actual, b.expected));
+    requireNone(agreement::differenceInContent(b.actual, b.expected));
     return 0;
 }

@@ -30,10 +30,10 @@ void requireFit(const Value& a, const Value& b)
 template <class Pair>
 void compare(const Pair& a, const Pair& b, unsigned int comparison)
 {
-    requireNone(agreement::differenceInComparison(a.library, b.library, a.expected, b.expected, comparison));
-    requireFit(a.library, b.library);
-    requireNone(agreement::differenceInContent(a.library, a.expected));
-    requireNone(agreement::differenceInContent(b.library, b.expected));
+    requireNone(agreement::differenceInComparison(a.actual, b.actual, a.expected, b.expected, comparison));
+    requireFit(a.actual, b.actual);
+    requireNone(agreement::differenceInContent(a.actual, a.expected));
+    requireNone(agreement::differenceInContent(b.actual, b.expected));
 }
 
 }  // namespace

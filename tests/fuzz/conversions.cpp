@@ -9,14 +9,14 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const auto target = bytes.ConsumeIntegral<unsigned char>();
     const agreement::NumberPair number = anyNumber(bytes);
     if (target < 128) {
-        const IC::Number copy = number.library;
+        const IC::Number copy = number.actual;
         requireNone(agreement::differenceInConversion(copy, number.expected, target % agreement::targets));
         requireNone(agreement::differenceInContent(copy, number.expected));
         return 0;
     }
     const agreement::ValuePair value = target < 192 ? agreement::pairOf(number, false) : anyValue(bytes);
-    requireNone(agreement::differenceInConversion(value.library, value.expected,
-                                                  target % agreement::propertyTargets));
-    requireNone(agreement::differenceInContent(value.library, value.expected));
+    requireNone(
+        agreement::differenceInConversion(value.actual, value.expected, target % agreement::propertyTargets));
+    requireNone(agreement::differenceInContent(value.actual, value.expected));
     return 0;
 }

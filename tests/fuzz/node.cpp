@@ -72,7 +72,7 @@ void setProperty(IC::Node& node, Expected& expected, unsigned int key, const Val
     ofText.insert(ofText.end(), text.records.begin(), text.records.end());
 
     agreement::takeLoggerCalls();
-    requireError(node.setProperty(key, value.library), status);
+    requireError(node.setProperty(key, value.actual), status);
     const auto calls = agreement::takeLoggerCalls();
     require(recordsOf("Node", calls) == records, "the records of a node");
     require(recordsOf("Number", calls) == ofText, "the records of a value's text in a node's");
@@ -83,10 +83,10 @@ void getProperty(const IC::Node& node, const Expected& expected, unsigned int ke
 {
     const auto found = expected.properties.find(key);
     agreement::takeLoggerCalls();
-    requireError(node.getProperty(key, value.library), found == expected.properties.end() ? 5 : 0);
+    requireError(node.getProperty(key, value.actual), found == expected.properties.end() ? 5 : 0);
     require(agreement::takeLoggerCalls().empty(), "reading a property leaves no record");
     requireNone(agreement::differenceInContent(
-        value.library, found == expected.properties.end() ? value.expected : found->second));
+        value.actual, found == expected.properties.end() ? value.expected : found->second));
 }
 
 void requireAsExpected(const IC::Node& node, const Expected& expected)
@@ -156,7 +156,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         case 0:
         case 1: {
             const ValuePair value = anyValue(bytes);
-            node.add(key, value.library);
+            node.add(key, value.actual);
             expected.properties[key] = value.expected;
             break;
         }

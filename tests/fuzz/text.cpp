@@ -67,8 +67,8 @@ void requireInsertedAsOneText(const Value& value, const Settings& settings)
 void requirePropertiesInPieces(const ValuePair& first, const ValuePair& second, unsigned int key,
                                const Settings& settings)
 {
-    const std::map<unsigned int, IC::PropertyValue> properties = {{key, first.library},
-                                                                  {key / 2, second.library}};
+    const std::map<unsigned int, IC::PropertyValue> properties = {{key, first.actual},
+                                                                  {key / 2, second.actual}};
     std::ostringstream out = settings.stream();
     out << properties;
     std::ostringstream expected = settings.stream();
@@ -85,7 +85,7 @@ void requireErrorText(FuzzedDataProvider& bytes, const agreement::NumberPair& va
 {
     const auto status = bytes.ConsumeIntegralInRange<unsigned char>(0, 16);
     const std::string message = bytes.ConsumeRandomLengthString(16);
-    const IC::Error error(status, value.library, message);
+    const IC::Error error(status, value.actual, message);
     std::ostringstream expected;
     expected << static_cast<unsigned int>(status);
     if (value.expected.kind != model::UNKNOWN)
@@ -131,17 +131,17 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     switch (bytes.ConsumeIntegralInRange(0u, 4u)) {
     case 0: {
         const auto number = anyNumber(bytes);
-        requireNone(agreement::differenceInConversion(number.library, number.expected, agreement::TEXT));
-        requireInsertedAsOneText(number.library, settings);
+        requireNone(agreement::differenceInConversion(number.actual, number.expected, agreement::TEXT));
+        requireInsertedAsOneText(number.actual, settings);
         break;
     }
     case 1: {
         const auto value = anyValue(bytes);
-        const IC::PropertyValue copy(value.library);
+        const IC::PropertyValue copy(value.actual);
         requireNone(
-            agreement::differenceInConversion(value.library, value.expected, agreement::PROPERTY_TEXT));
+            agreement::differenceInConversion(value.actual, value.expected, agreement::PROPERTY_TEXT));
         requireNone(agreement::differenceInConversion(copy, value.expected, agreement::PROPERTY_TEXT));
-        requireInsertedAsOneText(value.library, settings);
+        requireInsertedAsOneText(value.actual, settings);
         break;
     }
     case 2: {

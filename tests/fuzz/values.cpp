@@ -13,14 +13,14 @@ using agreement::ValuePair;
 
 void requireAsExpected(const ValuePair& pair)
 {
-    requireNone(agreement::differenceInContent(pair.library, pair.expected));
+    requireNone(agreement::differenceInContent(pair.actual, pair.expected));
 }
 
 void setKind(ValuePair& pair, unsigned char code)
 {
     const auto expected = model::setKind(pair.expected, code);
     requireNone(agreement::difference("setKind", expected, agreement::outcomeOf([&] {
-                                          pair.library.setKind(code);
+                                          pair.actual.setKind(code);
                                           return model::Nothing();
                                       })));
 }
@@ -32,7 +32,7 @@ void construct(FuzzedDataProvider& bytes, ValuePair& pair)
     model::PropertyValue made = pair.expected;
     const auto expected = model::makeKind(made, code, readOnly);
     requireNone(agreement::difference("from a kind code", expected, agreement::outcomeOf([&] {
-                                          pair.library = IC::PropertyValue(code, readOnly);
+                                          pair.actual = IC::PropertyValue(code, readOnly);
                                           return model::Nothing();
                                       })));
     pair.expected = made;  // refused: the assignment never began
@@ -44,17 +44,17 @@ void changeNumber(FuzzedDataProvider& bytes, NumberPair& pair)
     if (bytes.ConsumeBool()) {
         const auto expected = model::setKind(pair.expected, code);
         requireNone(agreement::difference("setKind of a number", expected, agreement::outcomeOf([&] {
-                                              pair.library.setKind(code);
+                                              pair.actual.setKind(code);
                                               return model::Nothing();
                                           })));
     } else if (code != model::DATE_TIME) {  // which begins with the time of day
         const auto expected = model::initKind(pair.expected, code, 0);
         requireNone(agreement::difference("initKind of a number", expected, agreement::outcomeOf([&] {
-                                              pair.library.initKind(static_cast<IC::Number::KindType>(code));
+                                              pair.actual.initKind(static_cast<IC::Number::KindType>(code));
                                               return model::Nothing();
                                           })));
     }
-    requireNone(agreement::differenceInContent(pair.library, pair.expected));
+    requireNone(agreement::differenceInContent(pair.actual, pair.expected));
 }
 
 // A value without an object is neither copied nor moved: it is given another one.
@@ -81,12 +81,12 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
             break;
         case 1:
             fill(bytes, b);
-            a.library = b.library;
+            a.actual = b.actual;
             a.expected = b.expected;
             break;
         case 2: {
             fill(bytes, b);
-            ValuePair taken {IC::PropertyValue(std::move(b.library)), b.expected};
+            ValuePair taken {IC::PropertyValue(std::move(b.actual)), b.expected};
             b.expected = model::firstValue(model::NOTHING, b.expected.readOnly);
             requireAsExpected(taken);
             requireAsExpected(b);
@@ -96,7 +96,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         case 3:
             fill(bytes, a);
             fill(bytes, b);
-            swap(a.library, b.library);
+            swap(a.actual, b.actual);
             std::swap(a.expected, b.expected);
             break;
         case 4:
@@ -110,19 +110,19 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
             break;
         case 7: {
             fill(bytes, a);
-            const IC::PropertyValue copy(a.library);
+            const IC::PropertyValue copy(a.actual);
             requireNone(agreement::differenceInContent(copy, a.expected));
-            requireSame(copy.operator std::string(), a.library.operator std::string(), "text of a copy");
+            requireSame(copy.operator std::string(), a.actual.operator std::string(), "text of a copy");
             break;
         }
         case 8:
             changeNumber(bytes, number);
-            a.library = IC::PropertyValue(number.library, a.expected.readOnly);
+            a.actual = IC::PropertyValue(number.actual, a.expected.readOnly);
             a.expected = agreement::pairOf(number, a.expected.readOnly).expected;
             break;
         default:
             requireNone(agreement::differenceInConversion(
-                a.library, a.expected, bytes.ConsumeIntegralInRange(0u, agreement::propertyTargets - 1)));
+                a.actual, a.expected, bytes.ConsumeIntegralInRange(0u, agreement::propertyTargets - 1)));
         }
         requireAsExpected(a);
         requireAsExpected(b);

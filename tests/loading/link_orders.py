@@ -27,14 +27,14 @@ def main():
     parser.add_argument("--folder", type=pathlib.Path, required=True)
     parser.add_argument("--orders", type=int, required=True)
     parser.add_argument("--client", nargs="+", required=True)
-    parser.add_argument("--library", nargs="+", required=True)
+    parser.add_argument("--delivered", nargs="+", required=True)
     parser.add_argument("--compiler", nargs=argparse.REMAINDER, required=True)
     arguments = parser.parse_args()
 
     arguments.folder.mkdir(parents=True, exist_ok=True)
     program = arguments.folder / "program"
     for number in range(arguments.orders):
-        objects = order(number, arguments.client, arguments.library)
+        objects = order(number, arguments.client, arguments.delivered)
         subprocess.run([*arguments.compiler, *objects, "-o", program, "-pthread"], check=True)
         run = subprocess.run([program], stdout=subprocess.PIPE, text=True, check=False)
         if run.returncode != 0 or sorted(run.stdout.splitlines()) != EXPECTED:

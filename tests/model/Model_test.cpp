@@ -145,13 +145,13 @@ std::vector<NumberPair> fewNumbers()
                                        pairOf(IC::sNodeRef {4, 7})};
     for (const unsigned char flag : IC::Buffer {0, 1, 2, 255}) {
         NumberPair pair = pairOf(static_cast<unsigned int>(flag));
-        pair.library.setKind(IC::Number::KIND_BOOL);
+        pair.actual.setKind(IC::Number::KIND_BOOL);
         model::setKind(pair.expected, model::FLAG);
         numbers.push_back(pair);
     }
     for (const unsigned int kind : {2u, 10u, 11u, 12u, 4294967295u}) {
         NumberPair pair = pairOf(3u);
-        EXPECT_THROW(pair.library.initKind(static_cast<IC::Number::KindType>(kind)), std::invalid_argument);
+        EXPECT_THROW(pair.actual.initKind(static_cast<IC::Number::KindType>(kind)), std::invalid_argument);
         model::initKind(pair.expected, kind, 0);
         numbers.push_back(pair);
     }
@@ -201,24 +201,24 @@ std::vector<ValuePair> fewValues(bool readOnly = false)
 void expectConversionsAgree(const NumberPair& pair)
 {
     for (unsigned int target = 0; target < agreement::targets; ++target)
-        EXPECT_EQ(agreement::differenceInConversion(pair.library, pair.expected, target), "")
+        EXPECT_EQ(agreement::differenceInConversion(pair.actual, pair.expected, target), "")
             << "of the number " << *model::textOf(pair.expected).value << " of kind " << pair.expected.kind;
-    EXPECT_EQ(agreement::differenceInContent(pair.library, pair.expected), "");
+    EXPECT_EQ(agreement::differenceInContent(pair.actual, pair.expected), "");
 }
 
 void expectConversionsAgree(const ValuePair& pair)
 {
     for (unsigned int target = 0; target < agreement::propertyTargets; ++target)
-        EXPECT_EQ(agreement::differenceInConversion(pair.library, pair.expected, target), "")
+        EXPECT_EQ(agreement::differenceInConversion(pair.actual, pair.expected, target), "")
             << "of the value " << *model::textOf(pair.expected).value << " of kind " << pair.expected.kind;
-    EXPECT_EQ(agreement::differenceInContent(pair.library, pair.expected), "");
+    EXPECT_EQ(agreement::differenceInContent(pair.actual, pair.expected), "");
 }
 
 template <class Pair>
 void expectComparisonsAgree(const Pair& a, const Pair& b)
 {
     for (unsigned int comparison = 0; comparison < agreement::comparisons; ++comparison)
-        EXPECT_EQ(agreement::differenceInComparison(a.library, b.library, a.expected, b.expected, comparison),
+        EXPECT_EQ(agreement::differenceInComparison(a.actual, b.actual, a.expected, b.expected, comparison),
                   "")
             << *model::textOf(a.expected).value << " of kind " << a.expected.kind << " beside "
             << *model::textOf(b.expected).value << " of kind " << b.expected.kind;
@@ -237,7 +237,7 @@ TEST(ModelOfNumber, ReadsTheStorageOfEveryKindAsEveryOther)
     for (const NumberPair& pair : boundaryNumbers())
         for (unsigned char kind = 0; kind < model::numberKinds; ++kind) {
             NumberPair read = pair;
-            read.library.setKind(kind);
+            read.actual.setKind(kind);
             ASSERT_TRUE(model::setKind(read.expected, kind).value);
             SCOPED_TRACE("made of kind " + std::to_string(pair.expected.kind));
             expectConversionsAgree(read);
@@ -250,7 +250,7 @@ TEST(ModelOfNumber, GivesEveryVersionAsRealTextAndVersion)
         const NumberPair pair = pairOf(IC::Version2 {static_cast<unsigned char>(version / 256),
                                                      static_cast<unsigned char>(version % 256)});
         for (const auto target : {agreement::REAL, agreement::TEXT, agreement::VERSION})
-            ASSERT_EQ(agreement::differenceInConversion(pair.library, pair.expected, target), "");
+            ASSERT_EQ(agreement::differenceInConversion(pair.actual, pair.expected, target), "");
     }
 }
 
@@ -259,7 +259,7 @@ TEST(ModelOfNumber, GivesEveryMillisecondAsDateTimeAndText)
     for (unsigned int milliseconds = 0; milliseconds < 65536; ++milliseconds) {
         const NumberPair pair = pairOf(1234567890L, static_cast<unsigned short>(milliseconds));
         for (const auto target : {agreement::DATE_TIME, agreement::TEXT})
-            ASSERT_EQ(agreement::differenceInConversion(pair.library, pair.expected, target), "");
+            ASSERT_EQ(agreement::differenceInConversion(pair.actual, pair.expected, target), "");
     }
 }
 
@@ -326,21 +326,21 @@ TEST(ModelOfNumber, ChangesTheKindOfEveryNumber)
             EXPECT_EQ(agreement::difference("setKind",
                                             model::setKind(set.expected, static_cast<unsigned char>(code)),
                                             agreement::outcomeOf([&] {
-                                                set.library.setKind(static_cast<unsigned char>(code));
+                                                set.actual.setKind(static_cast<unsigned char>(code));
                                                 return model::Nothing();
                                             })),
                       "");
-            EXPECT_EQ(agreement::differenceInContent(set.library, set.expected), "");
+            EXPECT_EQ(agreement::differenceInContent(set.actual, set.expected), "");
             if (code == model::DATE_TIME)
                 continue;
             NumberPair begun = pair;
             EXPECT_EQ(agreement::difference(
                           "initKind", model::initKind(begun.expected, code, 0), agreement::outcomeOf([&] {
-                              begun.library.initKind(static_cast<IC::Number::KindType>(code));
+                              begun.actual.initKind(static_cast<IC::Number::KindType>(code));
                               return model::Nothing();
                           })),
                       "");
-            EXPECT_EQ(agreement::differenceInContent(begun.library, begun.expected), "");
+            EXPECT_EQ(agreement::differenceInContent(begun.actual, begun.expected), "");
         }
     }
 }
@@ -401,10 +401,10 @@ TEST(ModelOfPropertyValue, AssignsEveryKindToEveryOther)
     const std::vector<ValuePair> readOnly = fewValues(true);
     for (const ValuePair& target : writable)
         for (const ValuePair& source : readOnly) {
-            IC::PropertyValue assigned = target.library;
-            assigned = source.library;
+            IC::PropertyValue assigned = target.actual;
+            assigned = source.actual;
             EXPECT_EQ(agreement::differenceInContent(assigned, source.expected), "");
-            EXPECT_EQ(agreement::differenceInContent(source.library, source.expected), "");
+            EXPECT_EQ(agreement::differenceInContent(source.actual, source.expected), "");
         }
 }
 
@@ -417,11 +417,11 @@ TEST(ModelOfPropertyValue, ChangesTheKindOfEveryValue)
             EXPECT_EQ(agreement::difference("setKind",
                                             model::setKind(set.expected, static_cast<unsigned char>(code)),
                                             agreement::outcomeOf([&] {
-                                                set.library.setKind(static_cast<unsigned char>(code));
+                                                set.actual.setKind(static_cast<unsigned char>(code));
                                                 return model::Nothing();
                                             })),
                       "");
-            EXPECT_EQ(agreement::differenceInContent(set.library, set.expected), "");
+            EXPECT_EQ(agreement::differenceInContent(set.actual, set.expected), "");
             if (set.expected.empty && (code == 7 || code == 255))
                 expectConversionsAgree(set);
         }

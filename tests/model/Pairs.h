@@ -13,7 +13,7 @@
 namespace agreement {
 
 struct NumberPair {
-    IC::Number library;
+    IC::Number actual;
     model::Number expected;
 };
 
@@ -65,13 +65,13 @@ inline NumberPair pairOfKind(model::NumberKind kind)
 }
 
 struct ValuePair {
-    IC::PropertyValue library;
+    IC::PropertyValue actual;
     model::PropertyValue expected;
 };
 
 inline ValuePair pairOf(const NumberPair& number, bool readOnly)
 {
-    ValuePair pair {IC::PropertyValue(number.library, readOnly), model::firstValue(model::NUMBER, readOnly)};
+    ValuePair pair {IC::PropertyValue(number.actual, readOnly), model::firstValue(model::NUMBER, readOnly)};
     pair.expected.number = number.expected;
     return pair;
 }
@@ -98,7 +98,7 @@ inline ValuePair pairOf(const std::vector<NumberPair>& numbers, bool readOnly)
     IC::NumberArray array;
     model::PropertyValue expected = model::firstValue(model::NUMBER_ARRAY, readOnly);
     for (const NumberPair& number : numbers) {
-        array.push_back(number.library);
+        array.push_back(number.actual);
         expected.numbers.push_back(number.expected);
     }
     return {IC::PropertyValue(array, readOnly), expected};

@@ -66,7 +66,7 @@ bool agree(double real, unsigned long long turn)
                                              agreement::UINT64, agreement::REAL};
     const agreement::NumberPair pair = agreement::pairOf(real);
     const std::string found =
-        agreement::differenceInConversion(pair.library, pair.expected, targets[turn % std::size(targets)]);
+        agreement::differenceInConversion(pair.actual, pair.expected, targets[turn % std::size(targets)]);
     if (!found.empty())
         std::cout << std::hexfloat << real << ' ' << found << '\n';
     return found.empty();

@@ -1,7 +1,5 @@
 #pragma once
 
-namespace model {
-
 // The display names of the sensor types, by code; the last one belongs to no code.
 constexpr const char* sensorNames[75] = {
     "Unknown",
@@ -80,5 +78,3 @@ constexpr const char* sensorNames[75] = {
     "LAN End Point",
     "invalid",
 };
-
-}  // namespace model
