@@ -72,12 +72,11 @@ def read_bars(path):
     return bars
 
 
-def read_results(paths):
-    """The context, and for each row the median of each contender in nanoseconds or bytes."""
-    files = [json.loads(path.read_text(encoding="utf-8")) for path in paths]
+def read_process(path):
+    """The context of one process, and for each of its rows the median of each contender in nanoseconds or bytes."""
+    file = json.loads(path.read_text(encoding="utf-8"))
     samples = {}
-    position = {}  # of a row in the benchmark, which runs its rows in any order
-    for run in (run for file in files for run in file["benchmarks"]):
+    for run in file["benchmarks"]:
         if run.get("run_type") != "iteration":
             continue
         if run.get("error_occurred"):
@@ -89,17 +88,38 @@ def read_results(paths):
         else:
             # The processor's time, which others on the machine disturb least; two threads also wait.
             sample = run["real_time" if run.get("threads", 1) > 1 else "cpu_time"]
-        position[row] = min(run["family_index"], position.get(row, run["family_index"]))
         samples.setdefault(row, {}).setdefault(contender, []).append(sample)
-    rows = sorted(samples, key=position.get)
-    kinds = list(dict.fromkeys(kind(row) for row in rows))
-    # Rows of one kind together, and last what is no operation.
-    rows.sort(key=lambda row: (kind(row) in {"bytes", PRIMITIVE}, kinds.index(kind(row))))
-    medians = {
-        row: {contender: statistics.median(values) for contender, values in samples[row].items()}
-        for row in rows
+    return file["context"], {
+        row: {contender: statistics.median(values) for contender, values in contenders.items()}
+        for row, contenders in samples.items()
     }
-    return files[0]["context"], medians
+
+
+class Row(dict):
+    """The median of each contender over all processes, and what each process saw."""
+
+    def __init__(self, processes):
+        self.processes = processes
+        super().__init__(
+            (contender, statistics.median(process[contender] for process in processes)) for contender in processes[0]
+        )
+
+    def ratio(self, contender, other):
+        """Of two that were measured in turn: what slows the machine for a while slows both."""
+        return statistics.median(process[contender] / process[other] for process in self.processes)
+
+
+def read_results(paths):
+    """The context, and the rows by their names."""
+    processes = {}
+    for path in paths:
+        context, rows = read_process(path)
+        for row, contenders in rows.items():
+            processes.setdefault(row, []).append(contenders)
+    kinds = list(dict.fromkeys(kind(row) for row in processes))
+    # Rows of one kind together, and last what is no operation.
+    rows = sorted(processes, key=lambda row: (kind(row) in {"bytes", PRIMITIVE}, kinds.index(kind(row))))
+    return context, {row: Row(processes[row]) for row in rows}
 
 
 def bar_of(row, bars):
@@ -114,15 +134,14 @@ def ratios(row, medians, bars):
     if LIBRARY not in medians:
         return None, None
     bar = bar_of(row, bars)
-    cost = medians[LIBRARY]
-    against_limit = Ratio(cost / medians[LIMIT], bar.limit, LIMIT) if LIMIT in medians else None
+    against_limit = Ratio(medians.ratio(LIBRARY, LIMIT), bar.limit, LIMIT) if LIMIT in medians else None
     candidates = [bar.peer_name] if bar.peer_name else [
         peer for peer in PEERS if peer not in SHARING and peer != RECORDS]
     candidates = [peer for peer in candidates if peer in medians]
     if not candidates:
         return against_limit, None
     best = min(candidates, key=medians.get)
-    return against_limit, Ratio(cost / medians[best], bar.peer, best)
+    return against_limit, Ratio(medians.ratio(LIBRARY, best), bar.peer, best)
 
 
 def quantity(value, row):
