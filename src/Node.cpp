@@ -41,7 +41,7 @@ private:
 struct SensorRefusal {
     unsigned int sensor;
 
-    explicit operator std::string() const
+    operator std::string() const
     {
         return std::to_string(sensor) + " is not a valid sensor. The largest possible sensor is "
             + std::to_string(Node::SENSOR_LARGEST);

@@ -220,28 +220,22 @@ void PropertyValue::setKind(const unsigned char& kind)
     swap(fresh);
 }
 
-ZQ::Real64 PropertyValue::toReal() const
+ZQ::Real64 PropertyValue::refuseReal() const
 {
-    if (holds(KIND_ENUMVALUE))
-        return object<EnumValue>().operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Real64"), notANumber,
         "PropertyValue:Real64: can't return current value as a Real64, kind=", kindOf(*this));
 }
 
-ZQ::Uint64 PropertyValue::toUint64() const
+ZQ::Uint64 PropertyValue::refuseUint64() const
 {
-    if (holds(KIND_ENUMVALUE))
-        return object<EnumValue>().operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint64"), notANumber,
         "PropertyValue:Uint64: can't return current value as a Uint64, kind=", kindOf(*this));
 }
 
-ZQ::Uint32 PropertyValue::toUint32() const
+ZQ::Uint32 PropertyValue::refuseUint32() const
 {
-    if (holds(KIND_ENUMVALUE))
-        return object<EnumValue>().operator unsigned int();
     detail::fail<PropertyValueInvalidKind>(
         here("operator ZQ::Uint32"), notANumber,
         "PropertyValue::Uint32: can't return current value as a Uint32, kind=", kindOf(*this));

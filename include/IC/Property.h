@@ -234,14 +234,23 @@ public:
     ///     to StringArray, from texts
     ///       "PropertyValue:StringArray: can't return current value as a StringArray, kind="
     ///         "Can't return current value as a StringArray"
-    operator double() const { return holds(KIND_NUMBER) ? object<Number>().operator double() : toReal(); }
+    operator double() const
+    {
+        return holds(KIND_NUMBER)   ? object<Number>().operator double()
+            : holds(KIND_ENUMVALUE) ? object<EnumValue>().operator unsigned int()
+                                    : refuseReal();
+    }
     operator unsigned long long() const
     {
-        return holds(KIND_NUMBER) ? object<Number>().operator unsigned long long() : toUint64();
+        return holds(KIND_NUMBER)   ? object<Number>().operator unsigned long long()
+            : holds(KIND_ENUMVALUE) ? object<EnumValue>().operator unsigned int()
+                                    : refuseUint64();
     }
     operator unsigned int() const
     {
-        return holds(KIND_NUMBER) ? object<Number>().operator unsigned int() : toUint32();
+        return holds(KIND_NUMBER)   ? object<Number>().operator unsigned int()
+            : holds(KIND_ENUMVALUE) ? object<EnumValue>().operator unsigned int()
+                                    : refuseUint32();
     }
     operator bool() const { return holds(KIND_NUMBER) ? object<Number>().operator bool() : refuseBool(); }
     operator Number() const { return holds(KIND_NUMBER) ? object<Number>() : refuseNumber(); }
@@ -331,9 +340,9 @@ private:
     static bool precedes(const PropertyValue& a, const PropertyValue& b);
 
     std::string toText() const;
-    ZQ::Real64 toReal() const;
-    ZQ::Uint64 toUint64() const;
-    ZQ::Uint32 toUint32() const;
+    [[noreturn, gnu::cold]] ZQ::Real64 refuseReal() const;
+    [[noreturn, gnu::cold]] ZQ::Uint64 refuseUint64() const;
+    [[noreturn, gnu::cold]] ZQ::Uint32 refuseUint32() const;
     [[noreturn, gnu::cold]] bool refuseBool() const;
     [[noreturn, gnu::cold]] Number refuseNumber() const;
     [[noreturn, gnu::cold]] Version2 refuseVersion() const;

@@ -8,8 +8,8 @@
 #include <mutex>
 #include <utility>
 
-#include "Locks.h"
 #include "Printable.h"
+#include "SinkLock.h"
 #include "VXLog/RecordSink.h"
 #include "ZQ/DateTime.h"
 

@@ -1,4 +1,4 @@
-#include "Locks.h"
+#include "SinkLock.h"
 
 #include <pthread.h>
 
@@ -7,27 +7,24 @@
 namespace VXLog {
 
 std::mutex sinkLock;
-std::mutex composersLock;
 
 namespace {
 
-void lockAll()
+void lock()
 {
-    composersLock.lock();
     sinkLock.lock();
 }
 
-void unlockAll()
+void unlock()
 {
     sinkLock.unlock();
-    composersLock.unlock();
 }
 
 // The system forgets the handlers when the library is unloaded.
 struct ForkHandlers {
     ForkHandlers()
     {
-        if (pthread_atfork(lockAll, unlockAll, unlockAll) != 0)
+        if (pthread_atfork(lock, unlock, unlock) != 0)
             throw std::bad_alloc();
     }
 };
