@@ -12,7 +12,7 @@
 #include "AllocationFailure.h"
 #include "GroupingLocale.h"
 #include "IC/Alert.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 #include "ZQ/DateTime.h"
 
 namespace {

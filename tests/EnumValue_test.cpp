@@ -11,7 +11,7 @@
 
 #include "GroupingLocale.h"
 #include "IC/EnumValue.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 
 namespace {
 

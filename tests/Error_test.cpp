@@ -13,7 +13,7 @@
 #include "GroupingLocale.h"
 #include "IC/Error.h"
 #include "IC/Number.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 #include "ZQ/DateTime.h"
 
 namespace {

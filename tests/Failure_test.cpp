@@ -25,7 +25,7 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 #include "ZQ/DateTime.h"
 
 namespace {

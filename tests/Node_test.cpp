@@ -22,7 +22,7 @@
 #include "IC/ICException.h"
 #include "IC/Node.h"
 #include "PropertySamples.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 
 namespace {
 

@@ -20,7 +20,7 @@
 
 #include "AllocationFailure.h"
 #include "IC/Number.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 #include "SensorNames.h"
 #include "ZQ/DateTime.h"
 

@@ -13,7 +13,7 @@ complain() {
 
 [ -f "$commands" ] || { echo "no file $commands" >&2; exit 1; }
 compiled=$(grep '"command":' "$commands" | grep -E -- '-c [^ ]*/(src|platform/(ZQ|VXLog)/src)/[A-Za-z/]*\.cpp' |
-    grep -v -e ic_observed -e /tests/)
+    grep -v -e ICTesting -e /tests/)
 [ -n "$compiled" ] || { echo "no source of a library in $commands" >&2; exit 1; }
 without() {
     echo "$compiled" | grep -v -e "$1" | sed 's/.* -c /  /' || true

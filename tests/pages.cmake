@@ -42,3 +42,6 @@ if(TARGET trap-infinity)
     list(APPEND examples tests/traps/null-text.cpp=trap-null-text)
     ic_test_page(traps docs/traps.md ${examples})
 endif()
+
+set(example examples/testing)
+ic_test_page(testing docs/testing.md ${example}/FanProvider.h ${example}/FanProvider.cpp ${example}/FanProvider_test.cpp)

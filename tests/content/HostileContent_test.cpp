@@ -6,7 +6,7 @@
 
 #include "IC/Alert.h"
 #include "IC/Node.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 
 namespace {
 

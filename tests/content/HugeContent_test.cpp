@@ -11,7 +11,7 @@
 
 #include "AllocationFailure.h"
 #include "IC/Node.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 
 namespace {
 

@@ -14,7 +14,7 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 #include "SensorNames.h"
 #include "Trial.h"
 #include "ZQ/DateTime.h"

@@ -5,7 +5,7 @@
 #include <gtest/gtest.h>
 
 #include "AllocationFailure.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 #include "Trial.h"
 
 // Tries the operation with the fault and adds a failure, which names `where`, for anything that is wrong then.

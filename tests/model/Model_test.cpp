@@ -10,7 +10,7 @@
 
 #include "Agreement.h"
 #include "Pairs.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 
 namespace {
 

@@ -106,7 +106,7 @@ class Suite:
             ["cmake", "-S", ROOT, "-B", BUILD, "-G", "Ninja", "-DCMAKE_BUILD_TYPE=", "-DCMAKE_CXX_COMPILER=g++",
              "-DCMAKE_CXX_STANDARD=17", "-DBUILD_SHARED_LIBS=OFF", "-DCMAKE_EXPORT_COMPILE_COMMANDS=ON"]
         )  # fmt: skip
-        library = "tests/libic_observed.a"
+        library = "testkit/libICTesting.a"
         users = output_of(["ninja", "-C", BUILD, "-t", "query", library]).partition("outputs:")[2].split()
         paths = [user for user in users if re.fullmatch(r"tests/\w+_test", user)]
         if not paths:
@@ -116,8 +116,8 @@ class Suite:
         self.commands = {}
         for entry in json.loads((BUILD / "compile_commands.json").read_text()):
             words = shlex.split(entry["command"])
-            if "ic_observed.dir/" in words[words.index("-o") + 1]:
-                file = str(pathlib.Path(entry["file"]).relative_to(ROOT))
+            file = str(pathlib.Path(entry["file"]).relative_to(ROOT))
+            if file.startswith("src/") and "ICTesting.dir/" in words[words.index("-o") + 1]:
                 self.commands[file] = words[: words.index("-o")]
         self.place = pathlib.Path(tempfile.mkdtemp(dir=BUILD))
 

@@ -83,6 +83,36 @@ int expectRefusal(Operation operation, const std::string& function, const std::s
     return expectRecordPair(records, before, function, file, category, 6000, logged);
 }
 
+// One message of the library, as a log record and as the same trace record.
+struct Message {
+    std::string function;
+    std::string logger;
+    int level;
+    std::string text;
+};
+
+// Expects the records since the test began, or since observe::reset(), to be those of these messages, in this order,
+// and no others.
+//
+//   expectRecords({{"setProperty", "Vexilon.IC.Node", 3000, "setProperty: 7 true"}});
+inline void expectRecords(const std::vector<Message>& expected)
+{
+    const auto line = [](bool trace, const std::string& function, const std::string& logger, int level,
+                         const std::string& text) {
+        std::string result(trace ? "trace " : "log   ");
+        result.append(function).append(" ").append(logger).append(" ").append(std::to_string(level));
+        return result.append(": ").append(text).append("\n");
+    };
+    std::string wanted;
+    for (const Message& message : expected)
+        for (const bool trace : {false, true})
+            wanted += line(trace, message.function, message.logger, message.level, message.text);
+    std::string written;
+    for (const observe::Record& record : observe::records())
+        written += line(record.trace, record.function, record.logger, record.level, record.message);
+    EXPECT_EQ(written, wanted);  // texts of several lines, of which GoogleTest prints the difference
+}
+
 class ObserveEachTest : public testing::EmptyTestEventListener {
 public:
     // Appended before main runs; GoogleTest owns and deletes it.

@@ -1,0 +1,43 @@
+#include "FanProvider.h"
+
+#include <utility>
+
+namespace {
+
+constexpr unsigned int forEver = 0xFFFFFFFF;
+constexpr auto stopped = static_cast<IC::Node::StatusType>(3);
+
+// std::lock_guard for the platform's mutex.
+class Lock {
+public:
+    explicit Lock(ZQ::Mutex& mutex) : mutex_(mutex) { mutex_.lock(forEver); }
+    ~Lock() { mutex_.unlock(); }
+    Lock(const Lock&) = delete;
+    Lock& operator=(const Lock&) = delete;
+
+private:
+    ZQ::Mutex& mutex_;
+};
+
+}  // namespace
+
+FanProvider::FanProvider(const std::string& model) : Node(SENSOR_FAN)
+{
+    path = "/chassis/fan1";
+    parent = "/chassis";
+    properties.insert({MODEL, IC::PropertyValue(model, true)});
+    properties.insert({SPEED, IC::PropertyValue(IC::Number(0u))});
+}
+
+void FanProvider::measured(unsigned int speed)
+{
+    IC::PropertyValue value {IC::Number(speed)};  // what can fail comes first
+    const Lock lock(mutex);
+    properties.at(SPEED) = std::move(value);
+    status = speed == 0 ? stopped : STATUS_INITIAL;
+}
+
+IC::Alert FanProvider::alert() const
+{
+    return IC::Alert(2, 1, {path}, getStatus(), "The fan has stopped");
+}

@@ -1,0 +1,56 @@
+#pragma once
+
+#include <ostream>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "IC/EnumValue.h"
+#include "IC/Number.h"
+#include "IC/Property.h"
+
+// How GoogleTest prints values: with the name of the kind, since a text form does not tell 5 from "5".
+//
+//   IC::Number(5u)                     KIND_UINT32 5
+//   IC::PropertyValue("5", true)       KIND_STRING "5", read-only
+//
+// Included by all of a program's test files or by none: GoogleTest prints one type in one way.
+namespace IC {
+
+inline void PrintTo(const Number& number, std::ostream* out)
+{
+    static constexpr const char* names[] = {"KIND_UNKNOWN", "KIND_BOOL",     "KIND_INT",    "KIND_UINT32",
+                                            "KIND_UINT64",  "KIND_REAL",     "KIND_NAN",    "KIND_INFINITY",
+                                            "KIND_VERSION", "KIND_DATETIME", "KIND_NODEREF"};
+    const ZQ::Uint32 kind = number.getKind();
+    if (kind > Number::KIND_NODEREF)
+        *out << "kind " << kind;
+    else if (kind == Number::KIND_UNKNOWN || kind == Number::KIND_NAN || kind == Number::KIND_INFINITY)
+        *out << names[kind];
+    else
+        *out << names[kind] << ' ' << number;
+}
+
+inline void PrintTo(const EnumValue& value, std::ostream* out)
+{
+    *out << "EnumValue " << value;
+}
+
+inline void PrintTo(const PropertyValue& value, std::ostream* out)
+{
+    static constexpr const char* names[] = {"KIND_UNKNOWN",    "KIND_NUMBER",    "KIND_STRING",
+                                            "KIND_BUFFER",     "KIND_ENUMVALUE", "KIND_NUMBERARRAY",
+                                            "KIND_STRINGARRAY"};
+    const PropertyValue::KindType kind = value.getKind();
+    *out << names[kind];
+    const std::string text = value;  // "invalid" without an object, which a conversion would refuse
+    if (kind == PropertyValue::KIND_STRING)
+        *out << ' ' << testing::PrintToString(text);
+    else if (kind == PropertyValue::KIND_NUMBER && text != "invalid")
+        PrintTo(value.operator Number(), &(*out << ' '));
+    else if (kind != PropertyValue::KIND_UNKNOWN)
+        *out << ' ' << text;
+    *out << (value.readOnly() ? ", read-only" : "");
+}
+
+}  // namespace IC
