@@ -12,8 +12,8 @@
 #include "AllocationFailure.h"
 #include "GroupingLocale.h"
 #include "IC/Alert.h"
-#include "observe/Refusal.h"
 #include "ZQ/DateTime.h"
+#include "observe/Refusal.h"
 
 namespace {
 

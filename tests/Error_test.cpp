@@ -13,8 +13,8 @@
 #include "GroupingLocale.h"
 #include "IC/Error.h"
 #include "IC/Number.h"
-#include "observe/Refusal.h"
 #include "ZQ/DateTime.h"
+#include "observe/Refusal.h"
 
 namespace {
 

@@ -25,8 +25,8 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "observe/Refusal.h"
 #include "ZQ/DateTime.h"
+#include "observe/Refusal.h"
 
 namespace {
 

@@ -20,9 +20,9 @@
 
 #include "AllocationFailure.h"
 #include "IC/Number.h"
-#include "observe/Refusal.h"
 #include "SensorNames.h"
 #include "ZQ/DateTime.h"
+#include "observe/Refusal.h"
 
 namespace {
 

@@ -17,8 +17,8 @@
 #include "IC/Number.h"
 #include "IC/Property.h"
 #include "PropertySamples.h"
-#include "observe/Refusal.h"
 #include "ZQ/DateTime.h"
+#include "observe/Refusal.h"
 
 namespace {
 

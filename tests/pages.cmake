@@ -3,6 +3,8 @@
 # ic_test_page(NAME PAGE EXAMPLE...): an example is a source below examples/ or tests/, or SOURCE=TARGET for one that
 # is run.
 function(ic_test_page name page)
+    list(APPEND tested_pages ${page})
+    set(tested_pages ${tested_pages} PARENT_SCOPE)
     set(examples)
     foreach(example IN LISTS ARGN)
         string(REGEX REPLACE "=(.*)" "|$<TARGET_FILE:\\1>" example ${example})
@@ -45,3 +47,16 @@ endif()
 
 set(example examples/testing)
 ic_test_page(testing docs/testing.md ${example}/FanProvider.h ${example}/FanProvider.cpp ${example}/FanProvider_test.cpp)
+
+# No page has programs that no test compiles.
+if(NOT IC_PLATFORM_DIR)
+    file(GLOB_RECURSE pages RELATIVE ${PROJECT_SOURCE_DIR}
+        ${PROJECT_SOURCE_DIR}/*.md)
+    list(FILTER pages EXCLUDE REGEX "^build/")
+    foreach(page IN LISTS pages)
+        file(STRINGS ${PROJECT_SOURCE_DIR}/${page} programs REGEX "^```(cpp|c\\+\\+)")
+        if(programs AND NOT page IN_LIST tested_pages)
+            message(FATAL_ERROR "${page} shows programs, and no test looks at them")
+        endif()
+    endforeach()
+endif()

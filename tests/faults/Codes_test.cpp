@@ -14,10 +14,10 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "observe/Refusal.h"
 #include "SensorNames.h"
 #include "Trial.h"
 #include "ZQ/DateTime.h"
+#include "observe/Refusal.h"
 
 // Every operation that takes a code, with every code of one byte, and with the codes of 32 bits up to 65535 and on
 // both sides of each power of two. Where two operations share the check, one of them does with fewer.

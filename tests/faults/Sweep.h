@@ -5,8 +5,8 @@
 #include <gtest/gtest.h>
 
 #include "AllocationFailure.h"
-#include "observe/Refusal.h"
 #include "Trial.h"
+#include "observe/Refusal.h"
 
 // Tries the operation with the fault and adds a failure, which names `where`, for anything that is wrong then.
 // Right is what wrongAfterFault says, or, if `mayGoOn`, that all went as undisturbed. Whether the fault was reached

@@ -32,6 +32,21 @@
 //   expectRecordPair(records, 0, "setProperty", "Node", "Vexilon.IC.Node", 3000, "setProperty: 7 true");
 //   expectRecordPair(records, 2, "setProperty", "Node", "Vexilon.IC.Node", 6000, "setProperty: 7 read-only");
 
+// GoogleTest's report lists with each test what it expected to be refused, numbers left out, as
+// "file|function|level|message" and "exception|what()".
+inline void report(const std::string& function, const std::string& file, int level,
+                   const std::string& message, const std::string& exception)
+{
+    std::string pattern;
+    for (const char character : message) {
+        const bool digit = character >= '0' && character <= '9';
+        if (!digit || pattern.empty() || pattern.back() != '#')
+            pattern += digit ? '#' : character;
+    }
+    testing::Test::RecordProperty(file + '|' + function + '|' + std::to_string(level) + '|' + pattern,
+                                  exception);
+}
+
 // Expects records[first] to be a log record and records[first + 1] its trace record, with these fields, and
 // null, 0 and 0 in between. Returns their line.
 inline int expectRecordPair(const std::vector<observe::Record>& records, std::size_t first,
@@ -42,6 +57,8 @@ inline int expectRecordPair(const std::vector<observe::Record>& records, std::si
         ADD_FAILURE() << "no records " << first << " and " << first + 1 << " for: " << message;
         return 0;
     }
+    if (level == 6000)
+        report(function, file, level, message, std::string());
     for (const bool trace : {false, true}) {
         SCOPED_TRACE(trace ? "trace record" : "log record");
         const observe::Record& record = records[first + (trace ? 1 : 0)];
@@ -80,7 +97,9 @@ int expectRefusal(Operation operation, const std::string& function, const std::s
     }
     const std::vector<observe::Record> records = observe::records();
     EXPECT_EQ(records.size(), before + 2) << "records written by the refusal: " << records.size() - before;
-    return expectRecordPair(records, before, function, file, category, 6000, logged);
+    const int line = expectRecordPair(records, before, function, file, category, 6000, logged);
+    report(function, file, 6000, logged, std::string(typeid(Exception).name()).append("|").append(sentence));
+    return line;
 }
 
 // One message of the library, as a log record and as the same trace record.
