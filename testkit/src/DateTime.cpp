@@ -29,7 +29,8 @@ DateTime::DateTime(const DateTime& other) : fields_(new Fields(*other.fields_))
 DateTime& DateTime::operator=(const DateTime& other)
 {
     observe::reached(observe::Call::dateTime);
-    *fields_ = *other.fields_;
+    if (this != &other)
+        *fields_ = *other.fields_;
     return *this;
 }
 

@@ -23,7 +23,7 @@ struct Record {
     int line;
     std::string logger;
     int level;
-    const void* data;
+    char* data;
     int a;
     int b;
     std::string message;
