@@ -1,6 +1,5 @@
 #pragma once
 
-#include <algorithm>
 #include <charconv>
 #include <cstddef>
 #include <cstdint>
@@ -125,25 +124,9 @@ public:
     bool isClassic() const { return !locale_; }
 
     void add(int number);
-    void add(unsigned int number) { addInteger("", number); }
-    void add(unsigned long long number) { addInteger("", number); }
+    void add(unsigned int number) { addInteger(number); }
+    void add(unsigned long long number) { addInteger(number); }
     void add(double number);
-
-    // With what separates it from the number before it: one step for both.
-    template <class T>
-    void addInteger(std::string_view separator, T number)
-    {
-        if (locale_) {
-            add(separator);
-            addStreamed(number);
-            return;
-        }
-        constexpr std::size_t longest = std::numeric_limits<T>::digits10 + 1;
-        write(separator.size() + longest, [separator, number](char* out) {
-            out = std::copy(separator.begin(), separator.end(), out);
-            return writeDecimal(out, number);
-        });
-    }
 
     // By the type's own stream insertion.
     template <class T>
@@ -168,6 +151,17 @@ public:
     Text& operator=(const Text&) = delete;
 
 private:
+    template <class T>
+    void addInteger(T number)
+    {
+        if (locale_) {
+            addStreamed(number);
+            return;
+        }
+        constexpr std::size_t longest = std::numeric_limits<T>::digits10 + 1;
+        write(longest, [number](char* out) { return writeDecimal(out, number); });
+    }
+
     // Where the next characters go; there is room for so many.
     char* room(std::size_t length)
     {
