@@ -50,6 +50,21 @@ inline std::string contentOf(const std::string& name)
     return content.str();
 }
 
+// The export of a machine of one thread, with these facts of it and these objects in it.
+inline std::string machineOf(const std::string& facts, const std::string& objects = "")
+{
+    const std::string sets = " cpuset=\"0x1\" complete_cpuset=\"0x1\" allowed_cpuset=\"0x1\" nodeset=\"0x1\""
+                             " complete_nodeset=\"0x1\" allowed_nodeset=\"0x1\"";
+    return "<topology version=\"2.0\"><object type=\"Machine\"" + sets + ">" + facts
+        + "<object type=\"NUMANode\" os_index=\"0\"" + sets + "/><object type=\"PU\" os_index=\"0\"" + sets
+        + "/>" + objects + "</object></topology>";
+}
+
+inline std::string fact(const std::string& name, const std::string& value)
+{
+    return "<info name=\"" + name + "\" value=\"" + value + "\"/>";
+}
+
 struct Outcome {
     int status;
     std::string out;

@@ -115,13 +115,7 @@ TEST(InventorySensors, HaveLimitsThatCanBeChanged)
 TEST(InventorySensors, AreNoPartOfAFile)
 {
     const Folder folder;
-    const std::string sets = " cpuset=\"0x1\" complete_cpuset=\"0x1\" allowed_cpuset=\"0x1\" nodeset=\"0x1\""
-                             " complete_nodeset=\"0x1\" allowed_nodeset=\"0x1\"";
-    const std::string file =
-        folder.write("machine.xml",
-                     "<topology version=\"2.0\"><object type=\"Machine\"" + sets
-                         + "><object type=\"NUMANode\" os_index=\"0\"" + sets
-                         + "/><object type=\"PU\" os_index=\"0\"" + sets + "/></object></topology>");
+    const std::string file = folder.write("machine.xml", machineOf(""));
     const Outcome outcome = runWith("A: fan1_input=900\\n\n", {file});
     EXPECT_EQ(outcome.status, 0) << outcome.err;
     EXPECT_THAT(outcome.out, StartsWith("Computer machine"));

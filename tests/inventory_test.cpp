@@ -11,6 +11,7 @@
 
 #include "IC/ICException.h"
 #include "VXLog/RecordSink.h"
+#include "alerts.h"
 #include "inventory_run.h"
 #include "mapping.h"
 #include "reading.h"
@@ -892,7 +893,7 @@ TEST_F(InventoryProgram, RefusesBadInputInOneLine)
 TEST_F(InventoryProgram, TellsWhenItCannotWrite)
 {
     const Outcome outcome = runProgram({"sh", "-c", INVENTORY_PROGRAM " '" + small + "' >/dev/full"});
-    EXPECT_EQ(outcome.status, 2);
+    EXPECT_EQ(outcome.status, 1);
     EXPECT_EQ(outcome.err, "inventory: the output cannot be written\n");
 }
 

@@ -4,20 +4,25 @@
 #include <spdlog/sinks/stdout_color_sinks.h>
 #include <spdlog/spdlog.h>
 
+#include <csignal>
 #include <cstdlib>
+#include <fstream>
 #include <iostream>
 #include <tuple>
 
 #include "VXLog/RecordSink.h"
+#include "alerts.h"
+#include "comparing.h"
 #include "reading.h"
 #include "values.h"
+#include "watching.h"
 #include "writing.h"
 
 namespace {
 
 using namespace inventory;
 
-enum ExitStatus { EXIT_DONE = 0, EXIT_REFUSED = 1, EXIT_BAD_INPUT = 2 };
+enum ExitStatus { EXIT_DONE = 0, EXIT_REFUSED = 1, EXIT_DIFFERENT = 1, EXIT_BAD_INPUT = 2 };
 
 // The library's records go where the program's own go: to spdlog, and so to standard error.
 void connectLog()
@@ -69,47 +74,165 @@ ExitStatus change(const Nodes& nodes, const std::string& path, const std::string
     throw BadInput("no node has the path '" + path + "'");
 }
 
+// The options, and what remains of the command line.
+struct Request {
+    std::string file;
+    TreeForm form;
+    std::tuple<std::string, std::string, std::string> setting;
+    std::pair<std::string, std::string> sides;
+    std::string drawing;
+    std::string period;
+};
+
+Inventory readFrom(const std::string& file)
+{
+    try {
+        return readExport(readFile(file));
+    } catch (const BadInput& bad) {
+        throw BadInput(file + ": " + bad.what());
+    }
+}
+
+Inventory readHere()
+{
+    Inventory inventory = readThisMachine();
+    readSensors(inventory);
+    return inventory;
+}
+
+void describe(const Nodes& nodes, const TreeForm& form)
+{
+    writeTree(std::cout, nodes, form);
+    std::cout << '\n';
+    writeAlerts(std::cout, alertsOf(nodes), form.look);
+    std::cout << '\n';
+    writeSummary(std::cout, nodes);
+}
+
+ExitStatus compare(const std::string& before, const std::string& after)
+{
+    const Inventory old = readFrom(before);
+    const Inventory current = readFrom(after);
+    const auto changes = changesBetween(old.nodes, current.nodes);
+    if (changes.empty())
+        return EXIT_DONE;
+    std::cout << "--- " << printable(before) << "\n+++ " << printable(after) << '\n';
+    writeChanges(std::cout, changes, lookOfStandardOutput());
+    return EXIT_DIFFERENT;
+}
+
+ExitStatus draw(const Nodes& nodes, const std::string& name)
+{
+    std::ofstream file(name, std::ios::binary);
+    if (file)
+        writeSvg(file, nodes);
+    file.close();
+    if (file)
+        return EXIT_DONE;
+    std::cerr << "inventory: " << printable(name) << ": the drawing cannot be written\n";
+    return EXIT_REFUSED;
+}
+
+double secondsIn(const std::string& text)
+{
+    constexpr double fewest = 0.001;
+    constexpr double most = 1e9;
+    const auto seconds = realNumber(text);
+    if (!seconds || !(*seconds >= fewest && *seconds <= most))
+        throw BadInput("--watch: '" + text + "' is no number of seconds from 0.001 to 1000000000");
+    return *seconds;
+}
+
+// Of these options there may be one.
+void allowOne(const std::vector<const CLI::Option*>& options)
+{
+    const CLI::Option* given = nullptr;
+    for (const CLI::Option* option : options) {
+        if (option->count() == 0)
+            continue;
+        if (given != nullptr)
+            throw BadInput(given->get_name() + " and " + option->get_name() + " exclude each other");
+        given = option;
+    }
+}
+
+// What fails to be written is trouble, but for --diff, where status 1 says that something differs.
+int flushed(int status, ExitStatus failure)
+{
+    if (std::cout.flush())
+        return status;
+    std::cerr << "inventory: the output cannot be written\n";
+    return failure;
+}
+
 int run(int argc, char** argv)
 {
     CLI::App app("Describes this machine, or that of FILE, as nodes with numbered properties.", "inventory");
     app.footer(
-        "Exit status: 0; 1 if --set is refused; 2 for input that cannot be used.\n"
-        "Log records go to standard error; SPDLOG_LEVEL=trace shows all of them, SPDLOG_LEVEL=off none.");
+        "Examples:\n"
+        "  inventory                            this machine as a tree\n"
+        "  lstopo day1.xml                      keeps it, to be read or compared later\n"
+        "  inventory --properties day1.xml      all that is known of the machine of that file\n"
+        "  inventory --diff day1.xml day2.xml   what has changed since\n"
+        "  inventory --watch 10                 alerts, as changes happen\n"
+        "  inventory --json | jq '.nodes[].path'\n"
+        "  inventory --svg machine.svg && xdg-open machine.svg\n\n"
+        "Exit status: 0; 1 if --set is refused, --diff finds differences or the output cannot be written;\n"
+        "2 for options or input that cannot be used, and for --diff if the output cannot be written.\n"
+        "Log records go to standard error; SPDLOG_LEVEL=trace shows all of them, SPDLOG_LEVEL=off none.\n"
+        "On a terminal the tree is drawn with lines and colours; NO_COLOR=1 turns the colours off.");
     app.set_version_flag("--version", "inventory " INVENTORY_VERSION ", hwloc " HWLOC_VERSION);
-    std::string file;
-    auto* fileOption = app.add_option("FILE", file, "A machine as hwloc exports it (lstopo FILE.xml)");
-    TreeForm form;
-    app.add_flag("--log", form.own, "Write each node in its own text form, as a log shows it");
-    app.add_flag("--properties", form.withProperties,
-                 "Write the properties of each node: [number = value] name");
-    std::tuple<std::string, std::string, std::string> setting;
-    auto* set = app.add_option("--set", setting, "Change one property and write the outcome, nothing else");
-    set->type_name("PATH NUMBER TEXT");
+    Request request;
+    const auto* file =
+        app.add_option("FILE", request.file, "A machine as hwloc exports it (lstopo FILE.xml)");
+    const auto* log =
+        app.add_flag("--log", request.form.own, "Write each node in its own text form, as a log shows it");
+    const auto* properties = app.add_flag("--properties", request.form.withProperties,
+                                          "Write the properties of each node: [number = value] name");
+    const auto* set =
+        app.add_option("--set", request.setting, "Change one property and write the outcome, nothing else")
+            ->type_name("PATH NUMBER TEXT");
+    const auto* json = app.add_flag("--json",
+                                    "Write the nodes and their properties as JSON; a text that is not"
+                                    " UTF-8 becomes {\"hex\": \"fffe\"}");
+    const auto* svg = app.add_option("--svg", request.drawing, "Draw the nodes as nested boxes into OUTPUT")
+                          ->type_name("OUTPUT");
+    const auto* watching = app.add_option("--watch", request.period,
+                                          "Read again every SECONDS and write what changed, as alerts")
+                               ->type_name("SECONDS");
+    const auto* diff = app.add_option("--diff", request.sides, "Write what differs between two machines")
+                           ->type_name("BEFORE AFTER");
     try {
         app.parse(argc, argv);
     } catch (const CLI::Success& success) {  // --help, --version
-        return app.exit(success);
+        return flushed(app.exit(success), EXIT_REFUSED);
     }
+    for (const CLI::Option* form : {log, properties})
+        for (const CLI::Option* mode : {set, json, svg, watching, diff})
+            allowOne({form, mode});
+    allowOne({set, json, svg, watching, diff});
+    allowOne({diff, file});
 
-    Inventory inventory;
-    if (fileOption->count() == 0) {
-        inventory = readThisMachine();
-        readSensors(inventory);
-    } else {
-        try {
-            inventory = readExport(readFile(file));
-        } catch (const BadInput& bad) {
-            throw BadInput(file + ": " + bad.what());
-        }
+    if (diff->count() != 0)
+        return flushed(compare(request.sides.first, request.sides.second), EXIT_BAD_INPUT);
+    const auto read = [&] { return file->count() != 0 ? readFrom(request.file) : readHere(); };
+    request.form.look = lookOfStandardOutput();
+    if (watching->count() != 0) {
+        watch(read, secondsIn(request.period), std::cout, request.form.look);
+        return flushed(EXIT_DONE, EXIT_REFUSED);
     }
+    const Inventory inventory = read();
+    ExitStatus status = EXIT_DONE;
     if (set->count() != 0)
-        return change(inventory.nodes, std::get<0>(setting), std::get<1>(setting), std::get<2>(setting));
-    writeTree(std::cout, inventory.nodes, form);
-    std::cout << '\n';
-    writeAlerts(std::cout, alertsOf(inventory.nodes));
-    std::cout << '\n';
-    writeSummary(std::cout, inventory.nodes);
-    return EXIT_DONE;
+        status = std::apply([&](const auto&... words) { return change(inventory.nodes, words...); },
+                            request.setting);
+    else if (svg->count() != 0)
+        status = draw(inventory.nodes, request.drawing);
+    else if (json->count() != 0)
+        writeJson(std::cout, inventory.nodes);
+    else
+        describe(inventory.nodes, request.form);
+    return flushed(status, EXIT_REFUSED);
 }
 
 }  // namespace
@@ -118,12 +241,10 @@ int main(int argc, char** argv)
 {
     // hwloc tells what went wrong by what it returns; lines of its own would be one too many.
     setenv("HWLOC_HIDE_ERRORS", "2", 0);
+    std::signal(SIGPIPE, SIG_IGN);  // a closed pipe is an output that cannot be written
     try {
         connectLog();
-        const int status = run(argc, argv);
-        if (!std::cout.flush())
-            throw BadInput("the output cannot be written");
-        return status;
+        return run(argc, argv);
     } catch (const std::exception& error) {
         std::cerr << "inventory: " << printable(error.what()) << '\n';
         return EXIT_BAD_INPUT;

@@ -4,6 +4,7 @@
 #include <hwloc.h>
 
 #include <cstring>
+#include <memory>
 #include <string>
 #include <type_traits>
 #include <vector>
@@ -11,6 +12,8 @@
 #include "IC/Node.h"
 
 namespace inventory {
+
+using Nodes = std::vector<std::unique_ptr<IC::Node>>;
 
 // The numbers of the properties, from 1. The table of their names, in nodes.cpp, says what each holds.
 // clang-format off

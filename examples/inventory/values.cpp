@@ -121,6 +121,36 @@ std::string sizeInWords(ZQ::Uint64 bytes)
     return text;
 }
 
+std::string exactText(const IC::Number& number)
+{
+    if (number.getKind() != IC::Number::KIND_REAL)
+        return std::string(number);
+    char text[32];
+    char* const end = std::to_chars(text, text + sizeof text, number.operator double()).ptr;
+    return std::string(text, end);
+}
+
+std::string exactText(const IC::PropertyValue& value)
+{
+    if (value.getKind() == IC::PropertyValue::KIND_NUMBER)
+        return exactText(IC::Number(value));
+    if (value.getKind() != IC::PropertyValue::KIND_NUMBERARRAY)
+        return std::string(value);
+    std::string text;
+    for (const IC::Number& number : value.operator IC::NumberArray())
+        text += (text.empty() ? "" : ", ") + exactText(number);
+    return '{' + text + '}';
+}
+
+std::string kindName(const IC::PropertyValue& value)
+{
+    static const char* const kinds[] = {"unknown", "", "string", "bytes", "enum", "numbers", "strings"};
+    static const char* const numbers[] = {"no number", "bool",     "int",     "uint32",   "uint64", "real",
+                                          "nan",       "infinity", "version", "datetime", "noderef"};
+    return value.getKind() == IC::PropertyValue::KIND_NUMBER ? numbers[IC::Number(value).getKind()]
+                                                             : kinds[value.getKind()];
+}
+
 std::string printable(std::string_view text)
 {
     std::string out;

@@ -23,6 +23,13 @@ std::string told(std::string_view text);
 // "20 MiB", "119.7 GiB".
 std::string sizeInWords(ZQ::Uint64 bytes);
 
+// What tells a value from any other of its kind: its text, but reals with all their digits.
+std::string exactText(const IC::Number& number);
+std::string exactText(const IC::PropertyValue& value);
+
+// "uint32", "string": the kind of the value, or of the number that it holds.
+std::string kindName(const IC::PropertyValue& value);
+
 // On one line, and nothing that drives a terminal: what is not plain ASCII becomes \x and two digits a byte.
 // Exports hold nothing else; what does, was meant to do harm.
 std::string printable(std::string_view text);

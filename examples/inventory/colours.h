@@ -1,0 +1,16 @@
+// The colours of the sensor types.
+#pragma once
+
+#include "IC/Node.h"
+
+namespace inventory {
+
+struct Colour {
+    IC::Node::SensorType sensor;
+    const char* onTerminal;  // the parameters of the sequence that selects it
+    const char* fill;        // light: what is written on it is black
+};
+
+const Colour& colourOf(IC::Node::SensorType sensor);
+
+}  // namespace inventory

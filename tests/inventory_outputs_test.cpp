@@ -1,0 +1,540 @@
+// What the inventory writes: on a terminal, as JSON and as a drawing; its command line and its manual.
+#include <gmock/gmock.h>
+
+#include <cmath>
+#include <limits>
+#include <regex>
+#include <set>
+
+#include "colours.h"
+#include "inventory_run.h"
+#include "writing.h"
+
+namespace {
+
+using namespace inventory;
+using testing::HasSubstr;
+using testing::StartsWith;
+
+struct Made : IC::Node {
+    Made(SensorType sensor, const std::string& itsPath, const std::string& itsParent,
+         const std::string& itsDescription, const std::map<unsigned int, IC::PropertyValue>& its = {},
+         Status itsStatus = STATUS_FINE)
+        : Node(sensor)
+    {
+        path = itsPath;
+        parent = itsParent;
+        description = itsDescription;
+        properties = its;
+        status = static_cast<StatusType>(itsStatus);
+    }
+};
+
+// What a Python program prints that is given the file; it fails where the file is not what it reads.
+std::string readByPython(const std::string& program, const std::string& file)
+{
+    const Outcome outcome = runProgram({PYTHON, "-c", program, file});
+    EXPECT_EQ(outcome.status, 0) << outcome.err;
+    return outcome.out;
+}
+
+constexpr bool noRealMachines = std::string_view(IC_TEST_TOPOLOGIES).empty();
+constexpr const char* whyNone = "no folder with exports of real machines (CMake variable IC_TEST_TOPOLOGIES)";
+
+std::vector<std::string> realMachines()
+{
+    std::vector<std::string> files;
+    for (const auto& file : std::filesystem::directory_iterator(IC_TEST_TOPOLOGIES))
+        if (file.path().extension() == ".xml")
+            files.push_back(file.path());
+    return files;
+}
+
+class InventoryOutput : public testing::Test {
+protected:
+    // With the parser that lets through what XML forbids.
+    static Outcome run(std::vector<std::string> words)
+    {
+        words.insert(words.begin(), {"env", "HWLOC_LIBXML=0", INVENTORY_PROGRAM});
+        return runProgram(words);
+    }
+
+    static Outcome runOnTerminal(const std::string& environment, const std::string& words)
+    {
+        return runProgram(
+            {"script", "-qec",
+             "env -u NO_COLOR TERM=xterm " + environment + ' ' + INVENTORY_PROGRAM + ' ' + words,
+             "/dev/null"});
+    }
+
+    Folder folder;
+    std::string file = folder.write(
+        "machine.xml",
+        machineOf(fact("DMIProductName", "One"),
+                  "<object type=\"Misc\" subtype=\"MemoryModule\"/>"
+                  "<object type=\"PCIDev\" pci_busid=\"0000:01:00.0\" pci_type=\"0106 [8086:1d02]"
+                  " [0000:0000] 01\"><object type=\"OSDev\" osdev_type=\"0\" name=\"sda\"/></object>"));
+    std::string hostileText =
+        "\xff\xfe&quot;\x01\x1b[2J]]&gt;&lt;/text&gt;&amp;amp;'\x7f\xed\xa0\x80\xc3\xa4";
+    std::string hostile =
+        folder.write("hostile.xml",
+                     machineOf(fact("DMIProductName", hostileText) + fact(hostileText, hostileText)
+                                   + fact("UUID", "\xc3\xa4"),
+                               "<object type=\"OSDev\" osdev_type=\"2\" name=\"" + hostileText + "\">"
+                                   + fact("Address", hostileText) + "</object>"));
+};
+
+// --- Terminals ---
+
+TEST_F(InventoryOutput, HasColoursAndLinesOnATerminal)
+{
+    const Outcome outcome = runOnTerminal("LC_ALL=C.UTF-8", file);
+    EXPECT_EQ(outcome.status, 0);
+    EXPECT_THAT(outcome.out,
+                StartsWith("\x1b[1mComputer\x1b[0m machine: One, CPUs: 0, cores: 0\r\n"
+                           "├── \x1b[32mMemory Array\x1b[0m memory0\r\n"
+                           "├── \x1b[33mDisk Controller\x1b[0m storage-0000:01:00.0: 8086:1d02\r\n"
+                           "│   └── \x1b[33mHard Drive\x1b[0m sda\r\n"
+                           "└── \x1b[32mDIMM\x1b[0m dimm0\x1b[31m -- its size is unknown\x1b[0m\r\n"
+                           "\r\n"
+                           "Alerts: 1\r\n"
+                           "  \x1b[33m/machine/dimm0, DIMM: its size is unknown\x1b[0m\r\n"));
+}
+
+TEST_F(InventoryOutput, HasNoColoursWhereTheyAreTurnedOff)
+{
+    for (const char* setting : {"NO_COLOR=1", "TERM=dumb"}) {
+        SCOPED_TRACE(setting);
+        EXPECT_THAT(runOnTerminal(std::string("LC_ALL=C.UTF-8 ") + setting, file).out,
+                    StartsWith("Computer machine: One, CPUs: 0, cores: 0\r\n"
+                               "├── Memory Array memory0\r\n"
+                               "├── Disk Controller storage-0000:01:00.0: 8086:1d02\r\n"
+                               "│   └── Hard Drive sda\r\n"
+                               "└── DIMM dimm0 -- its size is unknown\r\n"
+                               "\r\n"
+                               "Alerts: 1\r\n"
+                               "  /machine/dimm0, DIMM: its size is unknown\r\n"));
+    }
+    EXPECT_THAT(runOnTerminal("LC_ALL=C.UTF-8 NO_COLOR=", file).out, StartsWith("\x1b[1mComputer"));
+}
+
+TEST_F(InventoryOutput, HasPlainLinesWhereTheTerminalIsNotUtf8)
+{
+    EXPECT_THAT(runOnTerminal("LC_ALL=C NO_COLOR=1", "--properties --log " + file).out,
+                testing::MatchesRegex("Node 2f6d616368696e65 : 40, status = 0\r\n"
+                                      "\\|     \\[1 = Computer:0\\] this node\r\n(.|\n)*"
+                                      "\\|-- Node 2f6d616368696e652f6d656d6f727930 : 32, status = 0\r\n"
+                                      "\\|         \\[1 = Memory Array:0\\] this node\r\n(.|\n)*"
+                                      "`-- Node [0-9a-f]* : 19, status = 3\r\n"
+                                      "          \\[1 = DIMM:0\\] this node\r\n(.|\n)*"));
+}
+
+TEST_F(InventoryOutput, IsPlainTextInAPipe)
+{
+    setenv("LC_ALL", "C.UTF-8", 1);
+    const Outcome outcome = run({file});
+    unsetenv("LC_ALL");
+    EXPECT_THAT(outcome.out,
+                StartsWith("Computer machine: One, CPUs: 0, cores: 0\n"
+                           "  Memory Array memory0\n"
+                           "  Disk Controller storage-0000:01:00.0: 8086:1d02\n"
+                           "    Hard Drive sda\n"
+                           "  DIMM dimm0 -- its size is unknown\n"
+                           "\n"
+                           "Alerts: 1\n"
+                           "  /machine/dimm0, DIMM: its size is unknown\n"));
+}
+
+TEST_F(InventoryOutput, HasChangesInColoursOnATerminal)
+{
+    const std::string other = folder.write("other.xml", machineOf(fact("DMIProductName", "Two")));
+    const Outcome outcome = runOnTerminal("LC_ALL=C", "--diff " + file + ' ' + other);
+    EXPECT_EQ(outcome.status, 1);
+    EXPECT_THAT(outcome.out,
+                HasSubstr("  Computer /machine\r\n"
+                          "\x1b[31m-   [12 = One] model\x1b[0m\r\n"
+                          "\x1b[32m+   [12 = Two] model\x1b[0m\r\n"));
+}
+
+// --- JSON ---
+
+TEST(InventoryJson, HasAValueForEachKind)
+{
+    const double infinity = std::numeric_limits<double>::infinity();
+    const IC::PropertyValue values[] = {
+        IC::PropertyValue("a\"\\\n\xc3\xa4", true),
+        IC::PropertyValue("\xff\xfe"),
+        IC::PropertyValue(std::string("\0\x1b", 2)),
+        IC::Number(true),
+        IC::Number(-1),
+        IC::Number(4294967295u),
+        IC::Number(18446744073709551615ull),
+        IC::Number(0.1),
+        IC::Number(-infinity),
+        IC::Number(IC::Number::KIND_NAN),
+        IC::Number(IC::Version2 {6, 17}),
+        IC::Number(60L, 0),
+        IC::Number(IC::NodeRef {4, 2}),
+        IC::Buffer {0x84, 0x0f},
+        IC::EnumValue(3u),
+        IC::NumberArray {1u, -2, 0.5},
+        IC::StringArray {"x", "\x80"},
+        IC::PropertyValue(IC::PropertyValue::KIND_UNKNOWN),
+    };
+    std::map<unsigned int, IC::PropertyValue> properties;
+    for (const IC::PropertyValue& value : values)
+        properties.insert({static_cast<unsigned int>(properties.size()) + 1, value});
+    Nodes nodes;
+    nodes.push_back(
+        std::make_unique<Made>(IC::Node::SENSOR_FAN, "/fan", "", "\xe9t\xe9", properties, STATUS_ALARM));
+    std::ostringstream out;
+    writeJson(out, nodes);
+    const Folder folder;
+    EXPECT_EQ(readByPython("import json, sys\n"
+                           "node = json.load(open(sys.argv[1], 'rb'))['nodes'][0]\n"
+                           "properties = node.pop('properties')\n"
+                           "print(ascii(node))\n"
+                           "for one in properties: print(one['number'], one['readOnly'], one['kind'], "
+                           "ascii(one['value']))\n",
+                           folder.write("made.json", out.str())),
+              "{'path': '/fan', 'parent': '', 'sensorType': 20, 'sensorName': 'Fan', 'status': 5, "
+              "'description': {'hex': 'e974e9'}}\n"
+              "1 True string 'a\"\\\\\\n\\xe4'\n"
+              "2 False string {'hex': 'fffe'}\n"
+              "3 False string '\\x00\\x1b'\n"
+              "4 False bool True\n"
+              "5 False int -1\n"
+              "6 False uint32 4294967295\n"
+              "7 False uint64 18446744073709551615\n"
+              "8 False real 0.1\n"
+              "9 False real '-inf'\n"
+              "10 False nan None\n"
+              "11 False version '6.17'\n"
+              "12 False datetime '1970-01-01T00:01:00Z'\n"
+              "13 False noderef {'sensorType': 4, 'id': 2}\n"
+              "14 False bytes '840f'\n"
+              "15 False enum 3\n"
+              "16 False numbers [1, -2, 0.5]\n"
+              "17 False strings ['x', {'hex': '80'}]\n"
+              "18 False unknown None\n");
+}
+
+TEST(InventoryJson, IsWrittenLikeThis)
+{
+    Nodes nodes;
+    nodes.push_back(std::make_unique<Made>(IC::Node::SENSOR_FAN, "/fan", "", "slow",
+                                           std::map<unsigned int, IC::PropertyValue> {{KEY_MODEL, "X"}}));
+    std::ostringstream out;
+    writeJson(out, nodes);
+    EXPECT_EQ(out.str(), R"({
+  "nodes": [
+    {
+      "path": "/fan",
+      "parent": "",
+      "sensorType": 20,
+      "sensorName": "Fan",
+      "status": 0,
+      "description": "slow",
+      "properties": [
+        {
+          "number": 12,
+          "name": "model",
+          "kind": "string",
+          "readOnly": false,
+          "value": "X"
+        }
+      ]
+    }
+  ]
+}
+)");
+}
+
+constexpr const char* countNodes =
+    "import json, sys\n"
+    "nodes = json.load(open(sys.argv[1], encoding='utf-8'))['nodes']\n"
+    "print('Nodes: %d, properties: %d' % (len(nodes), sum(len(node['properties'])"
+    " for node in nodes)))\n";
+
+TEST_F(InventoryOutput, IsValidJsonForEveryMachine)
+{
+    if (noRealMachines)
+        GTEST_SKIP() << whyNone;
+    for (const std::string& machine : realMachines()) {
+        SCOPED_TRACE(machine);
+        const Outcome outcome = run({"--json", machine});
+        EXPECT_EQ(outcome.status, 0) << outcome.err;
+        std::size_t nodes = 0;
+        std::size_t properties = 0;
+        for (const std::string& line : linesOf(run({"--properties", machine}).out)) {
+            const bool isProperty =
+                line.find_first_not_of(' ') != std::string::npos && line[line.find_first_not_of(' ')] == '[';
+            properties += isProperty ? 1 : 0;
+            if (line.compare(0, 7, "Nodes: ") == 0)
+                nodes = std::stoul(line.substr(7));
+        }
+        EXPECT_EQ(readByPython(countNodes, folder.write("machine.json", outcome.out)),
+                  "Nodes: " + std::to_string(nodes) + ", properties: " + std::to_string(properties) + '\n');
+    }
+}
+
+TEST_F(InventoryOutput, IsValidJsonForBytesThatAreNoText)
+{
+    const Outcome outcome = run({"--json", hostile});
+    EXPECT_EQ(outcome.status, 0) << outcome.err;
+    EXPECT_EQ(readByPython(
+                  "import json, sys\n"
+                  "nodes = json.load(open(sys.argv[1], encoding='utf-8'))['nodes']\n"
+                  "print([one['value'] for one in nodes[0]['properties'] if one['name'] == 'model'])\n"
+                  "print([ascii(one['value']) for one in nodes[0]['properties'] if one['name'] == 'UUID'])\n"
+                  "print(nodes[2]['description'])\n",
+                  folder.write("hostile.json", outcome.out)),
+              "[{'hex': 'fffe22011b5b324a5d5d3e3c2f746578743e26616d703b277feda080c3a4'}]\n"
+              "[\"'\\\\xe4'\"]\n"
+              "{'hex': 'fffe22011b5b324a5d5d3e3c2f746578743e26616d703b277feda080c3a4'}\n");
+}
+
+TEST_F(InventoryOutput, IsNoJsonWhereItWasNotBuiltIn)
+{
+    const Outcome outcome = runProgram({INVENTORY_WITHOUT_JSON, "--json", file});
+    EXPECT_EQ(outcome.status, 2);
+    EXPECT_EQ(outcome.out, "");
+    EXPECT_EQ(outcome.err, "inventory: --json: this program was built without nlohmann-json3-dev\n");
+    EXPECT_EQ(runProgram({INVENTORY_WITHOUT_JSON, file}).status, 0);
+}
+
+// --- The drawing ---
+
+// Each box lies in the one around it and beside its siblings, and each text in its box; prints how many boxes there
+// are and of how many colours. What a text is wide is what a browser makes of 11 pixels of a font of one width.
+constexpr const char* measure = R"(
+import re, sys
+import xml.etree.ElementTree as tree
+svg = '{http://www.w3.org/2000/svg}'
+root = tree.parse(sys.argv[1]).getroot()
+fills = set()
+count = 0
+
+def box(group):
+    rectangle = group.find(svg + 'rect')
+    x, y = map(int, re.fullmatch(r'translate\((\d+),(\d+)\)', group.get('transform')).groups())
+    return x, y, x + int(rectangle.get('width')), y + int(rectangle.get('height'))
+
+def check(groups, width, height):
+    global count
+    boxes = [box(group) for group in groups]
+    for i, (left, top, right, bottom) in enumerate(boxes):
+        assert 0 <= left < right <= width and 0 <= top < bottom <= height, (boxes[i], width, height)
+        for other in boxes[:i]:
+            assert right < other[0] or other[2] < left or bottom < other[1] or other[3] < top, (boxes[i], other)
+    for group, (left, top, right, bottom) in zip(groups, boxes):
+        count += 1
+        fills.add(group.find(svg + 'rect').get('fill'))
+        assert group.find(svg + 'title').text
+        for text in group.findall(svg + 'text'):
+            assert int(text.get('x')) + 6.7 * len(text.text) <= right - left, text.text
+            assert int(text.get('y')) < bottom - top
+        check(group.findall(svg + 'g'), right - left, bottom - top)
+
+legend = root.findall(svg + "g[@class='legend']")
+page = [group for group in root.findall(svg + 'g') if group not in legend]
+assert len(page) == 1
+top = int(re.fullmatch(r'translate\(0,(\d+)\)', page[0].get('transform')).group(1))
+check(page[0].findall(svg + 'g'), int(root.get('width')), int(root.get('height')) - top)
+assert fills == {entry.find(svg + 'rect').get('fill') for entry in legend}
+print('boxes: %d, colours: %d' % (count, len(legend)))
+)";
+
+class InventoryDrawing : public InventoryOutput {
+protected:
+    std::string draw(const std::string& machine) const
+    {
+        const Outcome outcome = run({"--svg", folder.path("machine.svg"), machine});
+        EXPECT_EQ(outcome.status, 0) << outcome.err;
+        EXPECT_EQ(outcome.out, "");
+        return folder.path("machine.svg");
+    }
+};
+
+TEST_F(InventoryDrawing, HasABoxInABoxForEachNode)
+{
+    Nodes nodes;
+    nodes.push_back(std::make_unique<Made>(IC::Node::SENSOR_CPU, "/cpu", "", "a<b"));
+    nodes.push_back(std::make_unique<Made>(IC::Node::SENSOR_FAN, "/cpu/fan", "/cpu", "\"x\" & \xff",
+                                           std::map<unsigned int, IC::PropertyValue> {}, STATUS_ALARM));
+    std::ostringstream out;
+    writeSvg(out, nodes);
+    EXPECT_EQ(out.str(), R"svg(<?xml version="1.0" encoding="UTF-8"?>
+<svg xmlns="http://www.w3.org/2000/svg" width="560" height="105" viewBox="0 0 560 105">
+<title>Inventory</title>
+<style>text { font: 11px monospace; fill: #000 } .name { font-weight: bold }
+rect { stroke: #555 } .page { stroke: none } .trouble { stroke: #c00; stroke-width: 3 }</style>
+<rect width="560" height="105" fill="#fff" class="page"/>
+<g class="legend" transform="translate(5,5)">
+<rect width="12" height="12" fill="#c6e0f5"/>
+<text x="17" y="11">CPU</text>
+</g>
+<g class="legend" transform="translate(187,5)">
+<rect width="12" height="12" fill="#bff3f7"/>
+<text x="17" y="11">Fan</text>
+</g>
+<g transform="translate(0,25)">
+<g transform="translate(5,0)">
+<title>CPU cpu: a&lt;b</title>
+<rect width="90" height="75" fill="#c6e0f5"/>
+<text x="5" y="13" class="name">cpu</text>
+<text x="5" y="28">a&lt;b</text>
+<g transform="translate(5,35)">
+<title>Fan fan: "x" &amp; \xff -- it raises an alarm</title>
+<rect width="80" height="35" fill="#bff3f7" class="trouble"/>
+<text x="5" y="13" class="name">fan</text>
+<text x="5" y="28">"x" &amp; \xff</text>
+</g>
+</g>
+</g>
+</svg>
+)svg");
+}
+
+TEST_F(InventoryDrawing, IsValidAndLegibleForEveryMachine)
+{
+    if (noRealMachines)
+        GTEST_SKIP() << whyNone;
+    for (const std::string& machine : realMachines()) {
+        SCOPED_TRACE(machine);
+        std::string nodes;
+        for (const std::string& line : linesOf(run({machine}).out))
+            if (line.compare(0, 7, "Nodes: ") == 0)
+                nodes = line;
+        EXPECT_EQ(readByPython(measure, draw(machine)),
+                  std::regex_replace(nodes, std::regex("Nodes: (.*), sensor types: (.*)"),
+                                     "boxes: $1, colours: $2\n"));
+    }
+}
+
+TEST_F(InventoryDrawing, IsValidForBytesThatAreNoText)
+{
+    EXPECT_EQ(readByPython(measure, draw(hostile)), "boxes: 3, colours: 3\n");
+}
+
+TEST_F(InventoryDrawing, HasAColourOfItsOwnForEachSensorTypeThatBlackIsReadOn)
+{
+    // As WCAG defines the contrast; 7 is its highest demand.
+    const auto contrastToBlack = [](const std::string& fill) {
+        const double weights[] = {0.2126, 0.7152, 0.0722};
+        double luminance = 0;
+        for (std::size_t i = 0; i < 3; ++i) {
+            const double part = std::stoi(fill.substr(1 + 2 * i, 2), nullptr, 16) / 255.0;
+            luminance +=
+                weights[i] * (part <= 0.04045 ? part / 12.92 : std::pow((part + 0.055) / 1.055, 2.4));
+        }
+        return (luminance + 0.05) / 0.05;
+    };
+    std::set<std::string> fills;
+    for (unsigned int sensor = 0; sensor <= IC::Node::SENSOR_LARGEST; ++sensor) {
+        const Colour& colour = colourOf(static_cast<IC::Node::SensorType>(sensor));
+        EXPECT_GE(contrastToBlack(colour.fill), 7) << IC::pst[sensor];
+        const bool isShared = colour.sensor == IC::Node::SENSOR_UNKNOWN;
+        EXPECT_TRUE(isShared || fills.insert(colour.fill).second) << IC::pst[sensor];
+    }
+    EXPECT_EQ(fills.size(), 27u);
+}
+
+TEST_F(InventoryDrawing, IsNotBegunWhereTheMachineCannotBeRead)
+{
+    const Outcome outcome = run({"--svg", folder.path("new.svg"), folder.path("missing.xml")});
+    EXPECT_EQ(outcome.status, 2);
+    EXPECT_FALSE(std::filesystem::exists(folder.path("new.svg")));
+}
+
+TEST_F(InventoryDrawing, FailsWhereItCannotBeWritten)
+{
+    for (const std::string& drawing : {std::string("/dev/full"), folder.path("missing/machine.svg")}) {
+        const Outcome outcome = run({file, "--svg", drawing});
+        EXPECT_EQ(outcome.status, 1);
+        EXPECT_EQ(outcome.out, "");
+        EXPECT_EQ(outcome.err, "inventory: " + drawing + ": the drawing cannot be written\n");
+    }
+}
+
+// --- The command line and the manual ---
+
+TEST_F(InventoryOutput, IsNoneForOptionsThatCannotBeUsed)
+{
+    const struct {
+        std::vector<std::string> words;
+        std::string told;
+    } rows[] = {
+        {{"--jsonn"}, "--jsonn"},
+        {{"-x"}, "-x"},
+        {{"--svg"}, "--svg"},
+        {{"--watch"}, "--watch"},
+        {{"--diff"}, "--diff"},
+        {{"--diff", file}, "--diff"},
+        {{"--set", "/machine", "4"}, "--set"},
+        {{file, "--json", "--svg", "x"}, "--json and --svg exclude each other"},
+        {{file, "--json", "--watch", "1"}, "--json and --watch exclude each other"},
+        {{file, "--svg", "x", "--watch", "1"}, "--svg and --watch exclude each other"},
+        {{"--diff", file, file, "--json"}, "--json and --diff exclude each other"},
+        {{"--diff", file, file, "--watch", "1"}, "--watch and --diff exclude each other"},
+        {{file, "--set", "/machine", "4", "x", "--json"}, "--set and --json exclude each other"},
+        {{file, "--set", "/machine", "4", "x", "--log"}, "--log and --set exclude each other"},
+        {{file, "--json", "--properties"}, "--properties and --json exclude each other"},
+        {{file, "--json", "--log"}, "--log and --json exclude each other"},
+        {{"--diff", file, file, file}, "--diff and FILE exclude each other"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.told);
+        const Outcome outcome = run(row.words);
+        EXPECT_EQ(outcome.status, 2);
+        EXPECT_EQ(outcome.out, "");
+        EXPECT_EQ(linesOf(outcome.err).size(), 1u) << outcome.err;
+        EXPECT_THAT(outcome.err, StartsWith("inventory: "));
+        EXPECT_THAT(outcome.err, HasSubstr(row.told));
+    }
+    EXPECT_FALSE(std::filesystem::exists("x"));
+}
+
+TEST_F(InventoryOutput, FailsWhereItCannotBeWritten)
+{
+    for (const std::string& words :
+         {file, "--json " + file, std::string("--help"), std::string("--version")}) {
+        SCOPED_TRACE(words);
+        const Outcome full = runProgram({"sh", "-c", INVENTORY_PROGRAM " " + words + " >/dev/full"});
+        EXPECT_EQ(full.status, 1);
+        EXPECT_EQ(full.err, "inventory: the output cannot be written\n");
+    }
+    const Outcome closed = runProgram({PYTHON, "-c",
+                                       "import os, subprocess, sys\n"
+                                       "reader, writer = os.pipe()\n"
+                                       "os.close(reader)\n"
+                                       "sys.exit(subprocess.run(sys.argv[1:], stdout=writer).returncode)\n",
+                                       INVENTORY_PROGRAM, file});
+    EXPECT_EQ(closed.status, 1);
+    EXPECT_EQ(closed.err, "inventory: the output cannot be written\n");
+}
+
+// The long options in a text, where `mark` stands before each.
+std::set<std::string> optionsIn(const std::string& text, const std::string& mark)
+{
+    const std::regex option(mark + "([a-z]+)");
+    std::set<std::string> options;
+    for (std::sregex_iterator found(text.begin(), text.end(), option); found != std::sregex_iterator();
+         ++found)
+        options.insert((*found)[1]);
+    return options;
+}
+
+TEST_F(InventoryOutput, HasTheSameOptionsInItsHelpAndInItsManual)
+{
+    const std::string help = run({"--help"}).out;
+    const std::string manual = contentOf(INVENTORY_MANUAL);
+    const std::set<std::string> expected {"diff", "help", "json",    "log",  "properties",
+                                          "set",  "svg",  "version", "watch"};
+    EXPECT_EQ(optionsIn(help, "--"), expected);
+    EXPECT_EQ(optionsIn(manual, "\n\\.It Fl (?:h , )?-"), expected);
+    EXPECT_EQ(optionsIn(manual.substr(manual.find(".Sh EXAMPLES")), "--"),
+              (std::set<std::string> {"diff", "json", "properties", "set", "svg", "watch"}));
+}
+
+}  // namespace
