@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <iosfwd>
 #include <string>
 #include <type_traits>
@@ -79,5 +80,19 @@ bool operator>=(const EnumValue& a, const EnumValue& b);
 std::ostream& operator<<(std::ostream& out, const EnumValue& value);
 
 }  // namespace IC
+
+namespace std {
+
+/// For std::unordered_set and its like.
+template <>
+struct __attribute__((visibility("default"))) hash<IC::EnumValue> {
+    /// The hash of the value as an unsigned number. It needs no memory.
+    std::size_t operator()(const IC::EnumValue& value) const noexcept
+    {
+        return std::hash<unsigned int>()(value.operator unsigned int());
+    }
+};
+
+}  // namespace std
 
 #pragma GCC visibility pop

@@ -24,7 +24,18 @@ namespace IC::detail {
 class Text;
 void append(Text& text, const Number& number);
 void append(Text& text, const std::vector<Number>& numbers);
+
+// The hash of what came before and of what comes next. The factor is odd, so that nothing of the former is lost.
+constexpr std::size_t combinedHash(std::size_t before, std::size_t next) noexcept
+{
+    return before * static_cast<std::size_t>(0x9E3779B97F4A7C15u) + next;
+}
 }  // namespace IC::detail
+
+namespace std {
+template <>
+struct hash<IC::Number>;
+}
 
 #pragma GCC visibility push(default)
 
@@ -228,10 +239,11 @@ public:
     operator std::string() const;
 
 private:
-    // Comparisons and text read the value as its kind says.
+    // Comparisons, hash and text read the value as its kind says.
     friend bool operator==(const Number& a, const Number& b);
     friend bool operator<(const Number& a, const Number& b);
     friend bool operator>(const Number& a, const Number& b);
+    friend struct std::hash<Number>;
     friend void detail::append(detail::Text& text, const Number& number);
     friend void detail::append(detail::Text& text, const std::vector<Number>& numbers);
 
@@ -361,6 +373,49 @@ bool operator>=(const Number& a, const Number& b);
 std::ostream& operator<<(std::ostream& out, const Number& number);
 
 }  // namespace IC
+
+namespace std {
+
+/// For std::unordered_set and its like. It agrees with ==, so that signed numbers all have one hash, node
+/// references have one, and a date-time's scope is left out. It needs no memory.
+template <>
+struct __attribute__((visibility("default"))) hash<IC::Number> {
+    /// The hash of the kind and of what == compares.
+    std::size_t operator()(const IC::Number& number) const noexcept
+    {
+        return IC::detail::combinedHash(number.kind_, contentHash(number));
+    }
+
+private:
+    static std::size_t contentHash(const IC::Number& number) noexcept
+    {
+        using IC::Number;
+        switch (ZQ::Uint32 {number.kind_}) {
+        case Number::KIND_BOOL:
+            return number.load<ZQ::Uint8>();
+        case Number::KIND_UINT32:
+            return number.load<ZQ::Uint32>();
+        case Number::KIND_UINT64: {
+            const auto integer = number.load<ZQ::Uint64>();
+            return static_cast<std::size_t>(integer ^ integer >> 32);  // a hash may have but 32 bits
+        }
+        case Number::KIND_REAL:
+            return std::hash<ZQ::Real64>()(number.load<ZQ::Real64>());
+        case Number::KIND_VERSION: {
+            const auto version = number.load<IC::Version2>();
+            return version.major * 256u + version.minor;
+        }
+        case Number::KIND_DATETIME: {
+            const auto time = number.load<Number::DateTimeFields>();
+            return IC::detail::combinedHash(std::hash<long>()(time.seconds), time.milliseconds);
+        }
+        default:
+            return 0;  // two of such a kind are equal
+        }
+    }
+};
+
+}  // namespace std
 
 #pragma GCC visibility pop
 

@@ -1,8 +1,10 @@
 #pragma once
 
+#include <cstddef>
 #include <iosfwd>
 #include <map>
 #include <string>
+#include <string_view>
 #include <type_traits>
 #include <utility>
 #include <vector>
@@ -10,6 +12,14 @@
 #include "IC/EnumValue.h"
 #include "IC/Number.h"
 #include "ZQ/Types.h"
+
+namespace IC {
+class PropertyValue;
+}
+namespace std {
+template <>
+struct hash<IC::PropertyValue>;
+}
 
 #pragma GCC visibility push(default)
 
@@ -288,6 +298,7 @@ private:
     friend bool operator==(const PropertyValue& a, const PropertyValue& b);
     friend bool operator<(const PropertyValue& a, const PropertyValue& b);
     friend bool operator>(const PropertyValue& a, const PropertyValue& b);
+    friend struct std::hash<PropertyValue>;
 
     // Takes over the object.
     PropertyValue(void* object, KindType kind, const bool& readOnly) noexcept
@@ -423,5 +434,54 @@ std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, Proper
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties);
 
 }  // namespace IC
+
+namespace std {
+
+/// For std::unordered_map and its like. It agrees with ==, so that the read-only mark is left out and numbers,
+/// also those in arrays, are hashed as Number's own == compares them. It needs no memory.
+template <>
+struct __attribute__((visibility("default"))) hash<IC::PropertyValue> {
+    /// The hash of the kind and of what == compares.
+    std::size_t operator()(const IC::PropertyValue& value) const noexcept
+    {
+        return IC::detail::combinedHash(value.kind_, contentHash(value));
+    }
+
+private:
+    static std::size_t contentHash(const IC::PropertyValue& value) noexcept
+    {
+        using Value = IC::PropertyValue;
+        switch (ZQ::Uint32 {value.kind_}) {
+        case Value::KIND_NUMBER:
+            return std::hash<IC::Number>()(value.object<IC::Number>());
+        case Value::KIND_STRING:
+            return std::hash<std::string>()(value.object<std::string>());
+        case Value::KIND_BUFFER: {
+            const auto& bytes = value.object<IC::Buffer>();
+            const auto* const first = reinterpret_cast<const char*>(bytes.data());
+            return std::hash<std::string_view>()(std::string_view(first, bytes.size()));
+        }
+        case Value::KIND_ENUMVALUE:
+            return std::hash<IC::EnumValue>()(value.object<IC::EnumValue>());
+        case Value::KIND_NUMBERARRAY:
+            return elementsHash(value.object<IC::NumberArray>());
+        case Value::KIND_STRINGARRAY:
+            return elementsHash(value.object<IC::StringArray>());
+        default:
+            return 0;  // KIND_UNKNOWN, and where a refused setKind left no object
+        }
+    }
+
+    template <class Element>
+    static std::size_t elementsHash(const std::vector<Element>& elements) noexcept
+    {
+        std::size_t hash = elements.size();
+        for (const Element& element : elements)
+            hash = IC::detail::combinedHash(hash, std::hash<Element>()(element));
+        return hash;
+    }
+};
+
+}  // namespace std
 
 #pragma GCC visibility pop
