@@ -1,0 +1,74 @@
+#pragma once
+
+#include <version>
+
+#if !defined(__cpp_lib_format)
+#error "IC/format.h needs C++20 and a standard library that has <format>; IC/fmt.h needs neither"
+#else
+
+#include <concepts>
+#include <format>
+#include <string>
+#include <string_view>
+
+#include "IC/Alert.h"
+#include "IC/EnumValue.h"
+#include "IC/Error.h"
+#include "IC/Node.h"
+#include "IC/Number.h"
+#include "IC/Property.h"
+
+namespace IC::detail {
+
+// The base is private, because what quotes the texts of a range would quote these, too.
+template <class Value>
+class FormatText : std::formatter<std::string_view> {
+    using Base = std::formatter<std::string_view>;
+
+public:
+    using Base::parse;
+
+    template <class Context>
+    auto format(const Value& value, Context& context) const
+    {
+        return Base::format(value.operator std::string(), context);
+    }
+};
+
+}  // namespace IC::detail
+
+namespace std {
+
+///@{
+/// For programs that format with std::format; no other header includes this one. Each class formats as its text, with
+/// what std::format offers for texts: fill, alignment, width and precision. It throws what the text throws.
+///
+///     std::cout << std::format("speed {:>6}\n", IC::Number(3600u));   // speed   3600
+///
+/// Where there is no `<format>`, including it is an error, so that nothing is missed in silence. Ask for
+/// __cpp_lib_format first, or take IC/fmt.h.
+template <>
+struct formatter<IC::Number> : IC::detail::FormatText<IC::Number> {
+};
+template <>
+struct formatter<IC::EnumValue> : IC::detail::FormatText<IC::EnumValue> {
+};
+template <>
+struct formatter<IC::PropertyValue> : IC::detail::FormatText<IC::PropertyValue> {
+};
+template <>
+struct formatter<IC::Error> : IC::detail::FormatText<IC::Error> {
+};
+template <>
+struct formatter<IC::Alert> : IC::detail::FormatText<IC::Alert> {
+};
+///@}
+
+/// Formats the text of a node, as its class writes it.
+template <std::derived_from<IC::Node> T>
+struct formatter<T> : IC::detail::FormatText<IC::Node> {
+};
+
+}  // namespace std
+
+#endif
