@@ -10,8 +10,10 @@ function(ic_harden target)
         $<$<BOOL:${IC_HAS_STACK_CLASH_PROTECTION}>:-fstack-clash-protection>
         $<$<BOOL:${IC_HAS_CONTROL_FLOW_PROTECTION}>:-fcf-protection>)
     target_link_options(${target} PRIVATE LINKER:-z,relro LINKER:-z,now LINKER:-z,noexecstack)
-    # A sanitizer checks buffers itself, and its run-time library is not linked to the library.
-    if(NOT CMAKE_CXX_FLAGS MATCHES "-fsanitize")
+    # A sanitizer checks buffers itself, and its run-time library is not linked to the library. It may come with the
+    # flags, or with the options of a project that includes this one.
+    get_directory_property(inherited COMPILE_OPTIONS)
+    if(NOT "${CMAKE_CXX_FLAGS};${inherited}" MATCHES "-fsanitize")
         # Some compilers define it themselves; without optimisation it would only warn.
         set(optimised $<CONFIG:Release,RelWithDebInfo,MinSizeRel>)
         target_compile_options(${target} PRIVATE
