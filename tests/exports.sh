@@ -1,7 +1,8 @@
 #!/bin/sh
-# Fails unless the library given exports its public names and nothing else.
+# Fails unless the library given exports its public names and nothing else: exports.sh LIBRARY INCLUDE-FOLDER
 set -eu
 library=$1
+include=$2
 [ -f "$library" ] || { echo "no library $library" >&2; exit 1; }
 
 exported=$(nm --dynamic --defined-only --demangle --format=posix "$library" | sed 's/ [A-Za-z] [0-9a-f]* *[0-9a-f]*$//')
@@ -10,6 +11,12 @@ status=0
 # What must not be there: other namespaces, and the library's own inside.
 foreign=$(echo "$exported" | grep -vE '^((typeinfo|typeinfo name|vtable) for )?IC::' || true)
 inside=$(echo "$exported" | grep -E 'IC::detail|logger' || true)
+# And what no header declares, though it is in the namespace. The operators' names are those of types.
+names=$(echo "$exported" | sed 's/\[abi:cxx11\]//g; s/(.*//; s/^.* for //' | grep -v operator | sed 's/.*::~*//' | sort -u)
+[ -n "$names" ] || { echo "$library exports nothing" >&2; exit 1; }
+for name in $names; do
+    grep -qrw "$name" "$include" || inside="$inside $name"
+done
 if [ -n "$foreign$inside" ]; then
     echo "exported, but not public:" "$foreign" "$inside" >&2
     status=1
