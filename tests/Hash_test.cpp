@@ -17,7 +17,7 @@
 #include "IC/Number.h"
 #include "IC/Property.h"
 #include "PropertySamples.h"
-#include "Refusal.h"
+#include "observe/Refusal.h"
 
 namespace {
 
