@@ -1547,6 +1547,20 @@ TEST(NumberText, OfAnIntegerHasEveryDigitAtEveryLength)
     }
 }
 
+TEST(NumberText, OfARealHasSixSignificantDigitsHoweverSmallItIs)
+{
+    EXPECT_EQ(std::string(Number(0.000123456)), "0.000123456");
+    EXPECT_EQ(std::string(Number(0.0123456)), "0.0123456");
+    EXPECT_EQ(std::string(Number(0.0001)), "0.0001");
+}
+
+TEST(NumberText, OfAnotherKindReadsTheBytesAsThatKind)
+{
+    Number number(0x0000000700000009ull);
+    number.setKind(Number::KIND_UINT32);
+    EXPECT_EQ(std::string(number), littleEndian ? "9" : "7");
+}
+
 TEST(NumberText, OfADateTimeWithTheLastMillisecondDigitNotZeroSaysThatTheConversionFailed)
 {
     for (unsigned int digit = 1; digit <= 9; ++digit) {

@@ -437,10 +437,22 @@ TEST(PropertyText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
     EXPECT_EQ(number(Number(12345.0)).operator std::string(), "12,345");
     EXPECT_EQ(PropertyValue(EnumValue(4294967295u)).operator std::string(), "4,294,967,295");
     EXPECT_EQ(numbers({Number(1000ull), Number(999u)}).operator std::string(), "{1,000, 999}");
+    EXPECT_EQ(numbers({Number(1000u), Number(1000000u)}).operator std::string(), "{1,000, 1,000,000}");
     EXPECT_EQ(number(Number(IC::sNodeRef {4, 1234})).operator std::string(), "CPU:1,234");
     EXPECT_EQ(text("1234567").operator std::string(), "1234567");
     EXPECT_EQ(texts({"1234567"}).operator std::string(), "{\"1234567\"}");
     EXPECT_EQ(bytes({0x12, 0x34, 0x56, 0x78, 0x90}).operator std::string(), "12345678 90");
+}
+
+TEST(PropertyText, OfManyNumbersIsWholeHoweverLongItBecomes)
+{
+    NumberArray all;
+    std::string expected = "{";
+    for (int i = 0; i < 1000; ++i) {
+        all.push_back(Number(i));  // signed numbers are written one by one
+        expected.append(i == 0 ? "" : ", ").append(std::to_string(i));
+    }
+    EXPECT_EQ(numbers(all).operator std::string(), expected.append("}"));
 }
 
 TEST(PropertyText, IsWholeOrNotAtAllWhenMemoryRunsOut)
