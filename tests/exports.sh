@@ -8,11 +8,15 @@ include=$2
 exported=$(nm --dynamic --defined-only --demangle --format=posix "$library" | sed 's/ [A-Za-z] [0-9a-f]* *[0-9a-f]*$//')
 status=0
 
-# What must not be there: other namespaces, and the library's own inside.
-foreign=$(echo "$exported" | grep -vE '^((typeinfo|typeinfo name|vtable) for )?IC::' || true)
+# What must not be there: other namespaces, also behind a type of this one that a template returns, and the library's
+# own inside.
+foreign=$(echo "$exported" |
+    grep -vE '^IC::(([A-Za-z0-9]+::)*operator|(~?[A-Za-z0-9]+(::|\[abi:cxx11\])?)+(\(|$))' |
+    grep -vE '^(typeinfo|typeinfo name|vtable) for IC::[A-Za-z0-9]+$' || true)
 inside=$(echo "$exported" | grep -E 'IC::detail|logger' || true)
 # And what no header declares, though it is in the namespace. The operators' names are those of types.
-names=$(echo "$exported" | sed 's/\[abi:cxx11\]//g; s/(.*//; s/^.* for //' | grep -v operator | sed 's/.*::~*//' | sort -u)
+names=$(echo "$exported" | sed 's/\[abi:cxx11\]//g; s/(.*//; s/^.* for //' | grep -E '^IC::[A-Za-z0-9:~]*$' |
+    grep -v operator | sed 's/.*::~*//' | sort -u)
 [ -n "$names" ] || { echo "$library exports nothing" >&2; exit 1; }
 for name in $names; do
     grep -qrw "$name" "$include" || inside="$inside $name"
