@@ -37,6 +37,18 @@ file(GLOB_RECURSE stand_ins ${prefix}/*ZQ* ${prefix}/*VXLog* ${prefix}/ZQ/* ${pr
 if(PLATFORM AND stand_ins)
     message(FATAL_ERROR "Stand-ins were installed beside the agent's own platform: ${stand_ins}")
 endif()
+if(PLATFORM)
+    file(GLOB module_folder ${prefix}/*/pkgconfig)
+    execute_process(COMMAND ${CMAKE_COMMAND} -E env PKG_CONFIG_PATH=${module_folder}
+                            pkg-config --cflags --libs IC
+                    OUTPUT_VARIABLE flags COMMAND_ERROR_IS_FATAL ANY)
+    separate_arguments(flags UNIX_COMMAND "${flags}")
+    set(missing -I${WORK}/platform/include -L${WORK}/platform/lib -lIC -lZQ)
+    list(REMOVE_ITEM missing ${flags})
+    if(missing)
+        message(FATAL_ERROR "The pkg-config module does not say ${missing}, but ${flags}")
+    endif()
+endif()
 
 run(${configure} -S ${CMAKE_CURRENT_LIST_DIR} -B ${WORK}/build -DCMAKE_PREFIX_PATH=${prefix})
 run(${CMAKE_COMMAND} --build ${WORK}/build)
