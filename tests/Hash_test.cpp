@@ -65,6 +65,14 @@ Number dateTime(long seconds, unsigned int milliseconds, unsigned int scope)
     return time;
 }
 
+IC::Buffer bytesOf(const std::string& text)
+{
+    IC::Buffer bytes;
+    for (const char byte : text)
+        bytes.push_back(static_cast<unsigned char>(byte));
+    return bytes;
+}
+
 constexpr unsigned int largestUint32 = std::numeric_limits<unsigned int>::max();
 constexpr unsigned long long largestUint64 = std::numeric_limits<unsigned long long>::max();
 
@@ -142,7 +150,7 @@ std::vector<PropertyValue> manyValues()
         for (const std::string& text : {std::string(), std::string(1, '\0'), std::string("\0a", 2),
                                         std::string("a\0b", 3), std::string("a"), std::string("\xff")}) {
             values.emplace_back(text, mark);
-            values.emplace_back(IC::Buffer(text.begin(), text.end()), mark);
+            values.emplace_back(bytesOf(text), mark);
             values.emplace_back(IC::StringArray {text}, mark);
             values.emplace_back(IC::StringArray {text, text}, mark);
             values.emplace_back(IC::StringArray {text, ""}, mark);

@@ -1,0 +1,25 @@
+# Fails unless GDB shows a program's values as shown.txt has them.
+#
+#   GDB        the debugger
+#   PROGRAM    what it runs
+#   PRINTERS   the script that GDB is told to read
+#   BUILD      set: this build is installed below PREFIX (its folders LIBRARIES and DATA), the program uses the library
+#              from there, and GDB finds the script by itself
+if(BUILD)
+    file(REMOVE_RECURSE ${PREFIX})
+    execute_process(COMMAND ${CMAKE_COMMAND} --install ${BUILD} --prefix ${PREFIX}
+                    OUTPUT_QUIET COMMAND_ERROR_IS_FATAL ANY)
+    set(load -iex "add-auto-load-scripts-directory ${PREFIX}/${DATA}/gdb/auto-load"
+             -iex "add-auto-load-safe-path ${PREFIX}/${DATA}/gdb/auto-load"
+             -iex "set environment LD_LIBRARY_PATH ${PREFIX}/${LIBRARIES}")
+else()
+    set(load -iex "source ${PRINTERS}")
+endif()
+execute_process(COMMAND ${GDB} -nx -batch -iex "set debuginfod enabled off" ${load}
+                        -x ${CMAKE_CURRENT_LIST_DIR}/commands.gdb ${PROGRAM}
+                OUTPUT_VARIABLE output ERROR_VARIABLE output)
+string(REGEX REPLACE "^.*\nBreakpoint 1, [^\n]*\n[^\n]*\n" "" shown "${output}")
+file(READ ${CMAKE_CURRENT_LIST_DIR}/shown.txt expected)
+if(NOT shown STREQUAL expected)
+    message(FATAL_ERROR "GDB shows\n${output}\ninstead of\n${expected}")
+endif()
