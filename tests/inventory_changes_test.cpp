@@ -357,7 +357,12 @@ public:
     {
         kill(process_, signal);
         int status = 0;
-        waitpid(process_, &status, 0);
+        for (int i = 0; waitpid(process_, &status, WNOHANG) == 0; ++i) {
+            constexpr int most = 60000;
+            if (i == most)
+                kill(process_, SIGKILL);
+            usleep(1000);
+        }
         process_ = 0;
         return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
     }

@@ -82,6 +82,7 @@ struct Request {
     std::pair<std::string, std::string> sides;
     std::string drawing;
     std::string period;
+    bool asJson = false;
 };
 
 Inventory readFrom(const std::string& file)
@@ -192,7 +193,7 @@ int run(int argc, char** argv)
     const auto* set =
         app.add_option("--set", request.setting, "Change one property and write the outcome, nothing else")
             ->type_name("PATH NUMBER TEXT");
-    const auto* json = app.add_flag("--json",
+    const auto* json = app.add_flag("--json", request.asJson,
                                     "Write the nodes and their properties as JSON; a text that is not"
                                     " UTF-8 becomes {\"hex\": \"fffe\"}");
     const auto* svg = app.add_option("--svg", request.drawing, "Draw the nodes as nested boxes into OUTPUT")
@@ -228,7 +229,7 @@ int run(int argc, char** argv)
                             request.setting);
     else if (svg->count() != 0)
         status = draw(inventory.nodes, request.drawing);
-    else if (json->count() != 0)
+    else if (request.asJson)
         writeJson(std::cout, inventory.nodes);
     else
         describe(inventory.nodes, request.form);
