@@ -36,7 +36,7 @@ protected:
 
 // A stream is costly to make, so some are kept for the buffers to come. They belong to no thread: a thread that
 // ends would have to release its own, when this library may be unloaded already.
-struct __attribute__((visibility("hidden"))) VXMessageBuffer::Composer {
+struct VXMessageBuffer::Composer {
     Composer() : stream(&buffer)
     {
         stream.imbue(std::locale::classic());

@@ -33,7 +33,7 @@ public:
     const std::string& str(VXMessageBuffer& last);
 
 private:
-    struct Composer;
+    struct __attribute__((visibility("hidden"))) Composer;
 
     const std::string& take();
 
