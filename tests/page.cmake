@@ -1,5 +1,6 @@
 # A page shows each example as its file has it and what it prints, in this order, and nothing else: every block ```cpp
-# is an example, every block ```text the output of the example before it.
+# is an example, every block ```text the output of the example before it, and every block ```cmake a part of an example
+# that is a CMakeLists.txt.
 #
 #   PAGE        the page
 #   EXAMPLES    the sources; behind a "|" the program, where there is one: then what it prints stands beside the
@@ -10,7 +11,7 @@ separate_arguments(emulator UNIX_COMMAND "${EMULATOR}")
 
 # The page from here on must show `content` as its next block.
 function(expect_block language content origin)
-    string(REGEX MATCH "\n```(cpp|text)\n" fence "${rest}")
+    string(REGEX MATCH "\n```(cpp|text|cmake)\n" fence "${rest}")
     if(NOT fence STREQUAL "\n```${language}\n")
         message(FATAL_ERROR "${PAGE} does not show ${origin}")
     endif()
@@ -20,10 +21,18 @@ function(expect_block language content origin)
     string(SUBSTRING "${rest}" ${position} -1 rest)
     string(FIND "${rest}" "```" position)
     string(SUBSTRING "${rest}" 0 ${position} shown)
-    if(NOT shown STREQUAL content)
+    if(language STREQUAL "cmake")
+        string(FIND "${content}" "\n${shown}" position)
+    elseif(shown STREQUAL content)
+        set(position 0)
+    else()
+        set(position -1)
+    endif()
+    if(position EQUAL -1)
         message(FATAL_ERROR "${PAGE} shows\n${shown}instead of ${origin}, which is\n${content}")
     endif()
-    string(SUBSTRING "${rest}" ${position} -1 rest)
+    string(LENGTH "${shown}" length)
+    string(SUBSTRING "${rest}" ${length} -1 rest)
     set(rest "${rest}" PARENT_SCOPE)
 endfunction()
 
@@ -31,7 +40,11 @@ foreach(example IN LISTS EXAMPLES)
     string(REPLACE "|" ";" example "${example}")
     list(POP_FRONT example source)
     file(READ ${source} code)
-    expect_block(cpp "${code}" ${source})
+    if(source MATCHES "CMakeLists.txt$")
+        expect_block(cmake "${code}" ${source})
+    else()
+        expect_block(cpp "${code}" ${source})
+    endif()
     if(example)
         execute_process(COMMAND ${emulator} ${example} OUTPUT_VARIABLE output ERROR_QUIET COMMAND_ERROR_IS_FATAL ANY)
         string(REGEX REPLACE "\\.cpp$" ".txt" text ${source})
@@ -43,7 +56,7 @@ foreach(example IN LISTS EXAMPLES)
     endif()
 endforeach()
 
-string(REGEX MATCH "\n```(cpp|text)\n.*" left_over "${rest}")
+string(REGEX MATCH "\n```(cpp|text|cmake)\n.*" left_over "${rest}")
 if(NOT left_over STREQUAL "")
     message(FATAL_ERROR "${PAGE} shows more than its examples:${left_over}")
 endif()

@@ -15,7 +15,7 @@ function(ic_test_page name page)
 endfunction()
 
 if(TARGET fan)
-    ic_test_page(readme README.md examples/fan/fan.cpp=fan)
+    ic_test_page(readme README.md examples/fan/fan.cpp=fan tests/consumer/CMakeLists.txt)
 endif()
 
 if(TARGET guide-01-derive-a-node)
@@ -46,7 +46,7 @@ if(TARGET trap-infinity)
 endif()
 
 set(example examples/testing)
-ic_test_page(testing docs/testing.md ${example}/FanProvider.h ${example}/FanProvider.cpp ${example}/FanProvider_test.cpp)
+ic_test_page(testing docs/testing.md ${example}/CMakeLists.txt ${example}/FanProvider.h ${example}/FanProvider.cpp ${example}/FanProvider_test.cpp)
 
 # No page has programs that no test compiles.
 if(NOT IC_PLATFORM_DIR)
@@ -54,7 +54,7 @@ if(NOT IC_PLATFORM_DIR)
         ${PROJECT_SOURCE_DIR}/*.md)
     list(FILTER pages EXCLUDE REGEX "^build/")
     foreach(page IN LISTS pages)
-        file(STRINGS ${PROJECT_SOURCE_DIR}/${page} programs REGEX "^```(cpp|c\\+\\+)")
+        file(STRINGS ${PROJECT_SOURCE_DIR}/${page} programs REGEX "^```(cpp|cmake)")
         if(programs AND NOT page IN_LIST tested_pages)
             message(FATAL_ERROR "${page} shows programs, and no test looks at them")
         endif()

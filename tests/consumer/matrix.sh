@@ -66,7 +66,7 @@ package() {
     configure -S "$here" -B "$folder" -DCMAKE_PREFIX_PATH="$work/$1" -DCMAKE_CXX_COMPILER="$2" -DCMAKE_CXX_STANDARD="$3" \
         -DCMAKE_CXX_EXTENSIONS=OFF
     quietly cmake --build "$folder"
-    check "$folder/consumer"
+    check "$folder/program"
     echo "find_package, $1, $2, C++$3"
 }
 
@@ -102,12 +102,12 @@ subproject() {
     configure -S "$here/subproject" -B "$folder" -DWAY="$1" -DIC_FOLDER="$2" -DBUILD_SHARED_LIBS="$3" \
         -DCMAKE_CXX_COMPILER="$4" -DCMAKE_CXX_STANDARD="$5" "${6--DSANITIZE=OFF}"
     quietly cmake --build "$folder"
-    check "$folder/consumer"
+    check "$folder/program"
     [ "$(ctest --test-dir "$folder" --show-only | tail -n 1)" = 'Total Tests: 1' ] || fail "$folder has other tests"
     quietly cmake --install "$folder" --prefix "$prefix"
-    echo ./bin/consumer | expect_files "$prefix"
+    echo ./bin/program | expect_files "$prefix"
     linked=OFF
-    ! readelf --dynamic "$folder/consumer" | grep -q 'NEEDED.*libIC\.so\.1' || linked=ON
+    ! readelf --dynamic "$folder/program" | grep -q 'NEEDED.*libIC\.so\.1' || linked=ON
     [ "$linked" = "$shared" ] || fail "$folder: BUILD_SHARED_LIBS=$shared is not heeded"
     echo "$way"
 }

@@ -60,7 +60,7 @@ if(SHARED)
     string(APPEND expected "from the plug-in: Can't return current value as a Number\n")
 endif()
 separate_arguments(emulator UNIX_COMMAND "${EMULATOR}")
-execute_process(COMMAND ${emulator} ${WORK}/build/consumer ${plugin}
+execute_process(COMMAND ${emulator} ${WORK}/build/program ${plugin}
                 OUTPUT_VARIABLE output ERROR_VARIABLE records RESULT_VARIABLE result)
 if(NOT result EQUAL 0 OR NOT output STREQUAL expected)
     message(FATAL_ERROR "The consumer ended with ${result}\n${records}\nprinted\n${output}\ninstead of\n${expected}")
