@@ -48,9 +48,9 @@ std::string textOf(const Buffer& bytes)
     char* out = text.data();
     const unsigned char* byte = bytes.data();
     for (std::size_t groups = bytes.size() / 4; groups > 0; --groups) {
-        for (int i = 0; i < 4; ++i)
-            out = detail::writeHex(out, *byte++);
-        ++out;  // over the blank
+        out = detail::writeHex(detail::writeHex(out, byte[0]), byte[1]);
+        out = detail::writeHex(detail::writeHex(out, byte[2]), byte[3]) + 1;  // over the blank
+        byte += 4;
     }
     for (std::size_t rest = bytes.size() % 4; rest > 0; --rest)
         out = detail::writeHex(out, *byte++);
@@ -130,6 +130,8 @@ void PropertyValue::copyObject(const PropertyValue& source)
 // The header has assigned numbers.
 void PropertyValue::assign(const PropertyValue& source)
 {
+    if (this == &source)
+        return;
     if (kind_ != source.kind_ || value_ == nullptr) {
         PropertyValue copy(source);
         swap(copy);

@@ -25,6 +25,12 @@ class Text;
 void append(Text& text, const Number& number);
 void append(Text& text, const std::vector<Number>& numbers);
 
+// Puts what happens in the other case out of the way.
+constexpr bool likely(bool condition) noexcept
+{
+    return __builtin_expect(static_cast<long>(condition), 1L) != 0;
+}
+
 // The hash of what came before and of what comes next. The factor is odd, so that nothing of the former is lost.
 constexpr std::size_t combinedHash(std::size_t before, std::size_t next) noexcept
 {
@@ -213,17 +219,20 @@ public:
     ///         "A negative number cannot convert to an unsigned 64-bit integer"
     ///       "Version: Number too large for version: "
     ///         "The number is too large to convert to a version"
-    operator bool() const { return kind_ == KIND_BOOL ? load<ZQ::Uint8>() != 0 : toBool(); }
+    operator bool() const { return detail::likely(kind_ == KIND_BOOL) ? load<ZQ::Uint8>() != 0 : toBool(); }
     operator int() const
     {
-        return kind_ == KIND_INT ? load<int>() : static_cast<int>(toUint32("operator int"));
+        return detail::likely(kind_ == KIND_INT) ? load<int>() : static_cast<int>(toUint32("operator int"));
     }
     operator unsigned int() const
     {
-        return kind_ == KIND_UINT32 ? load<ZQ::Uint32>() : toUint32("operator ZQ::Uint32");
+        return detail::likely(kind_ == KIND_UINT32) ? load<ZQ::Uint32>() : toUint32("operator ZQ::Uint32");
     }
-    operator unsigned long long() const { return kind_ == KIND_UINT64 ? load<ZQ::Uint64>() : toUint64(); }
-    operator double() const { return kind_ == KIND_REAL ? load<ZQ::Real64>() : toReal(); }
+    operator unsigned long long() const
+    {
+        return detail::likely(kind_ == KIND_UINT64) ? load<ZQ::Uint64>() : toUint64();
+    }
+    operator double() const { return detail::likely(kind_ == KIND_REAL) ? load<ZQ::Real64>() : toReal(); }
     operator Version2() const { return kind_ == KIND_VERSION ? load<Version2>() : toVersion(); }
     operator ZQ::DateTime() const;
     operator sNodeRef() const { return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef(); }

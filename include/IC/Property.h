@@ -149,8 +149,6 @@ public:
     }
     PropertyValue& operator=(const PropertyValue& source)
     {
-        if (this == &source)
-            return *this;
         if (!bothHold(KIND_NUMBER, *this, source)) {
             assign(source);
             return *this;
@@ -246,27 +244,30 @@ public:
     ///         "Can't return current value as a StringArray"
     operator double() const
     {
-        return holds(KIND_NUMBER)   ? object<Number>().operator double()
-            : holds(KIND_ENUMVALUE) ? object<EnumValue>().operator unsigned int()
-                                    : refuseReal();
+        return detail::likely(holds(KIND_NUMBER)) ? object<Number>().operator double()
+            : holds(KIND_ENUMVALUE)               ? object<EnumValue>().operator unsigned int()
+                                                  : refuseReal();
     }
     operator unsigned long long() const
     {
-        return holds(KIND_NUMBER)   ? object<Number>().operator unsigned long long()
-            : holds(KIND_ENUMVALUE) ? object<EnumValue>().operator unsigned int()
-                                    : refuseUint64();
+        return detail::likely(holds(KIND_NUMBER)) ? object<Number>().operator unsigned long long()
+            : holds(KIND_ENUMVALUE)               ? object<EnumValue>().operator unsigned int()
+                                                  : refuseUint64();
     }
     operator unsigned int() const
     {
-        return holds(KIND_NUMBER)   ? object<Number>().operator unsigned int()
-            : holds(KIND_ENUMVALUE) ? object<EnumValue>().operator unsigned int()
-                                    : refuseUint32();
+        return detail::likely(holds(KIND_NUMBER)) ? object<Number>().operator unsigned int()
+            : holds(KIND_ENUMVALUE)               ? object<EnumValue>().operator unsigned int()
+                                                  : refuseUint32();
     }
-    operator bool() const { return holds(KIND_NUMBER) ? object<Number>().operator bool() : refuseBool(); }
-    operator Number() const { return holds(KIND_NUMBER) ? object<Number>() : refuseNumber(); }
+    operator bool() const
+    {
+        return detail::likely(holds(KIND_NUMBER)) ? object<Number>().operator bool() : refuseBool();
+    }
+    operator Number() const { return detail::likely(holds(KIND_NUMBER)) ? object<Number>() : refuseNumber(); }
     operator Version2() const
     {
-        return holds(KIND_NUMBER) ? object<Number>().operator Version2() : refuseVersion();
+        return detail::likely(holds(KIND_NUMBER)) ? object<Number>().operator Version2() : refuseVersion();
     }
     operator EnumValue() const { return holds(KIND_ENUMVALUE) ? object<EnumValue>() : refuseEnumValue(); }
     operator Buffer() const { return holds(KIND_BUFFER) ? object<Buffer>() : refuseBuffer(); }
