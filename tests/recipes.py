@@ -61,9 +61,11 @@ folders = re.search(r"for folder in \(([^)]*)\)", text)
 expect(folders is not None, "conanfile.py exports no folder")
 for folder in re.findall(r'"(\w+)"', folders.group(1) if folders else ""):
     expect(os.path.isdir(os.path.join(root, folder)), f"conanfile.py exports {folder}/, which there is none of")
-# What CMakeLists.txt takes in where neither tests nor examples are built.
-for part in sorted(set(re.findall(r"(?:src|include|cmake|platform)\b", cmake))):
-    expect(folders and f'"{part}"' in folders.group(1), f"conanfile.py does not export {part}/")
+# What is taken in, and what is installed, where neither tests nor examples are built.
+named = re.findall(r"(?:add_subdirectory\(|_SOURCE_DIR\}/|include\()(\w+)", cmake + read("cmake", "CMakeLists.txt"))
+for part in sorted(set(named) - {"tests", "examples", "benchmarks"}):
+    if os.path.isdir(os.path.join(root, part)):
+        expect(folders and f'"{part}"' in folders.group(1), f"conanfile.py does not export {part}/")
 
 # vcpkg
 try:

@@ -25,7 +25,7 @@ class ICRecipe(ConanFile):
         # What the library is built of.
         root = os.path.join(self.recipe_folder, os.pardir, os.pardir)
         copy(self, "CMakeLists.txt", root, self.export_sources_folder)
-        for folder in ("cmake", "include", "platform", "src"):
+        for folder in ("cmake", "debugger", "include", "platform", "src", "testkit"):
             copy(self, os.path.join(folder, "*"), root, self.export_sources_folder)
 
     def validate(self):
