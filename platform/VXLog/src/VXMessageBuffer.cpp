@@ -100,8 +100,9 @@ VXMessageBuffer::Composer::Closer::~Closer()
 
 VXMessageBuffer::Composer* VXMessageBuffer::Composer::takeKept()
 {
+    // In one order with keep: either the closing sees what was kept, or keep sees that it is closed.
     for (std::atomic<Composer*>& place : kept)
-        if (place.load(std::memory_order_relaxed) != nullptr)
+        if (place.load() != nullptr)
             if (Composer* const composer = place.exchange(nullptr))
                 return composer;
     return nullptr;
