@@ -165,8 +165,8 @@ TEST(PropertyConversion, ToEnumValueRefusesOtherKindsWithoutARecord)
                 ADD_FAILURE() << "nothing was thrown";
             } catch (const PropertyValueInvalidKind& exception) {
                 EXPECT_EQ(exception.what(), "Can't return current value as a EnumValue");
-                report("operator IC::EnumValue", "Property", 0, "",
-                       std::string(typeid(exception).name()).append("|").append(exception.what()));
+                observe::report("operator IC::EnumValue", "Property", 0, "",
+                                std::string(typeid(exception).name()).append("|").append(exception.what()));
             }
             EXPECT_EQ(seen(value), before);
         }

@@ -1,5 +1,9 @@
 // What IC::Testing adds to GoogleTest.
 
+// Names that a user's test may have itself, so that the kit must not.
+struct Message { };
+void report();
+
 #include <limits>
 #include <string>
 

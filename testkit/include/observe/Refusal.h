@@ -32,6 +32,8 @@
 //   expectRecordPair(records, 0, "setProperty", "Node", "Vexilon.IC.Node", 3000, "setProperty: 7 true");
 //   expectRecordPair(records, 2, "setProperty", "Node", "Vexilon.IC.Node", 6000, "setProperty: 7 read-only");
 
+namespace observe {
+
 // GoogleTest's report lists with each test what it expected to be refused, numbers left out, as
 // "file|function|level|message" and "exception|what()".
 inline void report(const std::string& function, const std::string& file, int level,
@@ -47,6 +49,8 @@ inline void report(const std::string& function, const std::string& file, int lev
                                   exception);
 }
 
+}  // namespace observe
+
 // Expects records[first] to be a log record and records[first + 1] its trace record, with these fields, and
 // null, 0 and 0 in between. Returns their line.
 inline int expectRecordPair(const std::vector<observe::Record>& records, std::size_t first,
@@ -58,7 +62,7 @@ inline int expectRecordPair(const std::vector<observe::Record>& records, std::si
         return 0;
     }
     if (level == 6000)
-        report(function, file, level, message, std::string());
+        observe::report(function, file, level, message, std::string());
     for (const bool trace : {false, true}) {
         SCOPED_TRACE(trace ? "trace record" : "log record");
         const observe::Record& record = records[first + (trace ? 1 : 0)];
@@ -98,9 +102,12 @@ int expectRefusal(Operation operation, const std::string& function, const std::s
     const std::vector<observe::Record> records = observe::records();
     EXPECT_EQ(records.size(), before + 2) << "records written by the refusal: " << records.size() - before;
     const int line = expectRecordPair(records, before, function, file, category, 6000, logged);
-    report(function, file, 6000, logged, std::string(typeid(Exception).name()).append("|").append(sentence));
+    observe::report(function, file, 6000, logged,
+                    std::string(typeid(Exception).name()).append("|").append(sentence));
     return line;
 }
+
+namespace observe {
 
 // One message of the library, as a log record and as the same trace record.
 struct Message {
@@ -110,11 +117,13 @@ struct Message {
     std::string text;
 };
 
+}  // namespace observe
+
 // Expects the records since the test began, or since observe::reset(), to be those of these messages, in this order,
 // and no others.
 //
 //   expectRecords({{"setProperty", "Vexilon.IC.Node", 3000, "setProperty: 7 true"}});
-inline void expectRecords(const std::vector<Message>& expected)
+inline void expectRecords(const std::vector<observe::Message>& expected)
 {
     const auto line = [](bool trace, const std::string& function, const std::string& logger, int level,
                          const std::string& text) {
@@ -123,7 +132,7 @@ inline void expectRecords(const std::vector<Message>& expected)
         return result.append(": ").append(text).append("\n");
     };
     std::string wanted;
-    for (const Message& message : expected)
+    for (const observe::Message& message : expected)
         for (const bool trace : {false, true})
             wanted += line(trace, message.function, message.logger, message.level, message.text);
     std::string written;
@@ -131,6 +140,8 @@ inline void expectRecords(const std::vector<Message>& expected)
         written += line(record.trace, record.function, record.logger, record.level, record.message);
     EXPECT_EQ(written, wanted);  // texts of several lines, of which GoogleTest prints the difference
 }
+
+namespace observe {
 
 class ObserveEachTest : public testing::EmptyTestEventListener {
 public:
@@ -142,13 +153,15 @@ public:
     }
 
 private:
-    void OnTestStart(const testing::TestInfo&) override { observe::reset(); }
+    void OnTestStart(const testing::TestInfo&) override { reset(); }
 
     void OnTestEnd(const testing::TestInfo&) override
     {
-        EXPECT_EQ(observe::buffersAlive(), 0);
-        EXPECT_EQ(observe::locksHeld(), 0);
+        EXPECT_EQ(buffersAlive(), 0);
+        EXPECT_EQ(locksHeld(), 0);
     }
 };
 
 inline const bool everyTestIsObserved = ObserveEachTest::append();
+
+}  // namespace observe
