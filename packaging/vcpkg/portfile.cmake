@@ -14,6 +14,6 @@ vcpkg_cmake_install()
 vcpkg_cmake_config_fixup(PACKAGE_NAME IC CONFIG_PATH lib/cmake/IC)
 vcpkg_fixup_pkgconfig()
 
-file(REMOVE_RECURSE "${CURRENT_PACKAGES_DIR}/debug/include")
+file(REMOVE_RECURSE "${CURRENT_PACKAGES_DIR}/debug/include" "${CURRENT_PACKAGES_DIR}/debug/share")
 # The tree names no licence; the README is what it has to say.
 vcpkg_install_copyright(FILE_LIST "${SOURCE_PATH}/README.md")
