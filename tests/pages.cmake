@@ -48,8 +48,8 @@ endif()
 set(example examples/testing)
 ic_test_page(testing docs/testing.md ${example}/CMakeLists.txt ${example}/FanProvider.h ${example}/FanProvider.cpp ${example}/FanProvider_test.cpp)
 
-# No page has programs that no test compiles.
-if(NOT IC_PLATFORM_DIR)
+# No page has programs that no test compiles, where all the examples are built.
+if(IC_BUILD_EXAMPLES AND NOT IC_PLATFORM_DIR)
     file(GLOB_RECURSE pages RELATIVE ${PROJECT_SOURCE_DIR}
         ${PROJECT_SOURCE_DIR}/*.md)
     list(FILTER pages EXCLUDE REGEX "^build/")
