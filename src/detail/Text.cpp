@@ -1,5 +1,6 @@
 #include "detail/Text.h"
 
+#include <algorithm>
 #include <cmath>
 #include <stdexcept>
 
