@@ -130,8 +130,6 @@ void PropertyValue::copyObject(const PropertyValue& source)
 // The header has assigned numbers.
 void PropertyValue::assign(const PropertyValue& source)
 {
-    if (this == &source)
-        return;
     if (kind_ != source.kind_ || value_ == nullptr) {
         PropertyValue copy(source);
         swap(copy);

@@ -149,12 +149,12 @@ public:
     }
     PropertyValue& operator=(const PropertyValue& source)
     {
-        if (!bothHold(KIND_NUMBER, *this, source)) {
+        if (bothHold(KIND_NUMBER, *this, source)) {
+            object<Number>() = source.object<Number>();
+            readOnly_ = source.readOnly_;
+        } else if (this != &source) {
             assign(source);
-            return *this;
         }
-        object<Number>() = source.object<Number>();
-        readOnly_ = source.readOnly_;
         return *this;
     }
     ///@}
