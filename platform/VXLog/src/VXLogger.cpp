@@ -9,7 +9,7 @@
 #include <utility>
 
 #include "Printable.h"
-#include "SinkLock.h"
+#include "Locks.h"
 #include "VXLog/RecordSink.h"
 #include "ZQ/DateTime.h"
 

@@ -1,12 +1,14 @@
 #include "VXLog/VXMessageBuffer.h"
 
 #include <array>
-#include <atomic>
 #include <charconv>
 #include <cstddef>
 #include <iterator>
 #include <locale>
+#include <mutex>
 #include <streambuf>
+
+#include "Locks.h"
 
 namespace VXLog {
 
@@ -75,10 +77,13 @@ struct VXMessageBuffer::Composer {
     std::string taken;
 
 private:
-    // Without a lock, which a child of fork() might find taken. Never destroyed: objects of the program may write
-    // records to the very end.
-    static std::array<std::atomic<Composer*>, 16> kept;
-    static std::atomic<bool> isClosed;
+    // Never destroyed: objects of the program may write records to the very end.
+    struct Kept {
+        std::array<Composer*, 16> composers {};
+        std::size_t count = 0;
+        bool isClosed = false;
+    };
+    static Kept kept;
 
     struct Closer {
         ~Closer();
@@ -86,38 +91,31 @@ private:
     static const Closer closer;
 };
 
-std::array<std::atomic<VXMessageBuffer::Composer*>, 16> VXMessageBuffer::Composer::kept {};
-std::atomic<bool> VXMessageBuffer::Composer::isClosed {false};
+VXMessageBuffer::Composer::Kept VXMessageBuffer::Composer::kept;
 
 [[gnu::init_priority(101)]] const VXMessageBuffer::Composer::Closer VXMessageBuffer::Composer::closer;
 
 VXMessageBuffer::Composer::Closer::~Closer()
 {
-    isClosed = true;
     while (const Composer* const composer = takeKept())
         delete composer;
+    const std::lock_guard<std::mutex> lock(composersLock);
+    kept.isClosed = true;
 }
 
 VXMessageBuffer::Composer* VXMessageBuffer::Composer::takeKept()
 {
-    // In one order with keep: either the closing sees what was kept, or keep sees that it is closed.
-    for (std::atomic<Composer*>& place : kept)
-        if (place.load() != nullptr)
-            if (Composer* const composer = place.exchange(nullptr))
-                return composer;
-    return nullptr;
+    const std::lock_guard<std::mutex> lock(composersLock);
+    return kept.count == 0 ? nullptr : kept.composers.at(--kept.count);
 }
 
 bool VXMessageBuffer::Composer::keep(Composer* composer)
 {
-    for (std::atomic<Composer*>& place : kept) {
-        Composer* empty = nullptr;
-        if (place.load(std::memory_order_relaxed) == nullptr
-            && place.compare_exchange_strong(empty, composer))
-            // Closed meanwhile: whoever takes it back first, the closing or this thread, releases it.
-            return !isClosed || !place.compare_exchange_strong(composer, nullptr);
-    }
-    return false;
+    const std::lock_guard<std::mutex> lock(composersLock);
+    if (kept.isClosed || kept.count == kept.composers.size())
+        return false;
+    kept.composers.at(kept.count++) = composer;
+    return true;
 }
 
 VXMessageBuffer::VXMessageBuffer() : composer_(Composer::takeKept())

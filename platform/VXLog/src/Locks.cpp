@@ -1,4 +1,4 @@
-#include "SinkLock.h"
+#include "Locks.h"
 
 #include <pthread.h>
 
@@ -7,24 +7,27 @@
 namespace VXLog {
 
 std::mutex sinkLock;
+std::mutex composersLock;
 
 namespace {
 
-void lock()
+void lockAll()
 {
+    composersLock.lock();
     sinkLock.lock();
 }
 
-void unlock()
+void unlockAll()
 {
     sinkLock.unlock();
+    composersLock.unlock();
 }
 
 // The system forgets the handlers when the library is unloaded.
 struct ForkHandlers {
     ForkHandlers()
     {
-        if (pthread_atfork(lock, unlock, unlock) != 0)
+        if (pthread_atfork(lockAll, unlockAll, unlockAll) != 0)
             throw std::bad_alloc();
     }
 };
