@@ -396,6 +396,19 @@ struct __attribute__((visibility("default"))) hash<IC::Number> {
     }
 
 private:
+    static std::size_t hashOf(ZQ::Uint64 integer) noexcept
+    {
+        return static_cast<std::size_t>(integer ^ integer >> 32);  // a hash may have but 32 bits
+    }
+    static std::size_t hashOf(const IC::Version2& version) noexcept
+    {
+        return version.major * 256u + version.minor;
+    }
+    static std::size_t hashOf(const IC::Number::DateTimeFields& time) noexcept
+    {
+        return IC::detail::combinedHash(std::hash<long>()(time.seconds), time.milliseconds);
+    }
+
     static std::size_t contentHash(const IC::Number& number) noexcept
     {
         using IC::Number;
@@ -404,20 +417,14 @@ private:
             return number.load<ZQ::Uint8>();
         case Number::KIND_UINT32:
             return number.load<ZQ::Uint32>();
-        case Number::KIND_UINT64: {
-            const auto integer = number.load<ZQ::Uint64>();
-            return static_cast<std::size_t>(integer ^ integer >> 32);  // a hash may have but 32 bits
-        }
+        case Number::KIND_UINT64:
+            return hashOf(number.load<ZQ::Uint64>());
         case Number::KIND_REAL:
             return std::hash<ZQ::Real64>()(number.load<ZQ::Real64>());
-        case Number::KIND_VERSION: {
-            const auto version = number.load<IC::Version2>();
-            return version.major * 256u + version.minor;
-        }
-        case Number::KIND_DATETIME: {
-            const auto time = number.load<Number::DateTimeFields>();
-            return IC::detail::combinedHash(std::hash<long>()(time.seconds), time.milliseconds);
-        }
+        case Number::KIND_VERSION:
+            return hashOf(number.load<IC::Version2>());
+        case Number::KIND_DATETIME:
+            return hashOf(number.load<Number::DateTimeFields>());
         default:
             return 0;  // two of such a kind are equal
         }

@@ -457,11 +457,8 @@ private:
             return std::hash<IC::Number>()(value.object<IC::Number>());
         case Value::KIND_STRING:
             return std::hash<std::string>()(value.object<std::string>());
-        case Value::KIND_BUFFER: {
-            const auto& bytes = value.object<IC::Buffer>();
-            const auto* const first = reinterpret_cast<const char*>(bytes.data());
-            return std::hash<std::string_view>()(std::string_view(first, bytes.size()));
-        }
+        case Value::KIND_BUFFER:
+            return bytesHash(value.object<IC::Buffer>());
         case Value::KIND_ENUMVALUE:
             return std::hash<IC::EnumValue>()(value.object<IC::EnumValue>());
         case Value::KIND_NUMBERARRAY:
@@ -471,6 +468,12 @@ private:
         default:
             return 0;  // KIND_UNKNOWN, and where a refused setKind left no object
         }
+    }
+
+    static std::size_t bytesHash(const IC::Buffer& bytes) noexcept
+    {
+        const auto* const first = reinterpret_cast<const char*>(bytes.data());
+        return std::hash<std::string_view>()(std::string_view(first, bytes.size()));
     }
 
     template <class Element>
