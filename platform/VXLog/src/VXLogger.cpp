@@ -8,8 +8,8 @@
 #include <mutex>
 #include <utility>
 
-#include "Printable.h"
 #include "Locks.h"
+#include "Printable.h"
 #include "VXLog/RecordSink.h"
 #include "ZQ/DateTime.h"
 
