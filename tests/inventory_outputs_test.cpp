@@ -299,7 +299,8 @@ TEST_F(InventoryOutput, IsNoJsonWhereItWasNotBuiltIn)
     const Outcome outcome = runProgram({INVENTORY_WITHOUT_JSON, "--json", file});
     EXPECT_EQ(outcome.status, 2);
     EXPECT_EQ(outcome.out, "");
-    EXPECT_EQ(outcome.err, "inventory: --json: this program was built without nlohmann-json3-dev\n");
+    EXPECT_EQ(outcome.err,
+              "inventory_without_json: --json: this program was built without nlohmann-json3-dev\n");
     EXPECT_EQ(runProgram({INVENTORY_WITHOUT_JSON, file}).status, 0);
 }
 

@@ -4,6 +4,7 @@
 #include <spdlog/sinks/stdout_color_sinks.h>
 #include <spdlog/spdlog.h>
 
+#include <cerrno>  // program_invocation_short_name: the package installs it under another name
 #include <csignal>
 #include <cstdlib>
 #include <fstream>
@@ -27,7 +28,7 @@ enum ExitStatus { EXIT_DONE = 0, EXIT_REFUSED = 1, EXIT_DIFFERENT = 1, EXIT_BAD_
 // The library's records go where the program's own go: to spdlog, and so to standard error.
 void connectLog()
 {
-    spdlog::set_default_logger(spdlog::stderr_color_mt("inventory"));
+    spdlog::set_default_logger(spdlog::stderr_color_mt(program_invocation_short_name));
     spdlog::set_pattern("%Y-%m-%dT%H:%M:%S.%e %^%l%$ %v");
     spdlog::cfg::load_env_levels();
     VXLog::setRecordSink([](const VXLog::Record& record) {
@@ -130,7 +131,8 @@ ExitStatus draw(const Nodes& nodes, const std::string& name)
     file.close();
     if (file)
         return EXIT_DONE;
-    std::cerr << "inventory: " << printable(name) << ": the drawing cannot be written\n";
+    std::cerr << program_invocation_short_name << ": " << printable(name)
+              << ": the drawing cannot be written\n";
     return EXIT_REFUSED;
 }
 
@@ -162,13 +164,14 @@ int flushed(int status, ExitStatus failure)
 {
     if (std::cout.flush())
         return status;
-    std::cerr << "inventory: the output cannot be written\n";
+    std::cerr << program_invocation_short_name << ": the output cannot be written\n";
     return failure;
 }
 
 int run(int argc, char** argv)
 {
-    CLI::App app("Describes this machine, or that of FILE, as nodes with numbered properties.", "inventory");
+    CLI::App app("Describes this machine, or that of FILE, as nodes with numbered properties.",
+                 program_invocation_short_name);
     app.footer(
         "Examples:\n"
         "  inventory                            this machine as a tree\n"
@@ -182,7 +185,9 @@ int run(int argc, char** argv)
         "2 for options or input that cannot be used, and for --diff if the output cannot be written.\n"
         "Log records go to standard error; SPDLOG_LEVEL=trace shows all of them, SPDLOG_LEVEL=off none.\n"
         "On a terminal the tree is drawn with lines and colours; NO_COLOR=1 turns the colours off.");
-    app.set_version_flag("--version", "inventory " INVENTORY_VERSION ", hwloc " HWLOC_VERSION);
+    app.set_version_flag("--version",
+                         program_invocation_short_name
+                             + std::string(" " INVENTORY_VERSION ", hwloc " HWLOC_VERSION));
     Request request;
     const auto* file =
         app.add_option("FILE", request.file, "A machine as hwloc exports it (lstopo FILE.xml)");
@@ -247,7 +252,7 @@ int main(int argc, char** argv)
         connectLog();
         return run(argc, argv);
     } catch (const std::exception& error) {
-        std::cerr << "inventory: " << printable(error.what()) << '\n';
+        std::cerr << program_invocation_short_name << ": " << printable(error.what()) << '\n';
         return EXIT_BAD_INPUT;
     }
 }

@@ -3,6 +3,7 @@
 
 #include <unistd.h>
 
+#include <cerrno>
 #include <chrono>
 #include <csignal>
 #include <iostream>
@@ -57,7 +58,7 @@ void watch(const std::function<Inventory()>& read, double seconds, std::ostream&
             told.clear();
         } catch (const BadInput& bad) {
             if (told != bad.what())
-                std::cerr << "inventory: " << printable(bad.what()) << '\n';
+                std::cerr << program_invocation_short_name << ": " << printable(bad.what()) << '\n';
             told = bad.what();
         }
     }
