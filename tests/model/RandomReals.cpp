@@ -1,6 +1,5 @@
-// Converts so many random reals (the first argument), each to one of the types that take reals, and compares value,
-// exception and records with the model's. The second argument is the seed, which is printed. Ends with 1 at the first
-// difference.
+// RandomReals COUNT SEED: converts random reals, each to one of the types that take reals, and compares value, exception
+// and records with those of the model. Prints the seed, and exits with 1 at the first difference.
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
