@@ -1,5 +1,6 @@
-// RandomReals COUNT SEED: converts random reals, each to one of the types that take reals, and compares value, exception
-// and records with those of the second model (Number.h). Prints SEED, and exits with 1 at the first difference.
+// RandomReals COUNT SEED: converts random reals, each to one of the types that take reals, and compares value,
+// exception and records with those of the second model (Number.h). Prints SEED, and exits with 1 at the first
+// difference.
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
