@@ -1,0 +1,2 @@
+// Nothing but the precompiled headers that the tests share.
+int main() { }
