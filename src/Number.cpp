@@ -365,6 +365,8 @@ sNodeRef Number::refuseNodeRef() const
 
 Number::operator std::string() const
 {
+    if (kind_ == KIND_UINT32 && detail::globalLocaleIsClassic())  // the commonest
+        return detail::decimalText(load<ZQ::Uint32>());
     return detail::textOf(*this);
 }
 

@@ -84,6 +84,13 @@ void addTexts(detail::Text& text, const StringArray& texts)
     text.add(texts.empty() ? "{}" : "}");
 }
 
+std::string textOf(const StringArray& texts)
+{
+    detail::Text text;
+    addTexts(text, texts);
+    return text.take();
+}
+
 }  // namespace
 
 PropertyValue::PropertyValue(const char* value, const bool& readOnly)
@@ -294,18 +301,15 @@ std::string PropertyValue::toText() const
         return "unknown";
     if (value_ == nullptr)
         return "invalid";
+    if (holds(KIND_NUMBER))
+        return object<Number>();
+    if (holds(KIND_ENUMVALUE))
+        return object<EnumValue>();
     if (holds(KIND_BUFFER))
         return textOf(object<Buffer>());
-    detail::Text text;
-    if (holds(KIND_NUMBER))
-        append(text, object<Number>());
-    else if (holds(KIND_ENUMVALUE))
-        append(text, object<EnumValue>());
-    else if (holds(KIND_NUMBERARRAY))
-        append(text, object<NumberArray>());
-    else  // KIND_STRINGARRAY: the header has answered for texts
-        addTexts(text, object<StringArray>());
-    return text.take();
+    if (holds(KIND_NUMBERARRAY))
+        return detail::textOf(object<NumberArray>());
+    return textOf(object<StringArray>());  // the header has answered for texts
 }
 
 // The header has compared numbers, texts and bytes.

@@ -1464,6 +1464,7 @@ const struct TextRow {
                 {Number(infinity), "inf"},
                 {Number(-infinity), "-inf"},
                 {Number(notANumber), "nan"},
+                {Number(-notANumber), "-nan"},
                 {Number(Number::KIND_NAN), "not a number"},
                 {Number(Number::KIND_INFINITY), "infinity"},
                 {Number(Version2 {0, 0}), "0.0"},

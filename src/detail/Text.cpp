@@ -56,6 +56,11 @@ char* writeSixDigits(char* out, double real)
 // A copy of one's own is found sooner than the standard library's.
 [[gnu::init_priority(101)]] static const std::locale classicLocale = std::locale::classic();
 
+bool globalLocaleIsClassic()
+{
+    return std::locale() == classicLocale;
+}
+
 Text::Text()
 {
     std::locale global;
@@ -82,9 +87,11 @@ void Text::add(double number)
     }
     constexpr std::size_t longest = 17;  // -123456.000000000 before it is shortened; -1.23457e+308 is shorter
     write(longest, [number](char* out) {
-        char* const end = writeSixDigits(out, number);
-        return end != nullptr ? end
-                              : std::to_chars(out, out + longest, number, std::chars_format::general, 6).ptr;
+        if (char* const end = writeSixDigits(out, number))
+            return end;
+        if (std::isnan(number))  // of which std::to_chars may say more than a stream
+            return std::signbit(number) ? std::copy_n("-nan", 4, out) : std::copy_n("nan", 3, out);
+        return std::to_chars(out, out + longest, number, std::chars_format::general, 6).ptr;
     });
 }
 

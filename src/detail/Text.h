@@ -90,6 +90,17 @@ inline char* writeDecimal(char* out, std::uint64_t number)
 // The bytes in hexadecimal.
 std::string hexOf(std::string_view bytes);
 
+// The number as the classic locale writes it: in its place, since what is written elsewhere and then copied keeps the
+// processor waiting.
+inline std::string decimalText(std::uint32_t number)
+{
+    std::string text("4294967295", 10);  // room for the longest
+    text.resize(static_cast<std::size_t>(writeDecimal(text.data(), number) - text.data()));
+    return text;
+}
+
+bool globalLocaleIsClassic();
+
 // Collects a text form piece by piece. The text is what a fresh std::ostringstream would give under the global
 // locale, which is asked for at the start, but memory that runs out is thrown, not swallowed.
 class Text {

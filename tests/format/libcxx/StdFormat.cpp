@@ -2,6 +2,7 @@
 
 #include <iostream>
 #include <iterator>
+#include <limits>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -44,6 +45,8 @@ int main()
         expectEqual(std::format("{:*^99.3s}", value), std::format("{:*^99.3s}", text));
         expectEqual(std::format("{:{}.{}}", value, 20, 10), std::format("{:{}.{}}", text, 20, 10));
     });
+
+    expectEqual(std::format("{}", IC::Number(-std::numeric_limits<double>::quiet_NaN())), "-nan");
 
     const IC::Number speed(3600u);
     expectEqual(std::format("[{:6}]", speed), "[3600  ]");
