@@ -181,6 +181,7 @@ TEST(ExceptionClasses, AHandlerOfTheRootDoesNotCatchARefusalOfTheLibrary)
     EXPECT_EQ(handlerOf([] { return Number(kindCode(11)); }), "std::exception");
 }
 
+#ifdef __GLIBCXX__  // the other standard library does not declare what type information consists of
 TEST(ExceptionClasses, TheRootHasNoBaseInItsTypeInformation)
 {
     const std::type_info& root = typeid(ICException);
@@ -201,6 +202,7 @@ TEST(ExceptionClasses, TypeInformationRecordsOneBaseNeitherVirtualNorPublic)
         EXPECT_FALSE(base.__is_virtual_p());
     }
 }
+#endif
 
 TEST(FailurePath, EachSourceFileHasItsFileNameAndCategory)
 {

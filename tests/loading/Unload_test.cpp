@@ -3,7 +3,6 @@
 #include <dlfcn.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <malloc.h>
 #include <pthread.h>
 
 #include <condition_variable>
@@ -14,6 +13,8 @@
 #include <mutex>
 #include <string>
 #include <thread>
+
+#include "HeapInUse.h"
 
 namespace {
 
@@ -102,7 +103,7 @@ TEST(Unload, LeavesNothingMappedAndNothingBehindAThousandTimes)
     Worker worker;
     for (int i = 0; i < 10; ++i)
         ASSERT_NO_FATAL_FAILURE(cycle(worker));
-    const std::size_t memory = mallinfo2().uordblks;
+    const std::size_t memory = heapInUse();
     const unsigned int key = nextKey();
     const char* const wanted = std::getenv("IC_TEST_CYCLES");
     const int cycles = wanted != nullptr ? std::atoi(wanted) : 1000;
@@ -112,7 +113,7 @@ TEST(Unload, LeavesNothingMappedAndNothingBehindAThousandTimes)
     }
     // Blocks are of slightly different sizes each time, and none is smaller than this.
     constexpr std::size_t smallestBlock = 32;
-    EXPECT_LT(mallinfo2().uordblks, memory + static_cast<std::size_t>(cycles) * smallestBlock);
+    EXPECT_LT(heapInUse(), memory + static_cast<std::size_t>(cycles) * smallestBlock);
     EXPECT_EQ(nextKey(), key);
 }
 

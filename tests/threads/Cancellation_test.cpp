@@ -1,13 +1,13 @@
 // A thread may be cancelled in an operation on a node: the lock is given back, and nothing stays behind.
 
 #include <gtest/gtest.h>
-#include <malloc.h>
 #include <pthread.h>
 
 #include <algorithm>
 #include <memory>
 #include <string>
 
+#include "HeapInUse.h"
 #include "IC/Node.h"
 #include "VXLog/RecordSink.h"
 
@@ -75,12 +75,12 @@ void cancelIn(void (*operation)(Fan&))
 {
     for (int i = 0; i < 10; ++i)  // leaves room for the texts of later records, and whatever the system keeps
         ASSERT_NO_FATAL_FAILURE(cancelOnceIn(operation));
-    const std::size_t memory = mallinfo2().uordblks;
+    const std::size_t memory = heapInUse();
     constexpr int rounds = 100;
     for (int i = 0; i < rounds; ++i)
         ASSERT_NO_FATAL_FAILURE(cancelOnceIn(operation)) << "in round " << i;
     constexpr std::size_t smallestBlock = 32;
-    EXPECT_LT(mallinfo2().uordblks, memory + rounds * smallestBlock);
+    EXPECT_LT(heapInUse(), memory + rounds * smallestBlock);
 }
 
 class Cancellation : public testing::Test {
