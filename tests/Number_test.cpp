@@ -1680,6 +1680,7 @@ TEST(NumberText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
     const TextRow rows[] = {{Number(-1234567), "-1.234.567"},
                             {Number(123), "123"},
                             {Number(1234567u), "1.234.567"},
+                            {withKind(Number(0x000004D2000004D2ull), 3), "1.234"},  // four bytes of the eight
                             {Number(18446744073709551615ull), "18.446.744.073.709.551.615"},
                             {Number(0.5), "0,5"},
                             {Number(1234.5), "1.234,5"},
