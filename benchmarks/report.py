@@ -224,6 +224,9 @@ def report(context, results, bars):
         if ratio and ratio.bar is not None
     ]
     missed = [(row, ratio) for row, ratio in judged if ratio.missed]
+    for bar in bars:
+        if not any(fnmatch.fnmatchcase(row, bar.pattern) for row in results):
+            sys.exit(f"There is a bar for {bar.pattern}, but no such row")
     lines = [
         f"- {processor()}, {context['num_cpus']} processors, {operating_system()}, {context['compiler']}; "
         f"{context['date'][:10]}.",

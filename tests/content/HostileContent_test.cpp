@@ -56,7 +56,7 @@ template <class Check>
 void forEachText(Check check)
 {
     const auto texts = hostileTexts();
-    ASSERT_GE(texts.size(), 200u);
+    ASSERT_GE(texts.size(), 550u);
     for (const std::string& text : texts) {
         SCOPED_TRACE(hexadecimal(text.substr(0, 40)));
         observe::reset();
