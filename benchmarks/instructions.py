@@ -6,6 +6,7 @@ counts is compared, or written anew with --update.
 """
 
 import argparse
+import math
 import pathlib
 import re
 import subprocess
@@ -45,6 +46,12 @@ def executed(program, operation, count):
         return total
 
 
+def operations_of(program):
+    """What it can be asked for, by its message of usage."""
+    usage = subprocess.run([program], stderr=subprocess.PIPE, text=True).stderr
+    return [line.strip() for line in usage.splitlines() if line.startswith("  ")]
+
+
 def read_table(path):
     table = {}
     compiler = None
@@ -72,10 +79,16 @@ def main():
         sys.exit(f"{options.table} counts what {compiler} compiled, not {options.compiler}; "
                  "write it anew with --update")
 
+    operations = operations_of(options.program)
+    if set(operations) != set(table) and not options.update:
+        sys.exit(f"{options.table} has other operations than the program: "
+                 f"{', '.join(sorted(set(operations) ^ set(table)))}")
+
     exceeded = []
     counts = {}
     print(f"{'operation':16} {'now':>9} {'table':>9} {'ratio':>6}")
-    for operation, before in table.items():
+    for operation in sorted(operations, key=[*table, *operations].index):  # the new ones last
+        before = table.get(operation, math.nan)
         first, second = (executed(options.program, operation, count) for count in RUNS)
         now = counts[operation] = (second - first) / (RUNS[1] - RUNS[0])
         ratio = now / before

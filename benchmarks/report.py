@@ -130,14 +130,21 @@ def bar_of(row, bars):
 
 
 def ratios(row, medians, bars):
-    """What the library costs against the limit and against the peer; None where one of them is missing."""
+    """What the library costs against the limit and against the peer; None where one of them is missing.
+
+    A bar for what is missing would be met by nothing at all: that ends the report.
+    """
     if LIBRARY not in medians:
         return None, None
     bar = bar_of(row, bars)
+    if bar.limit is not None and LIMIT not in medians:
+        sys.exit(f"{row}: has a bar against the limit, which was not measured")
     against_limit = Ratio(medians.ratio(LIBRARY, LIMIT), bar.limit, LIMIT) if LIMIT in medians else None
     candidates = [bar.peer_name] if bar.peer_name else [
         peer for peer in PEERS if peer not in SHARING and peer != RECORDS]
     candidates = [peer for peer in candidates if peer in medians]
+    if not candidates and bar.peer is not None:
+        sys.exit(f"{row}: has a bar against a peer, and none was measured")
     if not candidates:
         return against_limit, None
     best = min(candidates, key=medians.get)

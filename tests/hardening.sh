@@ -1,7 +1,7 @@
 #!/bin/sh
-# Fails unless the libraries are hardened: hardening.sh COMPILE-COMMANDS LIBRARY...
+# Fails unless the libraries are hardened: hardening.sh COMPILE-COMMANDS [SHARED-LIBRARY]...
 #
-# What leaves a trace in a library is read from it; what leaves none, from the commands that compiled its sources.
+# What leaves a trace in a shared library is read from it; what leaves none, from the commands that compiled its sources.
 set -eu
 commands=$1
 shift
@@ -18,8 +18,10 @@ compiled=$(grep '"command":' "$commands" | grep -E -- '-c [^ ]*/(src|platform/(Z
 without() {
     echo "$compiled" | grep -v -e "$1" | sed 's/.* -c /  /' || true
 }
-lacking=$(without '-fstack-clash-protection')
-[ -z "$lacking" ] || complain "compiled without -fstack-clash-protection: $lacking"
+for option in -fstack-protector-strong -fstack-clash-protection; do
+    lacking=$(without "$option")
+    [ -z "$lacking" ] || complain "compiled without $option: $lacking"
+done
 lacking=$(without '-D_FORTIFY_SOURCE=2' | grep . || true)
 if echo "$compiled" | grep -q -e ' -O[23s]'; then
     [ -z "$lacking" ] || complain "optimised without _FORTIFY_SOURCE: $lacking"

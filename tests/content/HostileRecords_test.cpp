@@ -3,13 +3,14 @@
 #include "HostileTexts.h"
 
 #include <gtest/gtest.h>
+#include <iconv.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <clocale>
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
-#include <cwchar>
+#include <string>
 
 #include "IC/Node.h"
 #include "VXLog/VXLogger.h"
@@ -50,25 +51,27 @@ std::string standardErrorOf(void (*write)())
     return all;
 }
 
-// Whether the system's own reading of UTF-8 finds characters, and no control, in the whole line.
-bool isPrintable(const std::string& line)
+// Whether the system's own reading of UTF-8 finds characters, and no control, in the whole line. By iconv, which needs
+// no locale: there is none for another byte order than the machine's.
+bool isPrintable(std::string line)
 {
-    std::mbstate_t state {};
-    for (std::size_t i = 0; i < line.size();) {
-        wchar_t character = 0;
-        const std::size_t length = std::mbrtowc(&character, &line[i], line.size() - i, &state);
-        if (length == 0 || length > line.size() || character < 0x20 || (character >= 0x7f && character < 0xa0)
-            || character == 0x2028 || character == 0x2029)
-            return false;
-        i += length;
-    }
-    return true;
+    const iconv_t reading = iconv_open("WCHAR_T", "UTF-8");
+    std::wstring characters(line.size(), L'\0');
+    char* in = line.data();
+    char* out = reinterpret_cast<char*>(characters.data());
+    std::size_t inLeft = line.size();
+    std::size_t outLeft = characters.size() * sizeof(wchar_t);
+    const bool isUtf8 = iconv(reading, &in, &inLeft, &out, &outLeft) == 0;
+    iconv_close(reading);
+    characters.resize(characters.size() - outLeft / sizeof(wchar_t));
+    return isUtf8 && std::none_of(characters.begin(), characters.end(), [](wchar_t character) {
+        return character < 0x20 || (character >= 0x7f && character < 0xa0) || character == 0x2028
+            || character == 0x2029;
+    });
 }
 
 TEST(HostileRecords, AreOnePrintableLineEach)
 {
-    const std::string before = std::setlocale(LC_CTYPE, nullptr);
-    ASSERT_NE(std::setlocale(LC_CTYPE, "C.UTF-8"), nullptr);
     const std::string all = standardErrorOf(writeRecords);
     std::size_t lines = 0;
     for (std::size_t begin = 0; begin < all.size(); ++lines) {
@@ -83,7 +86,6 @@ TEST(HostileRecords, AreOnePrintableLineEach)
         begin = end + 1;
     }
     EXPECT_EQ(lines, 3 * hostileTexts().size());
-    std::setlocale(LC_CTYPE, before.c_str());
 }
 
 }  // namespace

@@ -129,17 +129,31 @@ Expected numberAfterInitKind(unsigned int code)
 
 Expected numberAfterSetKind(unsigned int code)
 {
-    const char* const texts[] = {"0: unknown",
-                                 "1: true",
-                                 "2: 7",
-                                 "3: 7",
-                                 "4: 7",
-                                 "5: 3.45846e-323 = 3.4584595208887258e-323",
-                                 "6: not a number",
-                                 "7: infinity",
-                                 "8: 7.0",
-                                 "9: 7/0 of another scope",
-                                 "10: Unknown:0"};
+    // A date-time has its seconds where the number was, in as many bytes as long has.
+    const char* const ofLittleEndian[] = {"0: unknown",
+                                          "1: true",
+                                          "2: 7",
+                                          "3: 7",
+                                          "4: 7",
+                                          "5: 3.45846e-323 = 3.4584595208887258e-323",
+                                          "6: not a number",
+                                          "7: infinity",
+                                          "8: 7.0",
+                                          "9: 7/0 of another scope",
+                                          "10: Unknown:0"};
+    const char* const ofBigEndian[] = {"0: unknown",
+                                       "1: false",
+                                       "2: 7",
+                                       "3: 7",
+                                       "4: 30064771072",
+                                       "5: 1.4854e-313 = 1.4853970536756906e-313",
+                                       "6: not a number",
+                                       "7: infinity",
+                                       "8: 0.0",
+                                       sizeof(long) == 4 ? "9: 7/0 of another scope"
+                                                         : "9: 30064771072/0 of another scope",
+                                       "10: Unknown:0"};
+    const auto& texts = __BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__ ? ofLittleEndian : ofBigEndian;
     if (code < std::size(texts))
         return {"returned", texts[code]};
     return {"std::invalid_argument: Invalid kind", "3: 7", "setKind",
