@@ -7,6 +7,7 @@
 #include <utility>
 #include <vector>
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include "AllocationFailure.h"
@@ -100,7 +101,8 @@ TEST(ErrorStatus, IsRefusedAboveSixteen)
 TEST(ErrorStatus, IsCheckedLast)
 {
     const char* const nothing = nullptr;
-    EXPECT_THROW(Error(nothing, byte(0)), std::logic_error);
+    EXPECT_THAT([&] { Error(nothing, byte(0)); },
+                testing::ThrowsMessage<std::logic_error>("a text is a null pointer"));
     try {
         Error(nothing, byte(17));
         ADD_FAILURE() << "nothing was thrown";

@@ -1555,6 +1555,36 @@ TEST(NumberText, OfARealHasSixSignificantDigitsHoweverSmallItIs)
     EXPECT_EQ(std::string(Number(0.0001)), "0.0001");
 }
 
+TEST(NumberText, OfARealHasSixSignificantDigitsInEveryDecade)
+{
+    const struct {
+        double first, among, last;
+        const char* texts[3];
+    } decades[] = {{1e6, 1234567, 9999994, {"1e+06", "1.23457e+06", "9.99999e+06"}},
+                   {100000, 123456.7, 999999.4, {"100000", "123457", "999999"}},
+                   {10000, 12345.67, 99999.94, {"10000", "12345.7", "99999.9"}},
+                   {1000, 1234.567, 9999.994, {"1000", "1234.57", "9999.99"}},
+                   {100, 123.4567, 999.9994, {"100", "123.457", "999.999"}},
+                   {10, 12.34567, 99.99994, {"10", "12.3457", "99.9999"}},
+                   {1, 1.234567, 9.999994, {"1", "1.23457", "9.99999"}},
+                   {0.1, 0.1234567, 0.9999994, {"0.1", "0.123457", "0.999999"}},
+                   {0.01, 0.01234567, 0.09999994, {"0.01", "0.0123457", "0.0999999"}},
+                   {0.001, 0.001234567, 0.009999994, {"0.001", "0.00123457", "0.00999999"}},
+                   {0.0001, 0.0001234567, 0.0009999994, {"0.0001", "0.000123457", "0.000999999"}},
+                   {1e-5, 0.00001234567, 0.00009999994, {"1e-05", "1.23457e-05", "9.99999e-05"}}};
+    for (const auto& [first, among, last, texts] : decades) {
+        EXPECT_EQ(std::string(Number(first)), texts[0]);
+        EXPECT_EQ(std::string(Number(among)), texts[1]);
+        EXPECT_EQ(std::string(Number(-among)), std::string("-") + texts[1]);
+        EXPECT_EQ(std::string(Number(last)), texts[2]);
+    }
+    // What is rounded up to the next decade.
+    EXPECT_EQ(std::string(Number(999999.6)), "1e+06");
+    EXPECT_EQ(std::string(Number(99.99996)), "100");
+    EXPECT_EQ(std::string(Number(0.00999999996)), "0.01");
+    EXPECT_EQ(std::string(Number(0.0000999999996)), "0.0001");
+}
+
 TEST(NumberText, OfAnotherKindReadsTheBytesAsThatKind)
 {
     Number number(0x0000000700000009ull);

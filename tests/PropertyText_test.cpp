@@ -406,6 +406,29 @@ TEST(PropertyText, OfManyNumbersIsTheirTextsOneAfterAnother)
     }
 }
 
+TEST(PropertyText, OfTheLongestNumbersIsWholeHoweverMuchStandsBeforeThem)
+{
+    const NumberArray longest {Number(4294967295u), Number(18446744073709551615ull), Number(-2147483647 - 1),
+                               Number(-1.23457e-308), Number(-123456.4)};
+    const std::string texts[] = {"4294967295", "18446744073709551615", "-2147483648", "-1.23457e-308",
+                                 "-123456"};
+    for (std::size_t i = 0; i < longest.size(); ++i) {
+        // "10, " moves by one what "1, " repeats every three: so every length is met.
+        for (std::size_t tens = 0; tens < 3; ++tens) {
+            NumberArray numbers(tens, Number(10));
+            std::string expected = "{";
+            for (std::size_t ten = 0; ten < tens; ++ten)
+                expected += "10, ";
+            for (int ones = 0; ones < 400; ++ones) {
+                numbers.push_back(longest[i]);
+                ASSERT_EQ(PropertyValue(numbers).operator std::string(), expected + texts[i] + '}');
+                numbers.back() = Number(1);  // signed, so that each is written by itself
+                expected += "1, ";
+            }
+        }
+    }
+}
+
 TEST(PropertyText, OfBytesHasABlankAfterEveryFourthWhateverTheLength)
 {
     Buffer values;

@@ -6,6 +6,7 @@
 #include <utility>
 #include <vector>
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include "AllocationFailure.h"
@@ -233,8 +234,10 @@ TEST(PropertyConstructor, GivesAnEmptyTextForBothEmptyTexts)
 TEST(PropertyConstructor, RefusesNullCharactersAsAStringDoes)
 {
     const char* const none = nullptr;
-    EXPECT_THROW(PropertyValue(none, false), std::logic_error);
-    EXPECT_THROW(PropertyValue(none, true), std::logic_error);
+    for (const bool readOnly : {false, true}) {
+        EXPECT_THAT([&] { PropertyValue(none, readOnly); },
+                    testing::ThrowsMessage<std::logic_error>("a text is a null pointer"));
+    }
     EXPECT_TRUE(observe::records().empty());
 }
 

@@ -65,9 +65,9 @@ bool isPrintable(std::string line)
     iconv_close(reading);
     characters.resize(characters.size() - outLeft / sizeof(wchar_t));
     return isUtf8 && std::none_of(characters.begin(), characters.end(), [](wchar_t character) {
-        return character < 0x20 || (character >= 0x7f && character < 0xa0) || character == 0x2028
-            || character == 0x2029;
-    });
+               return character < 0x20 || (character >= 0x7f && character < 0xa0) || character == 0x2028
+                   || character == 0x2029;
+           });
 }
 
 TEST(HostileRecords, AreOnePrintableLineEach)

@@ -50,8 +50,9 @@ int useInChild()
 TEST(Fork, LeavesAChildThatMakesSetsPrintsAndLogs)
 {
 #if defined(__GLIBCXX__) && !defined(_GLIBCXX_HAVE_ATOMIC_LOCK_POLICY)
-    GTEST_SKIP() << "This standard library counts references under a lock of its own, and nobody gives it back in a "
-                    "child (libstdc++ of GCC 12 for riscv64)";
+    GTEST_SKIP()
+        << "This standard library counts references under a lock of its own, and nobody gives it back in a "
+           "child (libstdc++ of GCC 12 for riscv64)";
 #endif
     const auto before = VXLog::setRecordSink([](const VXLog::Record&) {});
     std::atomic<bool> isOver {false};
