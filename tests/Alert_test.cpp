@@ -82,6 +82,14 @@ void expectRefused(unsigned int severity, unsigned int alertClass, unsigned int 
     EXPECT_EQ(observe::dateTimesAlive(), alive);
 }
 
+TEST(AlertCodes, AreNamedAtBothEnds)
+{
+    EXPECT_EQ(Alert::SEVERITY_SMALLEST, 0u);
+    EXPECT_EQ(Alert::SEVERITY_LARGEST, 3u);
+    EXPECT_EQ(Alert::CLASS_SMALLEST, 0u);
+    EXPECT_EQ(Alert::CLASS_LARGEST, 5u);
+}
+
 TEST(AlertSeverity, IsAcceptedUpToThree)
 {
     for (unsigned int code = 0; code <= 3; ++code) {

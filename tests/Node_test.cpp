@@ -1224,4 +1224,10 @@ TEST(NodeSensor, NamesTheCodesAsTheTableDoes)
     EXPECT_EQ(Node::SENSOR_LARGEST, 73u);
 }
 
+TEST(NodeStatusCodes, AreNamedAtBothEnds)
+{
+    EXPECT_EQ(Node::STATUS_INITIAL, 0u);
+    EXPECT_EQ(Node::STATUS_LARGEST, 85u);
+}
+
 }  // namespace
