@@ -98,6 +98,13 @@ TEST(ErrorStatus, IsRefusedAboveSixteen)
     }
 }
 
+TEST(ErrorStatus, HasNamesForTheseCodes)
+{
+    EXPECT_EQ(Error::STATUS_SUCCESS, 0u);
+    EXPECT_EQ(Error::STATUS_NO_SUCH_PROPERTY, 5u);
+    EXPECT_EQ(Error::STATUS_READ_ONLY, 16u);
+}
+
 TEST(ErrorStatus, IsCheckedLast)
 {
     const char* const nothing = nullptr;
