@@ -33,15 +33,16 @@ struct LoggerCall {
 std::vector<LoggerCall> takeLoggerCalls();
 
 // Each log record with the trace record after it; anything else becomes a record that no model expects.
-inline std::vector<model::Record> inPairs(const std::vector<LoggerCall>& calls)
+inline std::vector<model::Record> inPairs(std::vector<LoggerCall> calls)
 {
     std::vector<model::Record> records;
     for (std::size_t i = 0; i < calls.size(); i += 2) {
         const bool pair = i + 1 < calls.size() && !calls[i].trace && calls[i + 1].trace
             && calls[i].line == calls[i + 1].line && calls[i].line > 0 && calls[i].plain && calls[i + 1].plain
             && calls[i].record == calls[i + 1].record;
-        records.push_back(pair ? calls[i].record
-                               : model::Record {"no pair of records", {}, {}, 0, calls[i].record.text});
+        if (!pair)
+            calls[i].record = {"no pair of records", {}, {}, 0, calls[i].record.text};
+        records.push_back(std::move(calls[i].record));
     }
     return records;
 }

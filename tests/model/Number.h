@@ -5,6 +5,7 @@
 #include <cstring>
 #include <limits>
 #include <string>
+#include <utility>
 
 #include "Outcome.h"
 #include "SensorNames.h"
@@ -125,9 +126,9 @@ inline Number numberOfNodeReference(unsigned int type, unsigned int id)
     return number;
 }
 
-inline Record numberRecord(const std::string& function, const std::string& text)
+inline Record numberRecord(std::string function, std::string text)
 {
-    return {function, "Number", "Vexilon.IC.Number", 6000, text};
+    return {std::move(function), "Number", "Vexilon.IC.Number", 6000, std::move(text)};
 }
 
 // The kind is stored before it is refused. A date-time begins at `now`.
@@ -381,11 +382,9 @@ inline Outcome<NodeReference> toNodeReference(const Number& number)
         "std::out_of_range", "Can't return current value as pair");
 }
 
-// Never refused; milliseconds that are no multiple of ten leave a record.
-inline Outcome<std::string> textOf(const Number& number)
+// Milliseconds that are no multiple of ten leave a record.
+inline void write(std::ostream& out, std::vector<Record>& records, const Number& number)
 {
-    std::ostringstream out;
-    std::vector<Record> records;
     switch (number.kind) {
     case UNKNOWN:
         out << "unknown";
@@ -436,8 +435,15 @@ inline Outcome<std::string> textOf(const Number& number)
     default:
         out << "invalid";
     }
-    Outcome<std::string> outcome = returned(out.str());
-    outcome.records = records;
+}
+
+// Never refused.
+inline Outcome<std::string> textOf(const Number& number)
+{
+    std::ostringstream out;
+    Outcome<std::string> outcome;
+    write(out, outcome.records, number);
+    outcome.value = out.str();
     return outcome;
 }
 

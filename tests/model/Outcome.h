@@ -3,6 +3,7 @@
 #include <optional>
 #include <sstream>
 #include <string>
+#include <utility>
 #include <vector>
 
 // The rules of the values once more, as plainly as they can be said: slow, and sharing no code with the library, so
@@ -41,20 +42,20 @@ inline bool operator==(Nothing, Nothing)
 }
 
 template <class T>
-Outcome<T> returned(const T& value)
+Outcome<T> returned(T value)
 {
     Outcome<T> outcome;
-    outcome.value = value;
+    outcome.value = std::move(value);
     return outcome;
 }
 
 template <class T>
-Outcome<T> refused(const Record& record, const std::string& exception, const std::string& sentence)
+Outcome<T> refused(Record record, std::string exception, std::string sentence)
 {
     Outcome<T> outcome;
-    outcome.exception = exception;
-    outcome.sentence = sentence;
-    outcome.records.push_back(record);
+    outcome.exception = std::move(exception);
+    outcome.sentence = std::move(sentence);
+    outcome.records.push_back(std::move(record));
     return outcome;
 }
 

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <map>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "Number.h"
@@ -21,9 +22,9 @@ enum PropertyKind : unsigned int {
 };
 constexpr unsigned int propertyKinds = 7;
 
-inline Record enumValueRecord(const std::string& function, const std::string& text)
+inline Record enumValueRecord(std::string function, std::string text)
 {
-    return {function, "EnumValue", "Vexilon.IC.EnumValue", 6000, text};
+    return {std::move(function), "EnumValue", "Vexilon.IC.EnumValue", 6000, std::move(text)};
 }
 
 inline Outcome<unsigned int> toUint16(unsigned int enumValue)
@@ -59,9 +60,9 @@ struct PropertyValue {
     bool holds(PropertyKind wanted) const { return kind == wanted && !empty; }
 };
 
-inline Record propertyRecord(const std::string& function, const std::string& text)
+inline Record propertyRecord(std::string function, std::string text)
 {
-    return {function, "Property", "Vexilon.IC.Property", 6000, text};
+    return {std::move(function), "Property", "Vexilon.IC.Property", 6000, std::move(text)};
 }
 
 inline PropertyValue firstValue(unsigned int kind, bool readOnly)
@@ -218,18 +219,13 @@ inline Outcome<std::string> textOf(const PropertyValue& value)
     if (value.empty)
         return returned<std::string>("invalid");
     std::ostringstream out;
-    std::vector<Record> records;
-    const auto write = [&](const Number& number) {
-        const Outcome<std::string> text = textOf(number);
-        out << *text.value;
-        records.insert(records.end(), text.records.begin(), text.records.end());
-    };
+    Outcome<std::string> outcome;
     switch (value.kind) {
     case NOTHING:
         out << "unknown";
         break;
     case NUMBER:
-        write(value.number);
+        write(out, outcome.records, value.number);
         break;
     case TEXT:
         out << value.text;
@@ -245,7 +241,7 @@ inline Outcome<std::string> textOf(const PropertyValue& value)
         out << "{";
         for (std::size_t i = 0; i < value.numbers.size(); ++i) {
             out << (i == 0 ? "" : ", ");
-            write(value.numbers[i]);
+            write(out, outcome.records, value.numbers[i]);
         }
         out << "}";
         break;
@@ -265,8 +261,7 @@ inline Outcome<std::string> textOf(const PropertyValue& value)
     default:
         out << "invalid";
     }
-    Outcome<std::string> outcome = returned(out.str());
-    outcome.records = records;
+    outcome.value = out.str();
     return outcome;
 }
 
