@@ -1,5 +1,5 @@
 # ic_harden(target): what makes a fault in a delivered library harder to exploit. It concerns the library alone, not
-# what links it. tests/hardening.sh shows that each of these is there.
+# what links it. tests/package/hardening.sh shows that each of these is there.
 include(CheckCXXCompilerFlag)
 check_cxx_compiler_flag(-fstack-clash-protection IC_HAS_STACK_CLASH_PROTECTION)
 check_cxx_compiler_flag(-fcf-protection IC_HAS_CONTROL_FLOW_PROTECTION)

@@ -13,7 +13,7 @@ set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
 
-# What is left out for these machines: examples, and tests by the names that CTest lists.
+# What is left out for these machines: tools, and tests by the names that CTest lists.
 set(IC_LEFT_OUT
     inventory     # the libraries that it reads this machine with, and umockdev, are installed for this machine alone
     link_orders)  # links and starts programs by itself; an order of objects is the same for the linker everywhere

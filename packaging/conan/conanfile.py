@@ -1,6 +1,6 @@
 """The recipe for Conan 2: `conan create packaging/conan` in the root of the tree.
 
-Checked: that it is valid Python, and that its version, options and files are those of the tree (tests/recipes.py).
+Checked: that it is valid Python, and that its version, options and files are those of the tree (tests/package/recipes.py).
 Not checked: that Conan builds a package with it; Conan is not among the packages that the tests are run with.
 """
 
@@ -25,7 +25,7 @@ class ICRecipe(ConanFile):
         # What the library is built of.
         root = os.path.join(self.recipe_folder, os.pardir, os.pardir)
         copy(self, "CMakeLists.txt", root, self.export_sources_folder)
-        for folder in ("cmake", "debugger", "include", "platform", "src", "testkit"):
+        for folder in ("cmake", "include", "platform", "src", "testkit", "tools"):
             copy(self, os.path.join(folder, "*"), root, self.export_sources_folder)
 
     def validate(self):
@@ -38,6 +38,7 @@ class ICRecipe(ConanFile):
         toolchain = CMakeToolchain(self)
         toolchain.cache_variables["IC_BUILD_TESTS"] = False
         toolchain.cache_variables["IC_BUILD_EXAMPLES"] = False
+        toolchain.cache_variables["IC_BUILD_TOOLS"] = False
         toolchain.cache_variables["IC_INSTALL"] = True
         toolchain.cache_variables["IC_PLATFORM_DIR"] = str(self.options.platform_dir)
         toolchain.generate()

@@ -1,6 +1,6 @@
 # A port to be used in place, in the root of the tree: vcpkg install ic --overlay-ports=packaging/vcpkg
 #
-# Checked: that the files and options named here are there (tests/recipes.py). Not checked: that vcpkg builds it; vcpkg
+# Checked: that the files and options named here are there (tests/package/recipes.py). Not checked: that vcpkg builds it; vcpkg
 # is not among the packages that the tests are run with.
 get_filename_component(SOURCE_PATH "${CMAKE_CURRENT_LIST_DIR}/../.." ABSOLUTE)
 
@@ -8,7 +8,7 @@ vcpkg_cmake_configure(
     SOURCE_PATH "${SOURCE_PATH}"
     OPTIONS
         -DIC_BUILD_TESTS=OFF
-        -DIC_BUILD_EXAMPLES=OFF
+        -DIC_BUILD_EXAMPLES=OFF -DIC_BUILD_TOOLS=OFF
         -DIC_INSTALL=ON)
 vcpkg_cmake_install()
 vcpkg_cmake_config_fixup(PACKAGE_NAME IC CONFIG_PATH lib/cmake/IC)

@@ -9,7 +9,7 @@
 #include <cstdlib>
 #include <sstream>
 
-#include "AllocationFailure.h"
+#include "support/AllocationFailure.h"
 #include "IC/Node.h"
 #include "observe/Refusal.h"
 

@@ -3,8 +3,8 @@
 
 #include <gtest/gtest.h>
 
-#include "AllocationFailure.h"
-#include "GroupingLocale.h"
+#include "support/AllocationFailure.h"
+#include "support/GroupingLocale.h"
 #include "Operations.h"
 #include "Sweep.h"
 

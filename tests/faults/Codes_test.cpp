@@ -14,7 +14,7 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "SensorNames.h"
+#include "support/SensorNames.h"
 #include "Trial.h"
 #include "ZQ/DateTime.h"
 #include "observe/Refusal.h"

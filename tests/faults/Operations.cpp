@@ -13,7 +13,7 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "PropertySamples.h"
+#include "support/PropertySamples.h"
 #include "ZQ/DateTime.h"
 
 namespace {

@@ -17,7 +17,7 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "PropertySamples.h"
+#include "support/PropertySamples.h"
 #include "ZQ/DateTime.h"
 
 // A node with everything filled in, whose members everybody may see.

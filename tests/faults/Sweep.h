@@ -4,7 +4,7 @@
 
 #include <gtest/gtest.h>
 
-#include "AllocationFailure.h"
+#include "support/AllocationFailure.h"
 #include "Trial.h"
 #include "observe/Refusal.h"
 

@@ -7,7 +7,7 @@
 
 #include "AnyValue.h"
 #include "Check.h"
-#include "GroupingLocale.h"
+#include "support/GroupingLocale.h"
 #include "IC/Alert.h"
 #include "IC/Error.h"
 

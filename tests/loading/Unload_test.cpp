@@ -14,7 +14,7 @@
 #include <string>
 #include <thread>
 
-#include "HeapInUse.h"
+#include "support/HeapInUse.h"
 
 namespace {
 

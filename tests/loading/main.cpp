@@ -2,7 +2,7 @@
 #include <string>
 
 #include "Check.h"
-#include "EveryCategory.h"
+#include "support/EveryCategory.h"
 #include "IC/Number.h"
 
 namespace {

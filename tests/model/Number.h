@@ -8,7 +8,7 @@
 #include <utility>
 
 #include "Outcome.h"
-#include "SensorNames.h"
+#include "support/SensorNames.h"
 #include "ZQ/DateTime.h"
 
 namespace model {

@@ -52,7 +52,7 @@ class Program:
     """A test program: how it is linked, and what it needed when nothing was wrong."""
 
     def __init__(self, path):
-        self.name = path.removeprefix("tests/")
+        self.name = pathlib.Path(path).name
         # ": && compiler objects -o tests/X libraries && what is done with the program"
         line = output_of(["ninja", "-C", BUILD, "-t", "commands", path]).splitlines()[-1]
         words = shlex.split(line.split(" && ")[1])
@@ -108,10 +108,10 @@ class Suite:
         )  # fmt: skip
         library = "testkit/libICTesting.a"
         users = output_of(["ninja", "-C", BUILD, "-t", "query", library]).partition("outputs:")[2].split()
-        paths = [user for user in users if re.fullmatch(r"tests/\w+_test", user)]
+        paths = [user for user in users if re.fullmatch(r"tests/classes/\w+_test", user)]
         if not paths:
             fail("no test program links " + library)
-        output_of(["cmake", "--build", BUILD, "--target", *(path.removeprefix("tests/") for path in paths)])
+        output_of(["cmake", "--build", BUILD, "--target", *(pathlib.Path(path).name for path in paths)])
         self.programs = [Program(path) for path in paths]
         self.commands = {}
         for entry in json.loads((BUILD / "compile_commands.json").read_text()):
@@ -337,7 +337,7 @@ def run_rules(suite):
 def main():
     parts = {"branches": run_branches, "rules": run_rules}
     if len(sys.argv) != 2 or sys.argv[1] not in parts:
-        sys.exit("usage: scripts/mutants branches | rules")
+        sys.exit("usage: scripts/checks/mutants branches | rules")
     suite = Suite()
     try:
         status = parts[sys.argv[1]](suite)

@@ -7,7 +7,7 @@
 #include <memory>
 #include <string>
 
-#include "HeapInUse.h"
+#include "support/HeapInUse.h"
 #include "IC/Node.h"
 #include "VXLog/RecordSink.h"
 

@@ -1,0 +1,689 @@
+#include <iomanip>
+#include <limits>
+#include <map>
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "support/AllocationFailure.h"
+#include "support/GroupingLocale.h"
+#include "IC/EnumValue.h"
+#include "IC/ICException.h"
+#include "IC/Number.h"
+#include "IC/Property.h"
+#include "support/PropertySamples.h"
+#include "observe/Refusal.h"
+
+namespace {
+
+using IC::Buffer;
+using IC::EnumValue;
+using IC::Number;
+using IC::NumberArray;
+using IC::PropertyValue;
+using IC::PropertyValueInvalidKind;
+using IC::StringArray;
+using PropertyMap = std::map<unsigned int, PropertyValue>;
+
+static_assert(std::is_same_v<decltype(IC::pB(0)), std::string>);
+
+enum Order { equal, less, greater, unordered };
+
+// All six operators, and all six the other way round.
+void expectOrder(const PropertyValue& a, const PropertyValue& b, Order order)
+{
+    SCOPED_TRACE(seen(a) + " and " + seen(b));
+    EXPECT_EQ(a == b, order == equal);
+    EXPECT_EQ(a != b, order != equal);
+    EXPECT_EQ(a < b, order == less);
+    EXPECT_EQ(a > b, order == greater);
+    EXPECT_EQ(a <= b, order == equal || order == less);
+    EXPECT_EQ(a >= b, order == equal || order == greater);
+    EXPECT_EQ(b == a, order == equal);
+    EXPECT_EQ(b != a, order != equal);
+    EXPECT_EQ(b < a, order == greater);
+    EXPECT_EQ(b > a, order == less);
+    EXPECT_EQ(b <= a, order == equal || order == greater);
+    EXPECT_EQ(b >= a, order == equal || order == less);
+    EXPECT_TRUE(observe::records().empty());
+}
+
+template <class Operation>
+void expectNumbersRefused(Operation operation, const char* function, const char* logged, const char* sentence)
+{
+    expectRefusal<std::invalid_argument>(operation, function, "Number", "Vexilon.IC.Number", logged,
+                                         sentence);
+}
+
+PropertyValue number(const Number& value)
+{
+    return PropertyValue(value);
+}
+
+PropertyValue numbers(const NumberArray& values)
+{
+    return PropertyValue(values);
+}
+
+PropertyValue text(const std::string& value)
+{
+    return PropertyValue(value);
+}
+
+PropertyValue texts(const StringArray& values)
+{
+    return PropertyValue(values);
+}
+
+PropertyValue bytes(const Buffer& values)
+{
+    return PropertyValue(values);
+}
+
+const double nan = std::numeric_limits<double>::quiet_NaN();
+
+TEST(PropertyComparison, OfNothingIsEqual)
+{
+    expectOrder(PropertyValue(PropertyValue::KIND_UNKNOWN), PropertyValue(PropertyValue::KIND_UNKNOWN),
+                equal);
+}
+
+TEST(PropertyComparison, OfNumbersIsTheNumbersOwn)
+{
+    expectOrder(number(Number(5u)), number(Number(5u)), equal);
+    expectOrder(number(Number(5u)), number(Number(6u)), less);
+    expectOrder(number(Number(4294967295u)), number(Number(0u)), greater);
+    expectOrder(number(Number(3)), number(Number(9)), equal);  // signed numbers are never told apart
+    expectOrder(number(Number(0.5)), number(Number(-0.5)), greater);
+    expectOrder(number(Number(nan)), number(Number(nan)), unordered);
+    expectOrder(number(Number(false)), number(Number(true)), less);
+    expectOrder(number(Number(IC::Version2 {1, 200})), number(Number(IC::Version2 {2, 0})), less);
+    expectOrder(number(Number(Number::KIND_INFINITY)), number(Number(Number::KIND_INFINITY)), equal);
+}
+
+TEST(PropertyComparison, OfNumbersPassesTheNumbersRefusalsOnUntouched)
+{
+    const PropertyValue uint32(Number(1u));
+    const PropertyValue uint64(Number(1ull));
+    EXPECT_FALSE(uint32 == uint64);
+    EXPECT_TRUE(uint32 != uint64);
+    EXPECT_TRUE(observe::records().empty());
+    const char* const lessKinds = "<: cannot compare two different kinds of number, kind1=3, kind2=4";
+    const char* const greaterKinds = ">: cannot compare two different kinds of number, kind1=3, kind2=4";
+    const char* const sentence = "Cannot compare two different kinds of number";
+    expectNumbersRefused([&] { return uint32 < uint64; }, "operator<", lessKinds, sentence);
+    expectNumbersRefused([&] { return uint32 <= uint64; }, "operator<", lessKinds, sentence);
+    expectNumbersRefused([&] { return uint32 > uint64; }, "operator>", greaterKinds, sentence);
+    expectNumbersRefused([&] { return uint32 >= uint64; }, "operator>", greaterKinds, sentence);
+
+    const PropertyValue notANumber {Number(Number::KIND_NAN)};
+    expectNumbersRefused([&] { return notANumber < notANumber; }, "operator<",
+                         "<: invalid operation when kind is NaN", "Invalid operation when kind is NaN");
+    expectNumbersRefused([&] { return notANumber > notANumber; }, "operator>",
+                         ">: invalid operation when kind is NaN", "Invalid operation when kind is NaN");
+    EXPECT_TRUE(notANumber <= notANumber);
+    EXPECT_TRUE(notANumber >= notANumber);
+}
+
+TEST(PropertyComparison, OfInfinityIsAsUnevenAsTheNumbersOwn)
+{
+    const PropertyValue infinity {Number(Number::KIND_INFINITY)};
+    const PropertyValue five(Number(5u));
+    EXPECT_TRUE(infinity > five);
+    EXPECT_TRUE(infinity >= five);
+    EXPECT_FALSE(infinity < five);
+    EXPECT_FALSE(infinity <= five);
+    EXPECT_TRUE(observe::records().empty());
+    expectNumbersRefused([&] { return five < infinity; }, "operator<",
+                         "<: cannot compare two different kinds of number, kind1=3, kind2=7",
+                         "Cannot compare two different kinds of number");
+    expectNumbersRefused([&] { return five > infinity; }, "operator>",
+                         ">: cannot compare two different kinds of number, kind1=3, kind2=7",
+                         "Cannot compare two different kinds of number");
+}
+
+TEST(PropertyComparison, OfTextsIsByUnsignedBytesThenByLength)
+{
+    expectOrder(text(""), text(""), equal);
+    expectOrder(text("abc"), text("abc"), equal);
+    expectOrder(text(""), text("a"), less);
+    expectOrder(text("a"), text("ab"), less);
+    expectOrder(text("b"), text("ab"), greater);
+    expectOrder(text("B"), text("a"), less);
+    expectOrder(text("\x80"), text("\x7f"), greater);
+    expectOrder(text(std::string("a\0b", 3)), text(std::string("a\0c", 3)), less);
+    expectOrder(text(std::string("a\0", 2)), text("a"), greater);
+}
+
+TEST(PropertyComparison, OfBuffersIsByUnsignedBytesThenByLength)
+{
+    expectOrder(bytes({}), bytes({}), equal);
+    expectOrder(bytes({}), bytes({0}), less);
+    expectOrder(bytes({1}), bytes({1}), equal);
+    expectOrder(bytes({1}), bytes({1, 0}), less);
+    expectOrder(bytes({0x80}), bytes({0x7f, 0xff}), greater);
+    expectOrder(bytes({1, 2, 3}), bytes({1, 2, 4}), less);
+    expectOrder(bytes({0, 1}), bytes({0, 0, 9}), greater);
+}
+
+TEST(PropertyComparison, OfEnumValuesIsByTheUnsignedValue)
+{
+    expectOrder(PropertyValue(EnumValue(0u)), PropertyValue(EnumValue(0u)), equal);
+    expectOrder(PropertyValue(EnumValue(0u)), PropertyValue(EnumValue(4294967295u)), less);
+    expectOrder(PropertyValue(EnumValue(8u)), PropertyValue(EnumValue(7u)), greater);
+}
+
+TEST(PropertyComparison, OfNumberArraysIsLexicographic)
+{
+    const Number one(1u);
+    const Number two(2u);
+    expectOrder(numbers({}), numbers({}), equal);
+    expectOrder(numbers({}), numbers({one}), less);
+    expectOrder(numbers({one, two}), numbers({one, two}), equal);
+    expectOrder(numbers({one}), numbers({one, Number(0u)}), less);
+    expectOrder(numbers({two}), numbers({one, Number(5u)}), greater);
+    expectOrder(numbers({one, two}), numbers({one, one, two}), greater);
+    // Signed numbers are never told apart, so the length decides.
+    expectOrder(numbers({Number(1), Number(9)}), numbers({Number(2), Number(3)}), equal);
+    expectOrder(numbers({Number(9)}), numbers({Number(1), Number(1)}), less);
+    // A real NaN equals nothing and decides nothing.
+    expectOrder(numbers({Number(nan)}), numbers({Number(nan)}), unordered);
+    expectOrder(numbers({Number(nan), Number(1.0)}), numbers({Number(nan), Number(2.0)}), less);
+}
+
+TEST(PropertyComparison, OfNumberArraysComparesElementsWithLessThanOnly)
+{
+    const PropertyValue infinity = numbers({Number(Number::KIND_INFINITY)});
+    const PropertyValue five = numbers({Number(5u)});
+    const char* const logged = "<: cannot compare two different kinds of number, kind1=3, kind2=7";
+    const char* const sentence = "Cannot compare two different kinds of number";
+    // Infinity is not less than five; whether five is less than infinity is refused, whichever is asked
+    // first.
+    expectNumbersRefused([&] { return infinity < five; }, "operator<", logged, sentence);
+    expectNumbersRefused([&] { return infinity > five; }, "operator<", logged, sentence);
+    expectNumbersRefused([&] { return five < infinity; }, "operator<", logged, sentence);
+    expectNumbersRefused([&] { return five > infinity; }, "operator<", logged, sentence);
+
+    // The operands of > change places.
+    const PropertyValue flag = numbers({Number(true)});
+    expectNumbersRefused([&] { return five < flag; }, "operator<",
+                         "<: cannot compare two different kinds of number, kind1=3, kind2=1", sentence);
+    expectNumbersRefused([&] { return five <= flag; }, "operator<",
+                         "<: cannot compare two different kinds of number, kind1=3, kind2=1", sentence);
+    expectNumbersRefused([&] { return five > flag; }, "operator<",
+                         "<: cannot compare two different kinds of number, kind1=1, kind2=3", sentence);
+    expectNumbersRefused([&] { return five >= flag; }, "operator<",
+                         "<: cannot compare two different kinds of number, kind1=1, kind2=3", sentence);
+    EXPECT_FALSE(five == flag);
+}
+
+TEST(PropertyComparison, OfNumberArraysRefusesNotANumberOnlyWhereItIsCompared)
+{
+    const Number notANumber(Number::KIND_NAN);
+    const PropertyValue array = numbers({notANumber});
+    expectNumbersRefused([&] { return array < array; }, "operator<", "<: invalid operation when kind is NaN",
+                         "Invalid operation when kind is NaN");
+    expectNumbersRefused([&] { return array > array; }, "operator<", "<: invalid operation when kind is NaN",
+                         "Invalid operation when kind is NaN");
+    observe::reset();
+    EXPECT_TRUE(array == array);
+    EXPECT_TRUE(array <= array);
+    EXPECT_TRUE(array >= array);
+    expectOrder(numbers({}), array, less);
+    expectOrder(numbers({Number(1u), notANumber}), numbers({Number(2u), notANumber}), less);
+}
+
+TEST(PropertyComparison, OfStringArraysIsLexicographic)
+{
+    expectOrder(texts({}), texts({}), equal);
+    expectOrder(texts({}), texts({""}), less);
+    expectOrder(texts({"a", "b"}), texts({"a", "b"}), equal);
+    expectOrder(texts({"a", "b"}), texts({"a", "c"}), less);
+    expectOrder(texts({"a"}), texts({"a", ""}), less);
+    expectOrder(texts({"b"}), texts({"a", "z"}), greater);
+    expectOrder(texts({"\x80"}), texts({"\x7f", ""}), greater);
+    expectOrder(texts({std::string("a\0b", 3)}), texts({std::string("a\0c", 3)}), less);
+}
+
+TEST(PropertyComparison, IgnoresTheReadOnlyMark)
+{
+    const auto writable = samples(false);
+    const auto readOnly = samples(true);
+    for (unsigned int kind = 0; kind < writable.size(); ++kind)
+        expectOrder(writable[kind], readOnly[kind], equal);
+}
+
+TEST(PropertyComparison, OfDifferentKindsIsUnequalAndNotOrdered)
+{
+    for (const PropertyValue& a : samples(false)) {
+        for (const PropertyValue& b : samples(true)) {
+            if (a.getKind() == b.getKind())
+                continue;
+            SCOPED_TRACE(seen(a) + " and " + seen(b));
+            observe::reset();
+            EXPECT_FALSE(a == b);
+            EXPECT_TRUE(a != b);
+            EXPECT_TRUE(observe::records().empty());
+            const auto refused = [&](auto operation, const std::string& sign) {
+                expectRefusal<PropertyValueInvalidKind>(
+                    operation, "operator" + sign, "Property", "Vexilon.IC.Property",
+                    sign + ": cannot compare two different kinds of properties, kind1="
+                        + std::to_string(static_cast<unsigned int>(a.getKind()))
+                        + ", kind2=" + std::to_string(static_cast<unsigned int>(b.getKind())),
+                    "Cannot compare two different kinds of properties");
+            };
+            refused([&] { return a < b; }, "<");
+            refused([&] { return a <= b; }, "<");
+            refused([&] { return a > b; }, ">");
+            refused([&] { return a >= b; }, ">");
+        }
+    }
+}
+
+TEST(PropertyComparison, OfDifferentKindsIsUnequalAlsoWhereTheContentsLookAlike)
+{
+    const PropertyValue alike[][2] = {
+        {number(Number(3u)), PropertyValue(EnumValue(Number::KIND_UINT32))},
+        {bytes({}), numbers({})},
+        {bytes({}), texts({})},
+        {numbers({}), texts({})},
+        {text("{}"), texts({})},
+        {bytes({}), PropertyValue(PropertyValue::KIND_UNKNOWN)},
+    };
+    for (const auto& [a, b] : alike) {
+        SCOPED_TRACE(seen(a) + " and " + seen(b));
+        EXPECT_FALSE(a == b);
+        EXPECT_FALSE(b == a);
+        EXPECT_TRUE(a != b);
+    }
+}
+
+TEST(PropertyComparison, OfATextAndANumberNamesBothKinds)
+{
+    expectRefusal<PropertyValueInvalidKind>(
+        [] { return PropertyValue("5") < PropertyValue(Number(5u)); }, "operator<", "Property",
+        "Vexilon.IC.Property", "<: cannot compare two different kinds of properties, kind1=2, kind2=1",
+        "Cannot compare two different kinds of properties");
+}
+
+TEST(PropertyComparison, AllocatesNothing)
+{
+    const auto values = samples();
+    const auto others = samples(true);
+    int equals = 0;
+    int lesser = 0;
+    EXPECT_EQ(allocation::countOf([&] {
+                  for (unsigned int kind = 0; kind < values.size(); ++kind) {
+                      equals += values[kind] == others[kind] ? 1 : 0;
+                      lesser += values[kind] < others[kind] || values[kind] > others[kind] ? 1 : 0;
+                  }
+              }),
+              0);
+    EXPECT_EQ(equals, 7);
+    EXPECT_EQ(lesser, 0);
+}
+
+TEST(PropertyText, IsThatOfTheKind)
+{
+    const struct {
+        PropertyValue value;
+        const char* text;
+    } rows[] = {
+        {PropertyValue(PropertyValue::KIND_UNKNOWN), "unknown"},
+        {number(Number(Number::KIND_UNKNOWN)), "unknown"},
+        {number(Number(true)), "true"},
+        {number(Number(-7)), "-7"},
+        {number(Number(1234567.0)), "1.23457e+06"},
+        {number(Number(IC::Version2 {2, 5})), "2.5"},
+        {number(Number(IC::sNodeRef {4, 7})), "CPU:7"},
+        {number(Number(1234567890L, 250)), "1234567890/3"},
+        {text(""), ""},
+        {text("plain \"quoted\" \\ text"), "plain \"quoted\" \\ text"},
+        {bytes({}), ""},
+        {bytes({0x0a}), "0a"},
+        {bytes({0xde, 0xad, 0xbe}), "deadbe"},
+        {bytes({0xde, 0xad, 0xbe, 0xef}), "deadbeef "},
+        {bytes({0xde, 0xad, 0xbe, 0xef, 0x01}), "deadbeef 01"},
+        {bytes({0, 1, 2, 3, 4, 5, 6, 0xff}), "00010203 040506ff "},
+        {PropertyValue(EnumValue(0u)), "0"},
+        {PropertyValue(EnumValue(4294967295u)), "4294967295"},
+        {numbers({}), "{}"},
+        {numbers({Number(1u)}), "{1}"},
+        {numbers({Number(1u), Number(-2), Number(0.5), Number(Number::KIND_NAN)}),
+         "{1, -2, 0.5, not a number}"},
+        {texts({}), "{}"},
+        {texts({""}), "{\"\"}"},
+        {texts({"a\"b", ""}), "{\"a\\\"b\", \"\"}"},
+        {texts({"\"\"", "\\", "a, {b}\n"}), "{\"\\\"\\\"\", \"\\\", \"a, {b}\n\"}"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.text);
+        EXPECT_EQ(row.value.operator std::string(), row.text);
+        std::ostringstream out;
+        EXPECT_EQ(&(out << row.value), &out);
+        EXPECT_EQ(out.str(), row.text);
+    }
+    EXPECT_TRUE(observe::records().empty());
+}
+
+TEST(PropertyText, KeepsEveryByteOfATextAndOfTheElements)
+{
+    std::string all;
+    for (int byte = 0; byte < 256; ++byte)
+        all += static_cast<char>(byte);
+    EXPECT_EQ(text(all).operator std::string(), all);
+
+    std::string escaped = all;
+    escaped.insert(0x22, 1, '\\');  // before the one double quote
+    EXPECT_EQ(texts({all}).operator std::string(), "{\"" + escaped + "\"}");
+}
+
+TEST(PropertyText, OfNumbersWritesOtherKindsAmongRunsOf32BitNumbers)
+{
+    const PropertyValue mixed = numbers({Number(1u), Number(4294967295u), Number(12345ull), Number(true),
+                                         Number(77777777u), Number(-1), Number(0u)});
+    EXPECT_EQ(mixed.operator std::string(), "{1, 4294967295, 12345, true, 77777777, -1, 0}");
+    EXPECT_EQ(numbers({Number(2.5), Number(100u), Number(99u)}).operator std::string(), "{2.5, 100, 99}");
+}
+
+TEST(PropertyText, OfManyNumbersIsTheirTextsOneAfterAnother)
+{
+    NumberArray numbers;
+    std::string expected;
+    for (unsigned int i = 0; i < 3000; ++i) {
+        const unsigned int number = i * i * 477;  // up to ten digits
+        numbers.emplace_back(number);
+        expected += (expected.empty() ? "{" : ", ") + std::to_string(number);
+        if (i % 3 == 0) {
+            SCOPED_TRACE(i);
+            EXPECT_EQ(PropertyValue(numbers).operator std::string(), expected + "}");
+        }
+    }
+}
+
+TEST(PropertyText, OfTheLongestNumbersIsWholeHoweverMuchStandsBeforeThem)
+{
+    const NumberArray longest {Number(4294967295u), Number(18446744073709551615ull), Number(-2147483647 - 1),
+                               Number(-1.23457e-308), Number(-123456.4)};
+    const std::string texts[] = {"4294967295", "18446744073709551615", "-2147483648", "-1.23457e-308",
+                                 "-123456"};
+    for (std::size_t i = 0; i < longest.size(); ++i) {
+        // "10, " moves by one what "1, " repeats every three: so every length is met.
+        for (std::size_t tens = 0; tens < 3; ++tens) {
+            NumberArray numbers(tens, Number(10));
+            std::string expected = "{";
+            for (std::size_t ten = 0; ten < tens; ++ten)
+                expected += "10, ";
+            for (int ones = 0; ones < 400; ++ones) {
+                numbers.push_back(longest[i]);
+                ASSERT_EQ(PropertyValue(numbers).operator std::string(), expected + texts[i] + '}');
+                numbers.back() = Number(1);  // signed, so that each is written by itself
+                expected += "1, ";
+            }
+        }
+    }
+}
+
+TEST(PropertyText, OfBytesHasABlankAfterEveryFourthWhateverTheLength)
+{
+    Buffer values;
+    std::string whole;
+    for (unsigned int length = 1; length <= 1024; ++length) {
+        values.push_back(0xa5);
+        whole += "a5";
+        if (length % 4 == 0)
+            whole += ' ';
+        ASSERT_EQ(bytes(values).operator std::string(), whole) << "of " << length << " bytes";
+    }
+}
+
+TEST(PropertyText, OfNumbersWritesTheRecordsOfTheirTexts)
+{
+    EXPECT_EQ(numbers({Number(5u), Number(1234567890L, 123)}).operator std::string(),
+              "{5, 1234567890/3.Conversion failed remainder>0}");
+    const auto records = observe::records();
+    ASSERT_EQ(records.size(), 2u);
+    expectRecordPair(records, 0, "operator std::string", "Number", "Vexilon.IC.Number", 6000,
+                     "string: conversion failed, remainder not zero, remainder=3");
+}
+
+TEST(PropertyText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
+{
+    const GlobalGroupingLocale grouping;
+    EXPECT_EQ(number(Number(1234567u)).operator std::string(), "1,234,567");
+    EXPECT_EQ(number(Number(-1234567)).operator std::string(), "-1,234,567");
+    EXPECT_EQ(number(Number(12345.0)).operator std::string(), "12,345");
+    EXPECT_EQ(PropertyValue(EnumValue(4294967295u)).operator std::string(), "4,294,967,295");
+    EXPECT_EQ(numbers({Number(1000ull), Number(999u)}).operator std::string(), "{1,000, 999}");
+    EXPECT_EQ(numbers({Number(1000u), Number(1000000u)}).operator std::string(), "{1,000, 1,000,000}");
+    EXPECT_EQ(number(Number(IC::sNodeRef {4, 1234})).operator std::string(), "CPU:1,234");
+    EXPECT_EQ(text("1234567").operator std::string(), "1234567");
+    EXPECT_EQ(texts({"1234567"}).operator std::string(), "{\"1234567\"}");
+    EXPECT_EQ(bytes({0x12, 0x34, 0x56, 0x78, 0x90}).operator std::string(), "12345678 90");
+}
+
+TEST(PropertyText, OfManyNumbersIsWholeHoweverLongItBecomes)
+{
+    NumberArray all;
+    std::string expected = "{";
+    for (int i = 0; i < 1000; ++i) {
+        all.push_back(Number(i));  // signed numbers are written one by one
+        expected.append(i == 0 ? "" : ", ").append(std::to_string(i));
+    }
+    EXPECT_EQ(numbers(all).operator std::string(), expected.append("}"));
+}
+
+TEST(PropertyText, IsWholeOrNotAtAllWhenMemoryRunsOut)
+{
+    const std::string longText(100, 'x');
+    const auto check = [&] {
+        for (const PropertyValue& value :
+             {text(longText), texts({longText, "a\"b", longText}), bytes(Buffer(50, 7)),
+              numbers(NumberArray(40, Number(123456u))), number(Number(IC::sNodeRef {29, 4294967295u}))}) {
+            const std::string whole = value;
+            SCOPED_TRACE(whole);
+            allocation::expectTextWholeOrNotAtAll(value, whole);
+        }
+    };
+    check();
+    const GlobalGroupingLocale grouping;
+    check();
+}
+
+TEST(PropertyStream, InsertsTheValueAsOneText)
+{
+    const struct {
+        PropertyValue value;
+        const char* text;
+    } rows[] = {
+        {PropertyValue(PropertyValue::KIND_UNKNOWN), "*****unknown"},
+        {number(Number(3600u)), "********3600"},
+        {text("abc"), "*********abc"},
+        {text(""), "************"},
+        {bytes({1, 2, 3, 4}), "***01020304 "},
+        {PropertyValue(EnumValue(255u)), "*********255"},
+        {numbers({Number(1u), Number(2u)}), "******{1, 2}"},
+        {texts({"a", "b"}), "**{\"a\", \"b\"}"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.text);
+        std::ostringstream out;
+        out.imbue(groupingLocale(1));
+        out << std::hex << std::showbase << std::uppercase << std::setfill('*') << std::setw(12) << row.value;
+        EXPECT_EQ(out.str(), row.text);
+        EXPECT_EQ(out.width(), 0);
+    }
+}
+
+TEST(PropertyStream, AlignsTheValueAsAText)
+{
+    std::ostringstream out;
+    out << std::left << std::setfill('.') << std::setw(6) << text("abc") << '|';
+    EXPECT_EQ(out.str(), "abc...|");
+}
+
+TEST(PropertyStream, WritesNothingToAStreamThatIsBad)
+{
+    std::ostringstream out;
+    out.setstate(std::ios_base::failbit);
+    out << text("abc");
+    EXPECT_EQ(out.str(), "");
+}
+
+using Pair = std::pair<unsigned int, PropertyValue>;
+
+TEST(PropertyStream, WritesANumberedProperty)
+{
+    std::ostringstream out;
+    EXPECT_EQ(&(out << Pair(7, text("abc"))), &out);
+    out << '|' << Pair(0, text("")) << '|' << Pair(4294967295u, numbers({Number(1u), Number(2u)}));
+    EXPECT_EQ(out.str(), "7 = abc|0 = |4294967295 = {1, 2}");
+}
+
+TEST(PropertyStream, WritesTheNumberOfAPropertyWithTheStreamsSettings)
+{
+    std::ostringstream out;
+    out << std::hex << std::showbase << Pair(255, number(Number(255u)));
+    EXPECT_EQ(out.str(), "0xff = 255");
+
+    std::ostringstream grouping;
+    grouping.imbue(groupingLocale());
+    grouping << Pair(1234, number(Number(1234u)));
+    EXPECT_EQ(grouping.str(), "1,234 = 1234");
+
+    std::ostringstream plain;
+    plain.imbue(std::locale::classic());
+    const GlobalGroupingLocale global;
+    plain << Pair(1234, number(Number(1234u)));
+    EXPECT_EQ(plain.str(), "1234 = 1,234");
+}
+
+TEST(PropertyStream, AppliesAWidthToTheNumberOfAProperty)
+{
+    std::ostringstream out;
+    out << std::setfill('0') << std::setw(4) << Pair(7, text("x")) << '|' << Pair(8, text("y"));
+    EXPECT_EQ(out.str(), "0007 = x|8 = y");
+}
+
+TEST(PropertyStream, WritesAMapInTheOrderOfItsNumbers)
+{
+    const PropertyMap map {{7, numbers({Number(1u), Number(2u)})}, {1, text("abc")}};
+    std::ostringstream out;
+    EXPECT_EQ(&(out << map), &out);
+    EXPECT_EQ(out.str(), "[1 = abc], [7 = {1, 2}]");
+
+    std::ostringstream three;
+    three << PropertyMap {
+        {3, text("c")}, {4294967295u, PropertyValue(PropertyValue::KIND_UNKNOWN)}, {0, text("")}};
+    EXPECT_EQ(three.str(), "[0 = ], [3 = c], [4294967295 = unknown]");
+}
+
+TEST(PropertyStream, WritesAMapOfOne)
+{
+    std::ostringstream out;
+    out << PropertyMap {{3, text("x")}};
+    EXPECT_EQ(out.str(), "[3 = x]");
+}
+
+TEST(PropertyStream, WritesNothingForAnEmptyMap)
+{
+    std::ostringstream out;
+    EXPECT_EQ(&(out << PropertyMap()), &out);
+    EXPECT_EQ(out.str(), "");
+    EXPECT_TRUE(out.good());
+}
+
+TEST(PropertyStream, AppliesAWidthToTheFirstPieceOfAMap)
+{
+    std::ostringstream out;
+    out << std::setfill('.') << std::setw(3) << PropertyMap {{3, text("x")}, {4, text("y")}};
+    EXPECT_EQ(out.str(), "..[3 = x], [4 = y]");
+}
+
+TEST(PropertyStream, WritesTheNumbersOfAMapWithTheStreamsSettings)
+{
+    std::ostringstream out;
+    out << std::hex << PropertyMap {{10, number(Number(10u))}, {255, PropertyValue(EnumValue(255u))}};
+    EXPECT_EQ(out.str(), "[a = 10], [ff = 255]");
+}
+
+TEST(PropertyStream, WritesAMapWhateverTheMarks)
+{
+    std::ostringstream out;
+    out << PropertyMap {{1, PropertyValue("a", true)}, {2, PropertyValue("b", false)}};
+    EXPECT_EQ(out.str(), "[1 = a], [2 = b]");
+}
+
+TEST(PropertyByteText, IsTwoLowerCaseHexadecimalDigits)
+{
+    const struct {
+        unsigned char byte;
+        const char* text;
+    } rows[] = {{0, "00"},    {1, "01"},    {0x09, "09"}, {0x0a, "0a"}, {0x0f, "0f"}, {0x10, "10"},
+                {0x7f, "7f"}, {0x80, "80"}, {0x9a, "9a"}, {0xa9, "a9"}, {0xf0, "f0"}, {0xff, "ff"}};
+    for (const auto& row : rows)
+        EXPECT_EQ(IC::pB(row.byte), row.text);
+    const GlobalGroupingLocale grouping(1);
+    for (const auto& row : rows)
+        EXPECT_EQ(IC::pB(row.byte), row.text);
+}
+
+TEST(PropertyByteText, NamesEveryByte)
+{
+    const std::string digits = "0123456789abcdef";
+    for (unsigned int byte = 0; byte < 256; ++byte)
+        EXPECT_EQ(IC::pB(static_cast<unsigned char>(byte)),
+                  std::string({digits[byte / 16], digits[byte % 16]}));
+}
+
+TEST(PropertyComparison, AfterARefusedSetKindIsUnequalAndNotOrdered)
+{
+    for (const PropertyValue& original : samples()) {
+        if (original.getKind() == PropertyValue::KIND_UNKNOWN)
+            continue;
+        SCOPED_TRACE(seen(original));
+        PropertyValue gone(original);
+        EXPECT_THROW(gone.setKind(7), PropertyValueInvalidKind);
+        observe::reset();
+        EXPECT_FALSE(gone == original);
+        EXPECT_FALSE(original == gone);
+        EXPECT_FALSE(gone < original);
+        EXPECT_FALSE(gone > original);
+        EXPECT_FALSE(original < gone);
+        EXPECT_FALSE(original > gone);
+        EXPECT_TRUE(gone == PropertyValue(gone));
+        EXPECT_FALSE(gone < PropertyValue(gone));
+        EXPECT_FALSE(gone > PropertyValue(gone));
+        EXPECT_TRUE(observe::records().empty());
+    }
+}
+
+TEST(PropertyStream, WritesNulBytes)
+{
+    std::ostringstream out;
+    out << PropertyValue(std::string("a\0b", 3));
+    EXPECT_EQ(out.str(), std::string("a\0b", 3));
+}
+
+TEST(PropertyText, FollowsTheLocaleThatWasGlobalAtItsStart)
+{
+    const PropertyValue value(NumberArray {Number(5L, 1), Number(1234567u)});
+    std::string text;
+    {
+        const GlobalGroupingLocale restore(3);
+        std::locale::global(std::locale::classic());
+        observe::onRecord([](const observe::Record&) { std::locale::global(groupingLocale()); });
+        text = value.operator std::string();
+        observe::onRecord(nullptr);
+        std::locale::global(std::locale::classic());
+    }
+    std::locale::global(std::locale::classic());
+    EXPECT_EQ(text, "{5/3.Conversion failed remainder>0, 1234567}");
+}
+
+}  // namespace

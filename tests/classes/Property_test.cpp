@@ -1,0 +1,733 @@
+#include <cstddef>
+#include <functional>
+#include <stdexcept>
+#include <string>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "support/AllocationFailure.h"
+#include "IC/Alert.h"
+#include "IC/EnumValue.h"
+#include "IC/Error.h"
+#include "IC/ICException.h"
+#include "IC/Node.h"
+#include "IC/Number.h"
+#include "IC/Property.h"
+#include "support/PropertySamples.h"
+#include "ZQ/DateTime.h"
+#include "observe/Refusal.h"
+
+namespace {
+
+using allocation::completesWith;
+using allocation::countOf;
+using IC::EnumValue;
+using IC::Number;
+using IC::PropertyValue;
+using IC::PropertyValueInvalidKind;
+
+static_assert(std::is_same_v<IC::Buffer, std::vector<unsigned char>>);
+static_assert(std::is_same_v<IC::NumberArray, std::vector<IC::Number>>);
+static_assert(std::is_same_v<IC::StringArray, std::vector<std::string>>);
+
+static_assert(std::is_same_v<std::underlying_type_t<PropertyValue::KindType>, ZQ::Uint32>);
+static_assert(std::is_convertible_v<PropertyValue::KindType, unsigned int>);  // unscoped
+static_assert(PropertyValue::KIND_UNKNOWN == 0);
+static_assert(PropertyValue::KIND_NUMBER == 1);
+static_assert(PropertyValue::KIND_STRING == 2);
+static_assert(PropertyValue::KIND_BUFFER == 3);
+static_assert(PropertyValue::KIND_ENUMVALUE == 4);
+static_assert(PropertyValue::KIND_NUMBERARRAY == 5);
+static_assert(PropertyValue::KIND_STRINGARRAY == 6);
+
+static_assert(std::is_trivially_copyable_v<EnumValue>);
+
+static_assert(!std::is_default_constructible_v<PropertyValue>);
+static_assert(std::is_copy_constructible_v<PropertyValue>);
+static_assert(std::is_copy_assignable_v<PropertyValue>);
+static_assert(std::is_nothrow_move_constructible_v<PropertyValue>);
+static_assert(std::is_nothrow_move_assignable_v<PropertyValue>);
+static_assert(std::is_nothrow_swappable_v<PropertyValue>);
+static_assert(noexcept(std::declval<PropertyValue&>().swap(std::declval<PropertyValue&>())));
+static_assert(std::is_nothrow_destructible_v<PropertyValue>);
+
+// The read-only mark may be left out, and it may be a temporary.
+template <class Value>
+constexpr bool makesProperty =
+    std::is_constructible_v<PropertyValue, Value>&& std::is_constructible_v<PropertyValue, Value, bool>;
+static_assert(makesProperty<const std::string&>);
+static_assert(makesProperty<const char*>);
+static_assert(makesProperty<const Number&>);
+static_assert(makesProperty<const EnumValue&>);
+static_assert(makesProperty<const IC::Buffer&>);
+static_assert(makesProperty<const IC::NumberArray&>);
+static_assert(makesProperty<const IC::StringArray&>);
+static_assert(makesProperty<const unsigned char&>);
+static_assert(makesProperty<const PropertyValue::KindType&>);
+
+// These would silently become a kind code.
+static_assert(!std::is_constructible_v<PropertyValue, bool>);
+static_assert(!std::is_constructible_v<PropertyValue, bool, bool>);
+static_assert(!std::is_constructible_v<PropertyValue, float>);
+static_assert(!std::is_constructible_v<PropertyValue, double>);
+static_assert(!std::is_constructible_v<PropertyValue, double, bool>);
+static_assert(!std::is_constructible_v<PropertyValue, long double>);
+static_assert(!std::is_constructible_v<PropertyValue, Number::KindType>);
+static_assert(!std::is_constructible_v<PropertyValue, IC::Error::StatusType>);
+static_assert(!std::is_constructible_v<PropertyValue, IC::Alert::SeverityType>);
+static_assert(!std::is_constructible_v<PropertyValue, IC::Alert::ClassType>);
+static_assert(!std::is_constructible_v<PropertyValue, IC::Node::SensorType>);
+static_assert(!std::is_constructible_v<PropertyValue, IC::Node::StatusType, bool>);
+
+// What changes the object held is nobody else's business.
+template <class T, class = void>
+constexpr bool offersInitKind = false;
+template <class T>
+constexpr bool
+    offersInitKind<T, std::void_t<decltype(std::declval<T&>().initKind(std::declval<unsigned char>()))>> =
+        true;
+template <class T, class = void>
+constexpr bool offersFreeValue = false;
+template <class T>
+constexpr bool offersFreeValue<T, std::void_t<decltype(std::declval<T&>().freeValue())>> = true;
+template <class T, class = void>
+constexpr bool offersFreeValueIfNotSameKind = false;
+template <class T>
+constexpr bool
+    offersFreeValueIfNotSameKind<T, std::void_t<decltype(std::declval<T&>().freeValueIfNotSameKind(1u))>> =
+        true;
+static_assert(!offersInitKind<PropertyValue>);
+static_assert(!offersFreeValue<PropertyValue>);
+static_assert(!offersFreeValueIfNotSameKind<PropertyValue>);
+
+constexpr unsigned int kinds = 7;
+
+constexpr unsigned char byte(unsigned int code)
+{
+    return static_cast<unsigned char>(code);
+}
+
+template <class Operation>
+void expectInvalidKind(Operation operation, unsigned int code)
+{
+    expectRefusal<PropertyValueInvalidKind>(operation, "initKind", "Property", "Vexilon.IC.Property",
+                                            "PropertyValue:initKind: invalid kind of property: "
+                                                + std::to_string(code),
+                                            "Invalid kind of property");
+}
+
+std::string between(const PropertyValue& from, const PropertyValue& to)
+{
+    return "from " + seen(from) + " to " + seen(to);
+}
+
+// A date-time of a scope and with milliseconds that nothing makes up.
+Number rareDateTime()
+{
+    ZQ::DateTime time(1234567890L, 1);
+    time.setMillisecond(250);
+    return Number(time);
+}
+
+void expectRareDateTime(const Number& number)
+{
+    const ZQ::DateTime time = number.operator ZQ::DateTime();
+    EXPECT_EQ(time.operator long(), 1234567890L);
+    EXPECT_EQ(time.getMillisecond(), 250u);
+    EXPECT_EQ(time.getScope(), 1u);
+}
+
+TEST(PropertyConstructor, GivesTheKindOfItsArgumentAndAWritableValue)
+{
+    const IC::Version2 version {2, 15};
+    const struct {
+        PropertyValue value;
+        const char* seen;
+    } rows[] = {
+        {PropertyValue(std::string("abc")), "2 writable: abc"},
+        {PropertyValue("abc"), "2 writable: abc"},
+        {PropertyValue(Number(3600u)), "1 writable: 3600"},
+        {PropertyValue(Number(version)), "1 writable: 2.15"},
+        {PropertyValue(EnumValue(4294967295u)), "4 writable: 4294967295"},
+        {PropertyValue(IC::Buffer {0x0a, 0xff}), "3 writable: 0aff"},
+        {PropertyValue(IC::NumberArray {Number(1u), Number(true)}), "5 writable: {1, true}"},
+        {PropertyValue(IC::StringArray {"a", ""}), "6 writable: {\"a\", \"\"}"},
+        {PropertyValue(byte(2)), "2 writable: "},
+        {PropertyValue(PropertyValue::KIND_ENUMVALUE), "4 writable: 0"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.seen);
+        EXPECT_EQ(seen(row.value), row.seen);
+        EXPECT_EQ(row.value.operator PropertyValue::KindType(), row.value.getKind());
+    }
+}
+
+TEST(PropertyConstructor, TakesTheReadOnlyMarkLast)
+{
+    const std::string text = "abc";
+    const Number number(3600u);
+    const EnumValue enumerated(7u);
+    const IC::Buffer bytes {0x0a, 0xff};
+    const IC::NumberArray numbers {Number(1u)};
+    const IC::StringArray texts {"a"};
+    for (const bool mark : {false, true}) {
+        SCOPED_TRACE(mark);
+        const std::string name = mark ? " read-only: " : " writable: ";
+        EXPECT_EQ(seen(PropertyValue(text, mark)), "2" + name + "abc");
+        EXPECT_EQ(seen(PropertyValue("abc", mark)), "2" + name + "abc");
+        EXPECT_EQ(seen(PropertyValue(number, mark)), "1" + name + "3600");
+        EXPECT_EQ(seen(PropertyValue(enumerated, mark)), "4" + name + "7");
+        EXPECT_EQ(seen(PropertyValue(bytes, mark)), "3" + name + "0aff");
+        EXPECT_EQ(seen(PropertyValue(numbers, mark)), "5" + name + "{1}");
+        EXPECT_EQ(seen(PropertyValue(texts, mark)), "6" + name + "{\"a\"}");
+        EXPECT_EQ(seen(PropertyValue(byte(3), mark)), "3" + name);
+        EXPECT_EQ(seen(PropertyValue(PropertyValue::KIND_UNKNOWN, mark)), "0" + name + "unknown");
+    }
+}
+
+TEST(PropertyConstructor, CopiesItsArgument)
+{
+    std::string text = "a text that needs memory of its own";
+    IC::Buffer bytes {0x0a, 0xff};
+    IC::NumberArray numbers {Number(1u)};
+    IC::StringArray texts {"a"};
+    const PropertyValue fromText(text);
+    const PropertyValue fromBytes(bytes);
+    const PropertyValue fromNumbers(numbers);
+    const PropertyValue fromTexts(texts);
+    text[0] = 'A';
+    bytes[0] = 0;
+    numbers.clear();
+    texts[0] = "b";
+    EXPECT_EQ(seen(fromText), "2 writable: a text that needs memory of its own");
+    EXPECT_EQ(seen(fromBytes), "3 writable: 0aff");
+    EXPECT_EQ(seen(fromNumbers), "5 writable: {1}");
+    EXPECT_EQ(seen(fromTexts), "6 writable: {\"a\"}");
+}
+
+TEST(PropertyConstructor, TakesTemporariesWhole)
+{
+    EXPECT_EQ(seen(PropertyValue(std::string("a text that needs memory of its own"), true)),
+              "2 read-only: a text that needs memory of its own");
+    EXPECT_EQ(seen(PropertyValue(IC::Buffer {1, 2, 3, 4, 5}, true)), "3 read-only: 01020304 05");
+    EXPECT_EQ(seen(PropertyValue(IC::NumberArray {Number(1u), Number(2u)}, true)), "5 read-only: {1, 2}");
+    EXPECT_EQ(seen(PropertyValue(IC::StringArray {"a", "b"}, true)), "6 read-only: {\"a\", \"b\"}");
+}
+
+TEST(PropertyConstructor, KeepsEveryByteOfAStringAndEndsCharactersAtTheFirstNul)
+{
+    const std::string text("a\0b", 3);
+    EXPECT_EQ(PropertyValue(text).operator std::string(), text);
+    EXPECT_EQ(PropertyValue(text.c_str()).operator std::string(), "a");
+}
+
+TEST(PropertyConstructor, GivesAnEmptyTextForBothEmptyTexts)
+{
+    EXPECT_EQ(seen(PropertyValue("")), "2 writable: ");
+    EXPECT_EQ(seen(PropertyValue(std::string())), "2 writable: ");
+}
+
+TEST(PropertyConstructor, RefusesNullCharactersAsAStringDoes)
+{
+    const char* const none = nullptr;
+    for (const bool readOnly : {false, true}) {
+        EXPECT_THAT([&] { PropertyValue(none, readOnly); },
+                    testing::ThrowsMessage<std::logic_error>("a text is a null pointer"));
+    }
+    EXPECT_TRUE(observe::records().empty());
+}
+
+TEST(PropertyConstructor, CopiesANumberWhole)
+{
+    expectRareDateTime(PropertyValue(rareDateTime()).operator Number());
+    EXPECT_EQ(seen(PropertyValue(Number(IC::sNodeRef {4, 7}))), "1 writable: CPU:7");
+}
+
+TEST(PropertyConstructor, TakesAnIntegerForAKindCode)
+{
+    EXPECT_EQ(seen(PropertyValue(5)), "5 writable: {}");
+    EXPECT_EQ(seen(PropertyValue(2, true)), "2 read-only: ");
+}
+
+// A compiler may leave out the memory of a value that nobody looks at.
+void lookAt(const PropertyValue& value)
+{
+    asm volatile("" : : "r"(&value) : "memory");
+}
+
+TEST(PropertyConstructor, GivesBackAllMemoryWhenItRunsOut)
+{
+    const std::string text = "a text that needs memory of its own";
+    const IC::Buffer bytes(5, 1);
+    const IC::NumberArray numbers(3, Number(1u));
+    const IC::StringArray texts(3, text);
+    std::vector<std::function<void()>> constructions = {
+        [&] { lookAt(PropertyValue(text)); },       [&] { lookAt(PropertyValue(text.c_str())); },
+        [&] { lookAt(PropertyValue(Number(1u))); }, [&] { lookAt(PropertyValue(EnumValue(1u))); },
+        [&] { lookAt(PropertyValue(bytes)); },      [&] { lookAt(PropertyValue(numbers)); },
+        [&] { lookAt(PropertyValue(texts)); },      [&] { lookAt(PropertyValue(IC::StringArray(2, text))); },
+    };
+    const auto sources = samples();
+    for (unsigned int code = 1; code < kinds; ++code) {
+        constructions.push_back([code] { lookAt(PropertyValue(byte(code))); });
+        constructions.push_back([&sources, code] { lookAt(PropertyValue(sources[code])); });
+    }
+    for (std::size_t row = 0; row < constructions.size(); ++row) {
+        SCOPED_TRACE(row);
+        const long before = allocation::aliveNow;
+        long allowed = 0;
+        while (!completesWith(allowed, constructions[row]) && allowed < 100)
+            ++allowed;
+        EXPECT_EQ(allocation::aliveNow, before);
+        EXPECT_GT(allowed, 0);
+        EXPECT_LT(allowed, 100);
+    }
+}
+
+TEST(PropertyKind, GivesTheFirstValueOfEachKind)
+{
+    const struct {
+        unsigned int code;
+        const char* seen;
+    } rows[] = {{0, "0 writable: unknown"}, {1, "1 writable: unknown"}, {2, "2 writable: "},
+                {3, "3 writable: "},        {4, "4 writable: 0"},       {5, "5 writable: {}"},
+                {6, "6 writable: {}"}};
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.seen);
+        EXPECT_EQ(seen(PropertyValue(byte(row.code))), row.seen);
+        EXPECT_EQ(seen(PropertyValue(static_cast<PropertyValue::KindType>(row.code))), row.seen);
+        PropertyValue changed(byte(row.code == 4 ? 2 : 4));
+        changed.setKind(byte(row.code));
+        EXPECT_EQ(seen(changed), row.seen);
+    }
+    EXPECT_EQ(PropertyValue(PropertyValue::KIND_NUMBER).operator Number().getKind(), Number::KIND_UNKNOWN);
+    EXPECT_TRUE(observe::records().empty());
+}
+
+TEST(PropertyKind, RefusesEveryCodeAboveSix)
+{
+    for (unsigned int code = kinds; code <= 255; ++code) {
+        SCOPED_TRACE(code);
+        expectInvalidKind([&] { return PropertyValue(byte(code)); }, code);
+        expectInvalidKind([&] { return PropertyValue(byte(code), true); }, code);
+    }
+}
+
+TEST(PropertyKind, IsCutToItsLowEightBitsFirst)
+{
+    for (const unsigned int high : {0u, 0x100u, 0xFFFFFF00u}) {
+        for (unsigned int low = 0; low <= 255; ++low) {
+            const auto kind = static_cast<PropertyValue::KindType>(high | low);
+            SCOPED_TRACE(high | low);
+            if (low < kinds)
+                EXPECT_EQ(PropertyValue(kind).getKind(), low);
+            else
+                expectInvalidKind([&] { return PropertyValue(kind); }, low);
+        }
+    }
+}
+
+TEST(PropertyKind, ChangedToItselfKeepsTheValue)
+{
+    for (const bool mark : {false, true}) {
+        for (const PropertyValue& original : samples(mark)) {
+            PropertyValue value(original);
+            value.setKind(byte(value.getKind()));
+            EXPECT_EQ(seen(value), seen(original));
+        }
+    }
+    PropertyValue text("abc");
+    text.setKind(2);
+    EXPECT_EQ(seen(text), "2 writable: abc");
+}
+
+TEST(PropertyKind, ChangedToAnotherGivesItsFirstValueAndKeepsTheMark)
+{
+    for (const bool mark : {false, true}) {
+        for (const PropertyValue& original : samples(mark)) {
+            for (unsigned int code = 0; code < kinds; ++code) {
+                if (code == original.getKind())
+                    continue;
+                SCOPED_TRACE(seen(original) + " to " + std::to_string(code));
+                PropertyValue value(original);
+                value.setKind(byte(code));
+                EXPECT_EQ(seen(value), seen(PropertyValue(byte(code), mark)));
+            }
+        }
+    }
+    EXPECT_TRUE(observe::records().empty());
+}
+
+TEST(PropertyKind, ChangeLeavesTheOldValueWhenMemoryRunsOut)
+{
+    for (const bool mark : {false, true}) {
+        for (const PropertyValue& original : samples(mark)) {
+            for (unsigned int code = 0; code < kinds; ++code) {
+                SCOPED_TRACE(seen(original) + " to " + std::to_string(code));
+                for (long allowed = 0;; ++allowed) {
+                    ASSERT_LT(allowed, 100);
+                    PropertyValue value(original);
+                    if (completesWith(allowed, [&] { value.setKind(byte(code)); })) {
+                        EXPECT_EQ(allowed > 0, code != 0 && code != original.getKind());
+                        EXPECT_EQ(value.getKind(), code);
+                        break;
+                    }
+                    EXPECT_EQ(seen(value), seen(original));
+                }
+            }
+        }
+    }
+}
+
+TEST(PropertyKind, RefusedChangeKeepsKindAndMarkAndLeavesRoomForAnotherKind)
+{
+    for (const bool mark : {false, true}) {
+        for (const PropertyValue& original : samples(mark)) {
+            for (const unsigned int refused : {7u, 8u, 128u, 255u}) {
+                SCOPED_TRACE(seen(original) + " to " + std::to_string(refused));
+                PropertyValue value(original);
+                expectInvalidKind([&] { value.setKind(byte(refused)); }, refused);
+                EXPECT_EQ(value.getKind(), original.getKind());
+                EXPECT_EQ(value.readOnly(), mark);
+
+                const unsigned int next = original.getKind() == 6 ? 5 : original.getKind() + 1;
+                value.setKind(byte(next));
+                EXPECT_EQ(seen(value), seen(PropertyValue(byte(next), mark)));
+            }
+        }
+    }
+}
+
+TEST(PropertyKind, RefusedChangeLeavesAValueThatCanBeDestroyed)
+{
+    for (unsigned int refused = kinds; refused <= 255; ++refused) {
+        PropertyValue value("a text that needs memory of its own");
+        expectInvalidKind([&] { value.setKind(byte(refused)); }, refused);
+    }
+}
+
+TEST(PropertyKind, RefusedChangeCanBeRefusedAgain)
+{
+    for (const PropertyValue& original : samples()) {
+        SCOPED_TRACE(seen(original));
+        PropertyValue value(original);
+        expectInvalidKind([&] { value.setKind(7); }, 7);
+        expectInvalidKind([&] { value.setKind(255); }, 255);
+        EXPECT_EQ(value.getKind(), original.getKind());
+    }
+}
+
+TEST(PropertyKind, RefusedChangeLeavesAValueThatCanBeAssigned)
+{
+    for (const PropertyValue& original : samples()) {
+        for (const PropertyValue& source : otherSamples(true)) {
+            SCOPED_TRACE(between(source, original));
+            PropertyValue value(original);
+            expectInvalidKind([&] { value.setKind(7); }, 7);
+            value = source;
+            EXPECT_EQ(seen(value), seen(source));
+        }
+    }
+}
+
+TEST(PropertyKind, RefusedChangeOfNothingCostsNothing)
+{
+    PropertyValue value(PropertyValue::KIND_UNKNOWN, true);
+    expectInvalidKind([&] { value.setKind(7); }, 7);
+    EXPECT_EQ(seen(value), "0 read-only: unknown");
+}
+
+TEST(PropertyCopy, HasTheSourcesKindValueAndMark)
+{
+    for (const bool mark : {false, true}) {
+        for (const PropertyValue& source : samples(mark)) {
+            const PropertyValue copy(source);
+            EXPECT_EQ(seen(copy), seen(source));
+            EXPECT_TRUE(copy == source);
+        }
+    }
+    const PropertyValue source(rareDateTime());
+    expectRareDateTime(PropertyValue(source).operator Number());
+}
+
+TEST(PropertyCopy, IsIndependentOfItsSource)
+{
+    const auto others = otherSamples();
+    for (PropertyValue& source : std::vector<PropertyValue>(samples())) {
+        const std::string before = seen(source);
+        SCOPED_TRACE(before);
+        PropertyValue copy(source);
+        source = others[source.getKind()];
+        EXPECT_EQ(seen(copy), before);
+        source.setKind(byte(source.getKind() == 2 ? 3 : 2));
+        EXPECT_EQ(seen(copy), before);
+        copy = PropertyValue("changed", true);
+        EXPECT_EQ(source.readOnly(), false);
+        EXPECT_NE(seen(source), seen(copy));
+    }
+}
+
+TEST(PropertyCopy, OfNumbersIsIndependent)
+{
+    PropertyValue first(IC::NumberArray {Number(1u), Number(2u)});
+    const PropertyValue second(first);
+    first = PropertyValue(IC::NumberArray {Number(3u)});
+    EXPECT_EQ(seen(first), "5 writable: {3}");
+    EXPECT_EQ(seen(second), "5 writable: {1, 2}");
+}
+
+TEST(PropertyCopy, AllocatesOnceForEachObjectThatItOwns)
+{
+    // The object of the kind; its characters or elements; what each element owns.
+    const long expected[] = {0, 1, 2, 2, 1, 2, 3};
+    for (const PropertyValue& source : samples()) {
+        SCOPED_TRACE(seen(source));
+        EXPECT_EQ(countOf([&] { const PropertyValue copy(source); }), expected[source.getKind()]);
+    }
+}
+
+TEST(PropertyAssignment, GivesTheSourcesKindValueAndMark)
+{
+    for (const bool targetMark : {false, true}) {
+        for (const bool sourceMark : {false, true}) {
+            for (const PropertyValue& old : samples(targetMark)) {
+                for (const PropertyValue& source : otherSamples(sourceMark)) {
+                    SCOPED_TRACE(between(source, old));
+                    const std::string before = seen(source);
+                    PropertyValue target(old);
+                    EXPECT_EQ(&(target = source), &target);
+                    EXPECT_EQ(seen(target), before);
+                    EXPECT_EQ(seen(source), before);
+                }
+            }
+        }
+    }
+    EXPECT_TRUE(observe::records().empty());
+}
+
+TEST(PropertyAssignment, IsADeepCopy)
+{
+    for (const PropertyValue& old : samples()) {
+        for (PropertyValue& source : std::vector<PropertyValue>(otherSamples(true))) {
+            SCOPED_TRACE(between(source, old));
+            const std::string before = seen(source);
+            PropertyValue target(old);
+            target = source;
+            source = PropertyValue("a changed text that needs memory of its own");
+            EXPECT_EQ(seen(target), before);
+        }
+    }
+}
+
+TEST(PropertyAssignment, CopiesANumberWhole)
+{
+    const PropertyValue source(rareDateTime());
+    const PropertyValue nodeRef(Number(IC::sNodeRef {4, 7}));
+    for (const PropertyValue& old : samples()) {
+        SCOPED_TRACE(seen(old));
+        PropertyValue target(old);
+        target = source;
+        expectRareDateTime(target.operator Number());
+        target = nodeRef;
+        EXPECT_EQ(seen(target), "1 writable: CPU:7");
+    }
+}
+
+TEST(PropertyAssignment, ToItselfChangesNothing)
+{
+    for (const bool mark : {false, true}) {
+        for (PropertyValue& value : std::vector<PropertyValue>(samples(mark))) {
+            const std::string before = seen(value);
+            const PropertyValue& itself = value;
+            EXPECT_EQ(&(value = itself), &value);
+            EXPECT_EQ(seen(value), before);
+        }
+    }
+}
+
+TEST(PropertyAssignment, LeavesTheOldValueWhenMemoryRunsOut)
+{
+    const auto sources = otherSamples(true);
+    for (const PropertyValue& old : samples(false)) {
+        for (const PropertyValue& source : sources) {
+            SCOPED_TRACE(between(source, old));
+            for (long allowed = 0;; ++allowed) {
+                ASSERT_LT(allowed, 100);
+                PropertyValue target(old);
+                if (completesWith(allowed, [&] { target = source; })) {
+                    EXPECT_EQ(seen(target), seen(source));
+                    if (source.getKind() != old.getKind()) {
+                        EXPECT_EQ(allowed > 0, source.getKind() != 0);
+                    }
+                    break;
+                }
+                EXPECT_EQ(seen(target), seen(old)) << "with memory for " << allowed << " allocations";
+            }
+        }
+    }
+}
+
+TEST(PropertyAssignment, GivesBackAllMemory)
+{
+    const auto sources = otherSamples(true);
+    for (const PropertyValue& old : samples(false)) {
+        for (const PropertyValue& source : sources) {
+            SCOPED_TRACE(between(source, old));
+            const long before = allocation::aliveNow;
+            for (long allowed = 0; allowed < 20; ++allowed) {
+                PropertyValue target(old);
+                completesWith(allowed, [&] { target = source; });
+            }
+            EXPECT_EQ(allocation::aliveNow, before);
+        }
+    }
+}
+
+TEST(PropertyMove, TakesTheValueAllocatesNothingAndLeavesNothing)
+{
+    for (const bool mark : {false, true}) {
+        for (const PropertyValue& original : samples(mark)) {
+            SCOPED_TRACE(seen(original));
+            PropertyValue source(original);
+            const long before = allocation::madeSoFar;
+            const PropertyValue target(std::move(source));
+            EXPECT_EQ(allocation::madeSoFar, before);
+            EXPECT_EQ(seen(target), seen(original));
+            EXPECT_EQ(source.getKind(), PropertyValue::KIND_UNKNOWN);
+            EXPECT_EQ(source.operator std::string(), "unknown");
+        }
+    }
+}
+
+TEST(PropertyMove, AssignsBetweenAllKinds)
+{
+    for (const bool targetMark : {false, true}) {
+        for (const bool sourceMark : {false, true}) {
+            for (const PropertyValue& old : samples(targetMark)) {
+                for (const PropertyValue& original : otherSamples(sourceMark)) {
+                    SCOPED_TRACE(between(original, old));
+                    PropertyValue target(old);
+                    PropertyValue source(original);
+                    EXPECT_EQ(countOf([&] { target = std::move(source); }), 0);
+                    EXPECT_EQ(seen(target), seen(original));
+                    EXPECT_EQ(source.getKind(), PropertyValue::KIND_UNKNOWN);
+                    EXPECT_EQ(source.operator std::string(), "unknown");
+                }
+            }
+        }
+    }
+}
+
+TEST(PropertyMove, LeavesAValueThatCanBeUsedAgain)
+{
+    for (const PropertyValue& original : samples()) {
+        SCOPED_TRACE(seen(original));
+        PropertyValue source(original);
+        const PropertyValue target(std::move(source));
+        source = PropertyValue("again", true);
+        EXPECT_EQ(seen(source), "2 read-only: again");
+        const PropertyValue next(std::move(source));
+        source.setKind(6);
+        EXPECT_EQ(source.getKind(), PropertyValue::KIND_STRINGARRAY);
+        EXPECT_EQ(source.operator std::string(), "{}");
+    }
+}
+
+TEST(PropertySwap, ExchangesEverythingAndAllocatesNothing)
+{
+    for (const PropertyValue& first : samples(false)) {
+        for (const PropertyValue& second : otherSamples(true)) {
+            SCOPED_TRACE(between(first, second));
+            PropertyValue a(first);
+            PropertyValue b(second);
+            EXPECT_EQ(countOf([&] { a.swap(b); }), 0);
+            EXPECT_EQ(seen(a), seen(second));
+            EXPECT_EQ(seen(b), seen(first));
+            EXPECT_EQ(countOf([&] {
+                          using std::swap;
+                          swap(a, b);
+                      }),
+                      0);
+            EXPECT_EQ(seen(a), seen(first));
+            EXPECT_EQ(seen(b), seen(second));
+        }
+    }
+}
+
+TEST(PropertySwap, WithItselfChangesNothing)
+{
+    for (PropertyValue& value : std::vector<PropertyValue>(samples(true))) {
+        const std::string before = seen(value);
+        value.swap(value);
+        EXPECT_EQ(seen(value), before);
+    }
+}
+
+TEST(PropertyAssignment, LeavesEveryElementWhenOneThatGrowsFindsNoMemory)
+{
+    // The target's array has room for the source's elements; the elements themselves have not.
+    const std::string grown = "an element that needs memory of its own";
+    const PropertyValue source(IC::StringArray {grown, grown}, true);
+    PropertyValue target(IC::StringArray {"a", "b", "c"});
+    const std::string before = seen(target);
+    for (long allowed = 0;; ++allowed) {
+        ASSERT_LT(allowed, 100);
+        if (completesWith(allowed, [&] { target = source; }))
+            break;
+        EXPECT_EQ(seen(target), before) << "with memory for " << allowed << " allocations";
+    }
+    EXPECT_EQ(seen(target), seen(source));
+}
+
+TEST(PropertyKind, RefusedChangeLeavesAValueThatCanBeCopiedMovedAndSwapped)
+{
+    for (const PropertyValue& original : samples(true)) {
+        SCOPED_TRACE(seen(original));
+        PropertyValue value(original);
+        EXPECT_THROW(value.setKind(7), PropertyValueInvalidKind);
+        const std::string left = seen(value);
+
+        EXPECT_EQ(seen(PropertyValue(value)), left);
+        for (const PropertyValue& old : otherSamples()) {
+            PropertyValue target(old);
+            target = value;  // also onto a value of its own kind
+            EXPECT_EQ(seen(target), left);
+        }
+        PropertyValue other("other");
+        other.swap(value);
+        EXPECT_EQ(seen(other), left);
+        EXPECT_EQ(seen(value), "2 writable: other");
+        const PropertyValue moved(std::move(other));
+        EXPECT_EQ(seen(moved), left);
+    }
+}
+
+TEST(PropertyAssignment, ToItselfNeedsNoMemoryAndMovingToItselfKeepsTheValue)
+{
+    for (PropertyValue& value : std::vector<PropertyValue>(samples(true))) {
+        const std::string before = seen(value);
+        PropertyValue& itself = value;
+        EXPECT_EQ(countOf([&] { value = itself; }), 0);
+        EXPECT_EQ(seen(value), before);
+        value = std::move(itself);
+        EXPECT_EQ(seen(value), before);
+    }
+}
+
+TEST(PropertyConstructor, TakesTheMemoryOfTemporaries)
+{
+    std::string text = "a text that needs memory of its own";
+    IC::Buffer bytes(5, 1);
+    IC::NumberArray numbers(3, Number(1u));
+    IC::StringArray texts(3, text);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(text)); }), 1);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(bytes)); }), 1);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(numbers)); }), 1);
+    EXPECT_EQ(countOf([&] { const PropertyValue value(std::move(texts)); }), 1);
+}
+
+}  // namespace

@@ -1,0 +1,41 @@
+# What every folder of tests needs: GoogleTest and ic_add_test.
+include(GoogleTest)
+list(JOIN CMAKE_CROSSCOMPILING_EMULATOR " " emulator)
+
+# Tests compile faster without optimisation, and compiling takes longer than running them. The code under test keeps
+# the options of the preset.
+macro(ic_compile_quickly)
+    if(CMAKE_CXX_FLAGS MATCHES "-fsanitize")
+        add_compile_options(-O0)
+    else()
+        add_compile_options($<$<CONFIG:Release>:-O1>)
+    endif()
+endmacro()
+
+# Precompiles GoogleTest's headers for all tests. The preset `clang` turns this off, so each test includes all it uses.
+add_executable(test_headers ${CMAKE_CURRENT_LIST_DIR}/GoogleTest.cpp)  # an executable, because its users are
+ic_target_settings(test_headers)
+target_link_libraries(test_headers PRIVATE GTest::gmock)
+target_precompile_headers(test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
+
+# The tests that ThreadSanitizer can check.
+add_custom_target(threads_tests)
+set(with_threads SharedNodes FirstUse Fork Cancellation Unload)
+if(NOT CMAKE_CXX_COMPILER_ID STREQUAL "Clang")  # these replace operator new, as clang's ThreadSanitizer does
+    list(APPEND with_threads Alert Failure Node Platform)
+endif()
+
+# Adds the test NAME_test.cpp, linked with the further arguments.
+function(ic_add_test name)
+    add_executable(${name}_test ${name}_test.cpp)
+    ic_target_settings(${name}_test)
+    target_include_directories(${name}_test PRIVATE ${PROJECT_SOURCE_DIR}/tests)
+    target_precompile_headers(${name}_test REUSE_FROM test_headers)
+    target_link_libraries(${name}_test PRIVATE ${ARGN} GTest::gmock_main)
+    set(label "")
+    if(name IN_LIST with_threads)
+        add_dependencies(threads_tests ${name}_test)
+        set(label PROPERTIES LABELS threads)
+    endif()
+    gtest_discover_tests(${name}_test DISCOVERY_TIMEOUT 60 ${label})
+endfunction()
