@@ -13,10 +13,7 @@ namespace IC {
 
 namespace {
 
-detail::Where here(const char* function, int line = __builtin_LINE())
-{
-    return {function, "Alert", line, loggerAlert};
-}
+constexpr detail::Source here("Alert", loggerAlert);
 
 }  // namespace
 

@@ -12,10 +12,7 @@ namespace IC {
 
 namespace {
 
-detail::Where here(const char* function, int line = __builtin_LINE())
-{
-    return {function, "EnumValue", line, loggerEnumvalue};
-}
+constexpr detail::Source here("EnumValue", loggerEnumvalue);
 
 }  // namespace
 
@@ -73,9 +70,9 @@ std::ostream& operator<<(std::ostream& out, const EnumValue& value)
     return out << std::string(value);
 }
 
-void detail::append(Text& text, const EnumValue& value)
+void detail::Text::append(const EnumValue& value)
 {
-    text.add(value.operator unsigned int());
+    add(value.operator unsigned int());
 }
 
 }  // namespace IC

@@ -12,10 +12,7 @@ namespace IC {
 
 namespace {
 
-detail::Where here(const char* function, int line = __builtin_LINE())
-{
-    return {function, "Error", line, loggerError};
-}
+constexpr detail::Source here("Error", loggerError);
 
 }  // namespace
 
@@ -57,7 +54,7 @@ Error::operator std::string() const
     text.add(static_cast<unsigned int>(status_));
     if (value_.getKind() != Number::KIND_UNKNOWN) {
         text.add(" - ");
-        append(text, value_);
+        text.append(value_);
     }
     if (!message_.empty()) {
         text.add(" - ");

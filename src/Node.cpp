@@ -17,25 +17,7 @@ namespace IC {
 
 namespace {
 
-detail::Where here(const char* function, int line = __builtin_LINE())
-{
-    return {function, "Node", line, IC_NODE::loggerNode};
-}
-
-// Holds a node's mutex. Whether the lock was obtained is not asked: with this time-out it waits for ever.
-class IC_ANNOTATION(scoped_lockable) Lock {
-public:
-    explicit Lock(ZQ::Mutex& mutex) IC_ANNOTATION(acquire_capability(mutex)) : mutex_(mutex)
-    {
-        mutex_.lock(0xFFFFFFFF);
-    }
-    ~Lock() IC_ANNOTATION(release_capability()) { mutex_.unlock(); }
-    Lock(const Lock&) = delete;
-    Lock& operator=(const Lock&) = delete;
-
-private:
-    ZQ::Mutex& mutex_;
-};
+constexpr detail::Source here("Node", IC_NODE::loggerNode);
 
 // The text of the exception for a sensor code, made when it is asked for.
 struct SensorRefusal {

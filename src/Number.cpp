@@ -16,7 +16,7 @@
 
 namespace IC {
 
-// Ready before the objects of the program, whose constructors may already refuse or print a number.
+// Built before the program's own objects, whose constructors may already refuse or print a number.
 [[gnu::init_priority(101)]] static const std::string loggerNumber = "Vexilon.IC.Number";
 
 [[gnu::init_priority(101)]] const std::string pst[75] = {"Unknown",
@@ -97,15 +97,13 @@ namespace IC {
 
 namespace {
 
-detail::Where here(const char* function, int line = __builtin_LINE())
-{
-    return {function, "Number", line, loggerNumber};
-}
+constexpr detail::Source here("Number", loggerNumber);
 
 constexpr ZQ::Uint8 largestKind = Number::KIND_NODEREF;
 constexpr ZQ::Uint32 noSensor = 74;
 
-// The real without its fraction. It is refused unless it is from 0 to below `limit`; a NaN passes.
+// The real without its fraction; `real` is called again for each record. Refuses it unless it is from 0 to below
+// `limit`; a NaN passes.
 template <class Real>
 double integralPart(const Real& real, double limit, const detail::Where& where, const char* literal,
                     const char* tooLarge, const char* negative)
@@ -119,8 +117,7 @@ double integralPart(const Real& real, double limit, const detail::Where& where, 
     return integral;
 }
 
-// The result of a step as a double. The x87 calculates in more digits, and what it returns keeps them unless it has
-// been through memory.
+// The result as a double. The x87 calculates with more digits and keeps them until the result is stored.
 double rounded(double result)
 {
     if constexpr (FLT_EVAL_METHOD == 0) {
@@ -131,8 +128,7 @@ double rounded(double result)
     }
 }
 
-// Of what integralPart let through. Without the test the result for a NaN would be the processor's or the
-// compiler's choice.
+// Converts what integralPart returns. Converting a NaN would be undefined.
 template <class Integer>
 Integer toInteger(double integral, Integer ofNan)
 {
@@ -145,7 +141,7 @@ double realOf(const Version2& version)
     return rounded(version.major + rounded(version.minor / scale));
 }
 
-// What two of a kind are compared by, the first field first.
+// What two of a kind are compared by, first field first.
 std::pair<ZQ::Uint8, ZQ::Uint8> fields(const Version2& version)
 {
     return {version.major, version.minor};
@@ -175,8 +171,7 @@ template <class DateTimeFields>
 void addDateTime(detail::Text& text, const DateTimeFields& content)
 {
     const ZQ::DateTime time(content.seconds, content.scope);
-    // Each of the three digits is taken from the remainder of the one before it, so only the last digit
-    // of the milliseconds counts. The agent's logs rely on it.
+    // Only the last digit of the milliseconds counts (deliberate): the agent's logs rely on it.
     const unsigned int remainder = content.milliseconds % 10u;
     if (remainder != 0)
         record(here("operator std::string"), detail::failureLevel,
@@ -226,7 +221,7 @@ void Number::initKind(const KindType& kind)
         store(Version2 {0, 0});
         return;
     case KIND_DATETIME:
-        // Where time_t is the wider type, a date-time's seconds still are a long.
+        // A date-time's seconds are a long, also where time_t is wider.
         storeDateTime(static_cast<long>(std::time(nullptr)), 0, defaultScope);
         return;
     case KIND_INT:
@@ -259,7 +254,7 @@ bool Number::toBool() const
     }
 }
 
-// For both 32-bit conversions: the signed one differs only in its name and in taking KIND_INT.
+// Serves both 32-bit conversions, which differ in their names and in KIND_INT.
 ZQ::Uint32 Number::toUint32(const char* function) const
 {
     switch (kind_) {
@@ -269,12 +264,13 @@ ZQ::Uint32 Number::toUint32(const char* function) const
         return load<ZQ::Uint32>();
     case KIND_UINT64:
         if (load<ZQ::Uint64>() > std::numeric_limits<ZQ::Uint32>::max())
-            detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32, reading<ZQ::Uint64>());
+            detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32,
+                                            [this] { return load<ZQ::Uint64>(); });
         return static_cast<ZQ::Uint32>(load<ZQ::Uint64>());
     case KIND_REAL:
-        return toInteger<ZQ::Uint32>(
-            integralPart(reading<ZQ::Real64>(), 0x1p32, here(function), outOfRange32, tooLarge32, negative32),
-            0);
+        return toInteger<ZQ::Uint32>(integralPart([this] { return load<ZQ::Real64>(); }, 0x1p32,
+                                                  here(function), outOfRange32, tooLarge32, negative32),
+                                     0);
     default:
         detail::fail<std::out_of_range>(
             here(function), "Can't return current value as a 32-bit integer",
@@ -290,9 +286,9 @@ ZQ::Uint64 Number::toUint64() const
     case KIND_UINT32:
         return load<ZQ::Uint32>();
     case KIND_REAL:
-        // 2^64 is written as a power of two, since the largest 64-bit integer is no double.
-        return toInteger(integralPart(reading<ZQ::Real64>(), 0x1p64, here("operator ZQ::Uint64"),
-                                      outOfRange64, tooLarge64, negative64),
+        // A power of two, because the largest 64-bit integer is no double.
+        return toInteger(integralPart([this] { return load<ZQ::Real64>(); }, 0x1p64,
+                                      here("operator ZQ::Uint64"), outOfRange64, tooLarge64, negative64),
                          ZQ::Uint64 {1} << 63);
     default:
         detail::fail<std::out_of_range>(
@@ -331,12 +327,12 @@ Version2 Number::toVersion() const
     case KIND_UINT32:
         if (load<ZQ::Uint32>() > largestMajor)
             detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal,
-                                            reading<ZQ::Uint32>());
+                                            [this] { return load<ZQ::Uint32>(); });
         return {static_cast<ZQ::Uint8>(load<ZQ::Uint32>()), 0};
     case KIND_UINT64:
         if (load<ZQ::Uint64>() > largestMajor)
             detail::fail<std::out_of_range>(here("operator IC::Version2"), tooLarge, literal,
-                                            reading<ZQ::Uint64>());
+                                            [this] { return load<ZQ::Uint64>(); });
         return {static_cast<ZQ::Uint8>(load<ZQ::Uint64>()), 0};
     default:
         detail::fail<std::out_of_range>(here("operator IC::Version2"),
@@ -370,7 +366,7 @@ Number::operator std::string() const
     return detail::textOf(*this);
 }
 
-// The header has compared 32-bit numbers and reals; two of a kind that is not named here are equal.
+// The header compares 32-bit numbers and reals. Two of a kind that is not named here are equal.
 bool Number::equal(const Number& a, const Number& b)
 {
     if (a.kind_ != b.kind_)
@@ -389,7 +385,7 @@ bool Number::equal(const Number& a, const Number& b)
     }
 }
 
-// Inline in the header; a program that looks them up in the library finds them all the same.
+// Emits these inline functions, because the library exports them.
 [[gnu::used]] static bool (*const comparisons[])(const Number&,
                                                  const Number&) = {operator==, operator<, operator> };
 
@@ -398,7 +394,7 @@ bool operator!=(const Number& a, const Number& b)
     return !(a == b);
 }
 
-// For two of a kind; of a kind that is not named here, neither precedes.
+// For two of one kind. Of a kind that is not named here, neither precedes.
 bool Number::precedes(const Number& a, const Number& b)
 {
     switch (a.kind_) {
@@ -458,59 +454,65 @@ std::ostream& operator<<(std::ostream& out, const Number& number)
     return out << std::string(number);
 }
 
-void detail::append(Text& text, const Number& number)
+template <class Text>
+void Number::write(Text& text) const
 {
-    switch (number.kind_) {
-    case Number::KIND_UNKNOWN:
+    switch (kind_) {
+    case KIND_UNKNOWN:
         text.add("unknown");
         return;
-    case Number::KIND_BOOL:
-        text.add(number.load<ZQ::Uint8>() != 0 ? "true" : "false");
+    case KIND_BOOL:
+        text.add(load<ZQ::Uint8>() != 0 ? "true" : "false");
         return;
-    case Number::KIND_INT:
-        text.add(number.load<int>());
+    case KIND_INT:
+        text.add(load<int>());
         return;
-    case Number::KIND_UINT32:
-        text.add(number.load<ZQ::Uint32>());
+    case KIND_UINT32:
+        text.add(load<ZQ::Uint32>());
         return;
-    case Number::KIND_UINT64:
-        text.add(number.load<ZQ::Uint64>());
+    case KIND_UINT64:
+        text.add(load<ZQ::Uint64>());
         return;
-    case Number::KIND_REAL:
-        text.add(number.load<ZQ::Real64>());
+    case KIND_REAL:
+        text.add(load<ZQ::Real64>());
         return;
-    case Number::KIND_NAN:
+    case KIND_NAN:
         text.add("not a number");
         return;
-    case Number::KIND_INFINITY:
+    case KIND_INFINITY:
         text.add("infinity");
         return;
-    case Number::KIND_VERSION:
-        addVersion(text, number.load<Version2>());
+    case KIND_VERSION:
+        addVersion(text, load<Version2>());
         return;
-    case Number::KIND_DATETIME:
-        addDateTime(text, number.load<Number::DateTimeFields>());
+    case KIND_DATETIME:
+        addDateTime(text, load<DateTimeFields>());
         return;
-    case Number::KIND_NODEREF:
-        text.add(pst[std::min(number.nodeRef_.type, noSensor)]);
+    case KIND_NODEREF:
+        text.add(pst[std::min(nodeRef_.type, noSensor)]);
         text.add(':');
-        text.add(number.nodeRef_.id);
+        text.add(nodeRef_.id);
         return;
     }
     text.add("invalid");
 }
 
-// 32-bit numbers, the commonest, are written a run at once.
-void detail::append(Text& text, const std::vector<Number>& numbers)
+void detail::Text::append(const Number& number)
 {
-    const auto isUint32 = [](const Number& number) { return number.kind_ == Number::KIND_UINT32; };
-    text.add('{');
+    number.write(*this);
+}
+
+// Writes each run of 32-bit numbers, the commonest, at once.
+void detail::Text::append(const std::vector<Number>& numbers)
+{
+    const auto isUint32 = [](const Number& number) { return number.getKind() == Number::KIND_UINT32; };
+    add('{');
     const auto end = numbers.end();
     for (auto number = numbers.begin(); number != end;) {
         const auto other = std::find_if_not(number, end, isUint32);
-        if (other != number && text.isClassic()) {
+        if (other != number && !locale_) {
             const std::size_t longest = 12 * static_cast<std::size_t>(other - number);  // 4294967295 and ", "
-            text.write(longest, [run = number, other](char* out) mutable {
+            write(longest, [run = number, other](char* out) mutable {
                 for (; run != other; ++run) {
                     out = writeDecimal(out, run->load<ZQ::Uint32>());
                     *out++ = ',';
@@ -520,13 +522,13 @@ void detail::append(Text& text, const std::vector<Number>& numbers)
             });
             number = other;
         } else {
-            append(text, *number++);
-            text.add(", ");
+            append(*number++);
+            add(", ");
         }
     }
     if (!numbers.empty())
-        text.remove(2);
-    text.add('}');
+        remove(2);
+    add('}');
 }
 
 }  // namespace IC

@@ -14,12 +14,9 @@ namespace IC {
 
 namespace {
 
-detail::Where here(const char* function, int line = __builtin_LINE())
-{
-    return {function, "Property", line, loggerProperty};
-}
+constexpr detail::Source here("Property", loggerProperty);
 
-// For a record, which reads it anew each time.
+// The kind, read again for each record.
 auto kindOf(const PropertyValue& value)
 {
     return [&value]() -> ZQ::Uint32 { return value.getKind(); };
@@ -27,19 +24,52 @@ auto kindOf(const PropertyValue& value)
 
 constexpr char notANumber[] = "Can't return current value as a Number";
 
-// The old elements stay until the new ones are complete; not every vector's own assignment sees to that.
-template <class Array>
-void replace(Array& target, const Array& source)
+// Names the type of the object that a kind holds.
+template <class T>
+struct Held {
+    using Type = T;
+};
+
+template <class T>
+T* newFirst()
 {
-    Array copy(source);
+    return new T;
+}
+template <>
+Number* newFirst()
+{
+    return new Number(Number::KIND_UNKNOWN);
+}
+
+template <class T>
+void replace(T& target, const T& source)
+{
+    target = source;
+}
+// A vector's own assignment may lose the old elements if copying one throws.
+template <class Element>
+void replace(std::vector<Element>& target, const std::vector<Element>& source)
+{
+    std::vector<Element> copy(source);
     target.swap(copy);
 }
 
-// For buffers and arrays: the elements' < alone decides, asked both ways.
-template <class Array>
-bool lexicographicallyLess(const Array& a, const Array& b)
+template <class T>
+bool isLess(const T& a, const T& b)
+{
+    return a < b;
+}
+// Only the elements' < decides, asked both ways. In C++20 a vector's own < may ask <=> instead.
+template <class Element>
+bool isLess(const std::vector<Element>& a, const std::vector<Element>& b)
 {
     return std::lexicographical_compare(a.begin(), a.end(), b.begin(), b.end());
+}
+
+template <class T>
+std::string textOf(const T& object)
+{
+    return object;
 }
 
 std::string textOf(const Buffer& bytes)
@@ -69,11 +99,17 @@ void addQuoted(detail::Text& text, std::string_view content)
     text.add('"');
 }
 
-void addTexts(detail::Text& text, const StringArray& texts)
+std::string textOf(const NumberArray& numbers)
+{
+    return detail::textOf(numbers);
+}
+
+std::string textOf(const StringArray& texts)
 {
     std::size_t length = 2;
     for (const std::string& content : texts)
         length += content.size() + 4;
+    detail::Text text;
     text.reserve(length);
     const char* separator = "{";
     for (const std::string& content : texts) {
@@ -82,12 +118,6 @@ void addTexts(detail::Text& text, const StringArray& texts)
         separator = ", ";
     }
     text.add(texts.empty() ? "{}" : "}");
-}
-
-std::string textOf(const StringArray& texts)
-{
-    detail::Text text;
-    addTexts(text, texts);
     return text.take();
 }
 
@@ -110,31 +140,37 @@ PropertyValue::PropertyValue(const KindType& kind, const bool& readOnly) : readO
     initKind(static_cast<unsigned char>(kind));
 }
 
-// Called for what holds no object yet. The header has copied numbers.
+// Calls the visitor with the type of the object that this kind holds.
+template <class Visitor>
+decltype(auto) PropertyValue::visit(KindType kind, const Visitor& visitor)
+{
+    if (kind == KIND_STRING)  // the commonest; the header knows numbers
+        return visitor(Held<std::string>());
+    switch (kind) {
+    case KIND_NUMBER:
+        return visitor(Held<Number>());
+    case KIND_BUFFER:
+        return visitor(Held<Buffer>());
+    case KIND_ENUMVALUE:
+        return visitor(Held<EnumValue>());
+    case KIND_NUMBERARRAY:
+        return visitor(Held<NumberArray>());
+    default:  // KIND_STRINGARRAY
+        return visitor(Held<StringArray>());
+    }
+}
+
+// For a value that holds no object yet.
 void PropertyValue::copyObject(const PropertyValue& source)
 {
     if (source.value_ == nullptr)
         return;
-    switch (kind_) {
-    case KIND_STRING:
-        value_ = new std::string(source.object<std::string>());
-        break;
-    case KIND_BUFFER:
-        value_ = new Buffer(source.object<Buffer>());
-        break;
-    case KIND_ENUMVALUE:
-        value_ = new EnumValue(source.object<EnumValue>());
-        break;
-    case KIND_NUMBERARRAY:
-        value_ = new NumberArray(source.object<NumberArray>());
-        break;
-    default:  // KIND_STRINGARRAY
-        value_ = new StringArray(source.object<StringArray>());
-        break;
-    }
+    value_ = visit(kind_, [&source](auto held) -> void* {
+        using Type = typename decltype(held)::Type;
+        return new Type(source.object<Type>());
+    });
 }
 
-// The header has assigned numbers.
 void PropertyValue::assign(const PropertyValue& source)
 {
     if (kind_ != source.kind_ || value_ == nullptr) {
@@ -142,76 +178,27 @@ void PropertyValue::assign(const PropertyValue& source)
         swap(copy);
         return;
     }
-    switch (kind_) {
-    case KIND_STRING:
-        object<std::string>() = source.object<std::string>();
-        break;
-    case KIND_BUFFER:
-        replace(object<Buffer>(), source.object<Buffer>());
-        break;
-    case KIND_ENUMVALUE:
-        object<EnumValue>() = source.object<EnumValue>();
-        break;
-    case KIND_NUMBERARRAY:
-        replace(object<NumberArray>(), source.object<NumberArray>());
-        break;
-    default:  // KIND_STRINGARRAY
-        replace(object<StringArray>(), source.object<StringArray>());
-        break;
-    }
+    visit(kind_, [this, &source](auto held) {
+        using Type = typename decltype(held)::Type;
+        replace(object<Type>(), source.object<Type>());
+    });
     readOnly_ = source.readOnly_;
 }
 
 void PropertyValue::initKind(const unsigned char& kind)
 {
-    switch (kind) {
-    case KIND_UNKNOWN:
-        break;
-    case KIND_NUMBER:
-        value_ = new Number(Number::KIND_UNKNOWN);
-        break;
-    case KIND_STRING:
-        value_ = new std::string;
-        break;
-    case KIND_BUFFER:
-        value_ = new Buffer;
-        break;
-    case KIND_ENUMVALUE:
-        value_ = new EnumValue;
-        break;
-    case KIND_NUMBERARRAY:
-        value_ = new NumberArray;
-        break;
-    case KIND_STRINGARRAY:
-        value_ = new StringArray;
-        break;
-    default:
+    if (kind > KIND_STRINGARRAY)
         detail::fail<PropertyValueInvalidKind>(here("initKind"), "Invalid kind of property",
                                                "PropertyValue:initKind: invalid kind of property: ", kind);
-    }
-    kind_ = static_cast<KindType>(kind);
+    const auto valid = static_cast<KindType>(kind);
+    if (valid != KIND_UNKNOWN)
+        value_ = visit(valid, [](auto held) -> void* { return newFirst<typename decltype(held)::Type>(); });
+    kind_ = valid;
 }
 
-// The header has freed numbers.
 void PropertyValue::freeObject() noexcept
 {
-    switch (kind_) {
-    case KIND_STRING:
-        delete &object<std::string>();
-        break;
-    case KIND_BUFFER:
-        delete &object<Buffer>();
-        break;
-    case KIND_ENUMVALUE:
-        delete &object<EnumValue>();
-        break;
-    case KIND_NUMBERARRAY:
-        delete &object<NumberArray>();
-        break;
-    default:  // KIND_STRINGARRAY
-        delete &object<StringArray>();
-        break;
-    }
+    visit(kind_, [this](auto held) { delete &object<typename decltype(held)::Type>(); });
 }
 
 void PropertyValue::setKind(const unsigned char& kind)
@@ -219,7 +206,7 @@ void PropertyValue::setKind(const unsigned char& kind)
     if (kind == getKind())
         return;
     if (kind > KIND_STRINGARRAY && value_ != nullptr) {
-        release();  // a refused code costs the old value; a valid one only once the new value exists
+        release();  // a refused code costs the old value; a valid one does so once the new value exists
         value_ = nullptr;
         kind_ = static_cast<KindType>(kind_ | without);
     }
@@ -297,39 +284,28 @@ StringArray PropertyValue::refuseStringArray() const
 
 std::string PropertyValue::toText() const
 {
+    if (holds(KIND_NUMBER))
+        return object<Number>();
     if (kind_ == KIND_UNKNOWN)
         return "unknown";
     if (value_ == nullptr)
         return "invalid";
-    if (holds(KIND_NUMBER))
-        return object<Number>();
-    if (holds(KIND_ENUMVALUE))
-        return object<EnumValue>();
-    if (holds(KIND_BUFFER))
-        return textOf(object<Buffer>());
-    if (holds(KIND_NUMBERARRAY))
-        return detail::textOf(object<NumberArray>());
-    return textOf(object<StringArray>());  // the header has answered for texts
+    return visit(kind_, [this](auto held) { return textOf(object<typename decltype(held)::Type>()); });
 }
 
-// The header has compared numbers, texts and bytes.
 bool PropertyValue::equal(const PropertyValue& a, const PropertyValue& b)
 {
     if (a.kind_ != b.kind_)
         return false;
     if (a.value_ == nullptr)
         return true;
-    switch (a.kind_) {
-    case KIND_ENUMVALUE:
-        return a.object<EnumValue>() == b.object<EnumValue>();
-    case KIND_NUMBERARRAY:
-        return a.object<NumberArray>() == b.object<NumberArray>();
-    default:  // KIND_STRINGARRAY
-        return a.object<StringArray>() == b.object<StringArray>();
-    }
+    return visit(a.kind_, [&a, &b](auto held) {
+        using Type = typename decltype(held)::Type;
+        return a.object<Type>() == b.object<Type>();
+    });
 }
 
-// Inline in the header; a program that looks them up in the library finds them all the same.
+// Emits these inline functions, because the library exports them.
 [[gnu::used]] static bool (*const comparisons[])(const PropertyValue&,
                                                  const PropertyValue&) = {operator==, operator<, operator> };
 
@@ -338,21 +314,15 @@ bool operator!=(const PropertyValue& a, const PropertyValue& b)
     return !(a == b);
 }
 
-// For two of a kind. The header has compared numbers and texts.
+// For two of one kind.
 bool PropertyValue::precedes(const PropertyValue& a, const PropertyValue& b)
 {
     if (a.kind_ != b.kind_ || a.value_ == nullptr)
         return false;  // one of them or both have no object
-    switch (a.kind_) {
-    case KIND_BUFFER:
-        return lexicographicallyLess(a.object<Buffer>(), b.object<Buffer>());
-    case KIND_ENUMVALUE:
-        return a.object<EnumValue>() < b.object<EnumValue>();
-    case KIND_NUMBERARRAY:
-        return lexicographicallyLess(a.object<NumberArray>(), b.object<NumberArray>());
-    default:  // KIND_STRINGARRAY
-        return lexicographicallyLess(a.object<StringArray>(), b.object<StringArray>());
-    }
+    return visit(a.kind_, [&a, &b](auto held) {
+        using Type = typename decltype(held)::Type;
+        return isLess(a.object<Type>(), b.object<Type>());
+    });
 }
 
 bool PropertyValue::less(const PropertyValue& a, const PropertyValue& b)
@@ -400,7 +370,7 @@ std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, Proper
     return out << property.first << " = " << property.second;
 }
 
-// What stands between two numbers is one piece: inserting costs more than joining.
+// Joins what stands between two numbers, because an insertion costs more than joining.
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties)
 {
     if (!properties.empty())

@@ -2,17 +2,6 @@
 #include <iostream>
 #include <thread>
 
-class Lock {
-public:
-    explicit Lock(ZQ::Mutex& mutex) : mutex_(mutex) { mutex_.lock(0xFFFFFFFF); }
-    ~Lock() { mutex_.unlock(); }
-    Lock(const Lock&) = delete;
-    Lock& operator=(const Lock&) = delete;
-
-private:
-    ZQ::Mutex& mutex_;
-};
-
 class Door : public IC::Node {
 public:
     enum { OPENED = 1 };

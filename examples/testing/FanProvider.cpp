@@ -4,20 +4,7 @@
 
 namespace {
 
-constexpr unsigned int forEver = 0xFFFFFFFF;
 constexpr auto stopped = static_cast<IC::Node::StatusType>(3);
-
-// std::lock_guard for the platform's mutex.
-class Lock {
-public:
-    explicit Lock(ZQ::Mutex& mutex) : mutex_(mutex) { mutex_.lock(forEver); }
-    ~Lock() { mutex_.unlock(); }
-    Lock(const Lock&) = delete;
-    Lock& operator=(const Lock&) = delete;
-
-private:
-    ZQ::Mutex& mutex_;
-};
 
 }  // namespace
 

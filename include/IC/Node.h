@@ -6,33 +6,24 @@
 
 #include "IC/Error.h"
 #include "IC/Property.h"
+#include "IC/detail/Annotation.h"
+#include "IC/detail/Export.h"
 #include "ZQ/Mutex.h"
 #include "ZQ/Types.h"
 
-// The library's own build says what clang is to check (-Wthread-safety); for everybody else this is empty.
-#ifndef IC_ANNOTATION
-#define IC_ANNOTATION(attribute)
-#endif
-
-#pragma GCC visibility push(default)
-
-/// The machine that a hardware-management agent manages, as nodes, values, errors and alerts.
+/// A machine as nodes with typed, numbered properties; errors and alerts beside them.
 namespace IC {
 
-/// A managed object: one component of the machine, with a sensor type, a status, a description, its own path
-/// and its parent's, and numbered properties.
+/// A managed object: one component of the machine, with a sensor type, a status, a description, its own path and its
+/// parent's, and numbered properties. The base of the agent's node classes, which fill the protected members.
 ///
-/// The base class of the agent's node classes, which fill the protected members in their constructors. A node
-/// is neither copied nor assigned. It may be shared between threads: status, description and properties are
-/// read and changed under its lock, and what is read is a copy. Sensor type, path and parent are read without
-/// the lock; they are taken as fixed once the node is built. No operation holds the locks of two nodes. The
-/// lock is given back on every way out, also by an exception and where the thread is cancelled. One thread
-/// destroys the node, when no other uses it any more. A child of fork() must not use a node that another
-/// thread of its parent held.
+/// May be shared between threads: status, description and properties are read and changed under the node's lock, and
+/// what is read is a copy. Sensor type, paths and comparison use no lock: set paths in the constructor only. One
+/// thread destroys the node, after its last use. A child of fork() must not use a node that another thread of its
+/// parent had locked. No operation holds two nodes' locks; an exception or a cancelled thread releases the lock.
 ///
-/// What locks passes on what the lock throws, what writes a record what the platform throws there, what calls
-/// an override what that throws; whatever makes or copies a value, a map or a text may throw std::bad_alloc.
-/// Then nothing has changed. Comparisons and the readers of the sensor type throw nothing.
+/// Exceptions from the lock, the logger or an override propagate unchanged, and copies and texts may throw
+/// std::bad_alloc; then nothing has changed. docs/refusals.md has the logged texts.
 ///
 ///     class Fan : public IC::Node {
 ///     public:
@@ -42,9 +33,9 @@ namespace IC {
 ///             properties.insert({1u, IC::PropertyValue(IC::Number(3600u))});
 ///         }
 ///     };
-class __attribute__((visibility("default"))) Node {
+class IC_EXPORT Node {
 public:
-    /// The display names are in `pst`.
+    /// `pst` has the display names.
     enum SensorType : ZQ::Uint32 {
         SENSOR_UNKNOWN = 0,
         SENSOR_CHASSIS = 1,
@@ -123,77 +114,82 @@ public:
         SENSOR_LARGEST = SENSOR_LAN_END_POINT
     };
 
-    /// The codes are numbers without names. A node begins with STATUS_INITIAL; an Alert takes no status above
-    /// STATUS_LARGEST.
+    /// No code has a name. A node begins with STATUS_INITIAL; an Alert takes no status above STATUS_LARGEST.
     enum StatusType : ZQ::Uint32 { STATUS_INITIAL = 0, STATUS_LARGEST = 85 };
+
+    /// @name Construction
+    ///@{
 
     /// A node of sensor type 0 with the description "UNKNOWN SENSOR NODE CREATED BY DEFAULT CONSTRUCTOR".
     Node();
 
-    /// A node of the given sensor type with an empty description. A code above 73 is refused with
-    /// NodeInvalidSensor: what is logged (category "Vexilon.IC.Node", level 6000), with the code, and below it
-    /// what the exception says.
-    ///
-    ///     "Node: Sensor value out of range: "
-    ///       "74 is not a valid sensor. The largest possible sensor is 73"
+    /// A node of this sensor type with an empty description. Throws NodeInvalidSensor for a code above 73.
     explicit Node(unsigned int sensor);
 
     Node(const Node&) = delete;
     Node& operator=(const Node&) = delete;
 
-    /// Empties the properties under the lock. The program ends (std::terminate) should the lock throw here.
+    /// Empties the properties under the lock. Calls std::terminate if the lock throws.
     virtual ~Node();
 
+    ///@}
+    /// @name Status and description
     ///@{
-    /// Read under the lock.
+
     virtual StatusType getStatus() const;
     virtual std::string getDescription() const;
-    ///@}
 
-    /// Copies the property into `value`, read-only mark included. Returns STATUS_SUCCESS, or
-    /// STATUS_NO_SUCH_PROPERTY with `value` untouched, as it is where anything throws. Writes no record.
+    /// The status of this object, also where a derived class overrides getStatus.
+    operator StatusType() const;
+
+    ///@}
+    /// @name Properties
+    ///@{
+
+    /// Copies the property and its mark into `value`. Returns STATUS_SUCCESS, or STATUS_NO_SUCH_PROPERTY and leaves
+    /// `value` as it was. Logs nothing.
     virtual Error getProperty(unsigned int key, PropertyValue& value) const;
 
-    /// A copy of all of them, made under the lock.
+    /// A copy of all of them, made under one lock.
     virtual std::map<unsigned int, PropertyValue> getProperties() const;
 
-    /// Replaces the property by a copy of `value`, its read-only mark included; the mark of the stored value
-    /// alone decides whether that may be. Never adds a property.
-    ///
-    ///     returned                  logged under the lock, level 6000
-    ///     STATUS_SUCCESS            nothing
-    ///     STATUS_NO_SUCH_PROPERTY   "setProperty: 7 does not exist"
-    ///     STATUS_READ_ONLY          "setProperty: 7 read-only"
-    ///
-    /// Whatever the outcome, the request is logged before the lock is taken: "setProperty: ", the key, a blank
-    /// and the value, at level 3000. Every log record is followed by its trace record; the category is
-    /// "Vexilon.IC.Node". Where anything throws, the property is as it was; the records before it stay.
+    /// Replaces the property and its mark; never adds one. Logs the request, then returns STATUS_SUCCESS, or logs and
+    /// returns STATUS_NO_SUCH_PROPERTY, or STATUS_READ_ONLY if the stored value has the mark. If anything throws, the
+    /// property is as it was; records already written stay.
     virtual Error setProperty(const unsigned int& key, const PropertyValue& value);
 
-    /// "Node 6162 : 20, status = 0": the path in hexadecimal, the sensor code, the status as getStatus gives
-    /// it, which is called under the lock. As a fresh std::ostringstream writes it under the global locale.
-    virtual operator std::string() const;
-
+    ///@}
+    /// @name Identity
+    /// Fixed after construction, and read without the lock.
     ///@{
-    /// Fixed once the node is built, and read without the lock.
+
     SensorType getSensor() const noexcept { return sensor_; }
     operator SensorType() const noexcept { return sensor_; }
     std::string getPath() const { return path; }
     std::string getParent() const { return parent; }
+
     ///@}
+    /// @name Text
+    ///@{
 
-    /// The status of this very object, under the lock, also where a derived class overrides getStatus.
-    operator StatusType() const;
+    /// "Node 6162 : 20, status = 0": the path in hexadecimal, the sensor code, and the result of getStatus, called
+    /// under the lock. As a fresh std::ostringstream writes it under the global locale.
+    virtual operator std::string() const;
 
-    /// Two lower-case hexadecimal digits for each byte, NUL bytes included. Without the lock.
+    /// Two lower-case hexadecimal digits for each byte, NUL bytes included. Takes no lock.
     std::string hexstring(std::string bytes) const;
 
-protected:
-    ///@{
-    /// Guards status, description and properties. Who holds it may call every operation: it is re-entrant.
-    mutable ZQ::Mutex mutex;
-    StatusType status IC_ANNOTATION(guarded_by(mutex)) = STATUS_INITIAL;  // see getStatus
     ///@}
+
+protected:
+    /// Holds a node's lock for as long as it lives. Re-entrant: its thread may call every operation of the node.
+    ///
+    ///     const Lock lock(mutex);
+    class Lock;
+
+    /// Guards status, description and properties; take it with Lock.
+    mutable ZQ::Mutex mutex;
+    StatusType status IC_ANNOTATION(guarded_by(mutex)) = STATUS_INITIAL;  ///< see getStatus
 
 private:
     friend bool operator==(const Node& a, const Node& b);
@@ -203,26 +199,28 @@ private:
 
 protected:
     std::string description IC_ANNOTATION(guarded_by(mutex));  ///< see getDescription
-    std::map<unsigned int, PropertyValue> properties IC_ANNOTATION(guarded_by(mutex));  ///< by their numbers
-    std::string path;    ///< what tells one node from another
-    std::string parent;  ///< the path of the node that this one is part of
+    std::map<unsigned int, PropertyValue> properties IC_ANNOTATION(guarded_by(mutex));  ///< by number
+    std::string path;    ///< identifies the node
+    std::string parent;  ///< the path of the node that contains this one
 };
 
+/// @name Comparison
+/// By path alone, byte by byte as unsigned values: nodes with the same path are equal. Without a lock; nothing is
+/// thrown.
 ///@{
-/// Compare the paths, byte by byte as unsigned values, and nothing else: nodes with the same path are equal.
-/// Without any lock; nothing is thrown.
-bool operator==(const Node& a, const Node& b);
-bool operator!=(const Node& a, const Node& b);
-bool operator<(const Node& a, const Node& b);
-bool operator<=(const Node& a, const Node& b);
-bool operator>(const Node& a, const Node& b);
-bool operator>=(const Node& a, const Node& b);
+IC_EXPORT bool operator==(const Node& a, const Node& b);
+IC_EXPORT bool operator!=(const Node& a, const Node& b);
+IC_EXPORT bool operator<(const Node& a, const Node& b);
+IC_EXPORT bool operator<=(const Node& a, const Node& b);
+IC_EXPORT bool operator>(const Node& a, const Node& b);
+IC_EXPORT bool operator>=(const Node& a, const Node& b);
 ///@}
 
-/// Inserts the node's text, as its class writes it, as one text: width and fill apply to the whole of it.
-/// Where the text throws, nothing is inserted.
-std::ostream& operator<<(std::ostream& out, const Node& node);
+/// Inserts the text of the node's class as one text: width and fill apply to the whole. If the conversion throws,
+/// nothing is inserted.
+IC_EXPORT std::ostream& operator<<(std::ostream& out, const Node& node);
 
 }  // namespace IC
 
-#pragma GCC visibility pop
+// The interface ends here.
+#include "IC/detail/Lock.h"

@@ -6,16 +6,15 @@
 #include "VXLog/VXLogger.h"
 #include "VXLog/VXMessageBuffer.h"
 
-// How the library reports: a log record, the same again as a trace record, and, for a refusal, an exception.
-// Nothing else in the library touches the logging platform.
+// How the library reports: a log record, the same as a trace record and, for a refusal, an exception. Only this header
+// uses the logging platform.
 namespace IC::detail {
 
 constexpr int failureLevel = 6000;
 constexpr int informationLevel = 3000;
 
-// The place that a record names. Each source file has one function `here` that fills in its own file and
-// category and the line of its caller. Function names are literals: compilers spell conversion operators
-// differently in __func__.
+// The place that a record names. Function names are literals: compilers spell conversion operators differently in
+// __func__.
 struct Where {
     const char* function;
     const char* file;
@@ -23,8 +22,22 @@ struct Where {
     const std::string& category;
 };
 
-// Codes are written as numbers; those of one byte would print as characters. A function is asked for its
-// value.
+// A source file, as its records name it. Called with a function's name, it gives the place of the call.
+class Source {
+public:
+    constexpr Source(const char* file, const std::string& category) : file_(file), category_(category) { }
+
+    Where operator()(const char* function, int line = __builtin_LINE()) const
+    {
+        return {function, file_, line, category_};
+    }
+
+private:
+    const char* file_;
+    const std::string& category_;
+};
+
+// Codes print as numbers, also those of one byte. A function prints the value that it returns.
 template <class T>
 decltype(auto) readable(const T& piece)
 {
@@ -42,7 +55,7 @@ const std::string& compose(VXLog::VXMessageBuffer& buffer, const char* literal, 
     return buffer.str(((buffer << literal) << ... << readable(pieces)));
 }
 
-// Writes both records. The pieces are held by reference and read afresh for the second.
+// Writes both records. The pieces are references, read again for the second record.
 template <class... Pieces>
 [[gnu::noinline]] void record(const Where& where, int level, const char* literal, const Pieces&... pieces)
 {
@@ -53,8 +66,8 @@ template <class... Pieces>
                                        0, 0, compose(buffer, literal, pieces...));
 }
 
-// Writes both records and throws. `sentence` becomes the exception's text only when the records are written.
-// Inline, since each frame between throw and catch costs time, and so does what a frame has done before.
+// Writes both records, then makes the exception from `sentence` and throws it. Inline, because unwinding visits each
+// frame between throw and catch twice.
 template <class Exception, class Sentence, class... Pieces>
 [[noreturn, gnu::always_inline]] inline void fail(const Where& where, const Sentence& sentence,
                                                   const char* literal, const Pieces&... pieces)

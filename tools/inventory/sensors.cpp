@@ -38,18 +38,6 @@ const ValueRow* findRow(std::string_view name)
     return nullptr;
 }
 
-// Holds a node's lock; gives it back on every way out.
-class Lock {
-public:
-    explicit Lock(ZQ::Mutex& mutex) : mutex_(mutex) { mutex_.lock(0xFFFFFFFF); }
-    ~Lock() { mutex_.unlock(); }
-    Lock(const Lock&) = delete;
-    Lock& operator=(const Lock&) = delete;
-
-private:
-    ZQ::Mutex& mutex_;
-};
-
 class Sensor : public Component {
 public:
     Sensor(const Site& site, const char* unit, const sensors_chip_name& chip, const sensors_feature& feature)
