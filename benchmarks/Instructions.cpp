@@ -1,5 +1,5 @@
-// Does one of the library's commonest operations so many times: `instructions OPERATION COUNT`.
-// scripts/count-instructions counts what each of them executes.
+// `instructions OPERATION COUNT` repeats one of the library's most common operations. scripts/count-instructions counts
+// the instructions of each.
 #include <cstdlib>
 #include <functional>
 #include <iostream>
@@ -14,7 +14,7 @@ namespace {
 using IC::Number;
 using IC::PropertyValue;
 
-// The compiler has to assume that the value is read and changed here.
+// The compiler must assume that the value is read and changed here.
 template <class T>
 void use(T& value)
 {

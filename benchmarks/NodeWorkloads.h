@@ -8,22 +8,25 @@
 #include <string>
 #include <vector>
 
-#include "Workloads.h"
+#include "Properties.h"
+#include "Registration.h"
+#include "Samples.h"
+#include "Timing.h"
 
-// The workloads on nodes. Each is written once, for a contender: a class with
+// The workloads on nodes. Each is a template over the contender, a class with
 //
-//   name               its column
-//   Values             the contender that its properties come from
-//   Node               its node type
-//   make(count)        a node with so many properties, on the heap
-//   get, set           of a property; both say whether there is one
-//   all, status, text  of the node
-//   makeEmpty()        a value without content, to read a property into
-//   onlySets           whether only the change of a property is measured
+//   name                its column
+//   Values              the contender whose values are its properties
+//   Node                its node type
+//   make(count)         a node with so many properties, on the heap
+//   get, set            read and replace a property; whether it exists
+//   all, status, text   read the node
+//   makeEmpty()         a value without content, into which a property is read
+//   onlySets            whether only `set` is measured
 namespace benchmarks {
 
 constexpr unsigned int fewProperties = 3;
-constexpr unsigned int fewPropertiesNumber = 2;  // the key of a number among them
+constexpr unsigned int fewPropertiesNumber = 2;  // the key of one of them, a number
 
 template <class Contender>
 void timeGetSameKind(benchmark::State& state)
@@ -63,7 +66,7 @@ void timeGetMissing(benchmark::State& state)
     auto value = Contender::makeEmpty();
     unsigned int key = noProperty;
     if (Contender::get(*node, key, value))
-        state.SkipWithError("there is such a property");
+        state.SkipWithError("the missing property exists");
     beforeTiming();
     for (auto _ : state) {
         benchmark::DoNotOptimize(key);
@@ -79,7 +82,7 @@ void timeSet(benchmark::State& state)
     const auto value = Contender::Values::make(Contender::Values::native(content<S>(1)));
     unsigned int key = S == Subject::real ? aReal : aNumber;
     if (!Contender::set(*node, key, value))
-        state.SkipWithError("there is no such property");
+        state.SkipWithError("the property is missing");
     beforeTiming();
     for (auto _ : state) {
         benchmark::DoNotOptimize(key);
@@ -95,7 +98,7 @@ void timeSetMissing(benchmark::State& state)
     const auto value = Contender::Values::make(Contender::Values::native(content<Subject::number>(1)));
     unsigned int key = noProperty;
     if (Contender::set(*node, key, value))
-        state.SkipWithError("there is such a property");
+        state.SkipWithError("the missing property exists");
     beforeTiming();
     for (auto _ : state) {
         benchmark::DoNotOptimize(key);
@@ -131,7 +134,7 @@ void timeNodeText(benchmark::State& state)
 {
     const auto node = Contender::make(fewProperties);
     if (Contender::text(*node) != "Node 2f636861737369732f66616e31 : 20, status = 0")
-        state.SkipWithError("the text is another one");
+        state.SkipWithError("the text is not the library's");
     beforeTiming();
     for (auto _ : state) {
         auto text = Contender::text(*node);
@@ -159,13 +162,13 @@ std::vector<std::unique_ptr<typename Contender::Node>> makeNodes(std::size_t cou
     return nodes;
 }
 
-// Gives the heap back its order, which the workloads before have left in theirs. So many objects feel it.
+// Consolidates the heap: otherwise the placement of so many objects depends on the workloads before.
 inline void tidyHeap()
 {
     malloc_trim(0);
 }
 
-// The time is that of one node.
+// Measures the time of one node.
 template <class Contender>
 void timeMakeNodes(benchmark::State& state, std::size_t count)
 {
@@ -184,7 +187,7 @@ void timeReadNodes(benchmark::State& state, std::size_t count)
     const auto nodes = makeNodes<Contender>(count);
     auto value = Contender::makeEmpty();
     if (!Contender::get(*nodes.back(), fewPropertiesNumber, value))
-        state.SkipWithError("a property is missing");
+        state.SkipWithError("the property is missing");
     beforeTiming();
     while (state.KeepRunningBatch(static_cast<benchmark::IterationCount>(count)))
         for (const auto& node : nodes) {
@@ -194,7 +197,7 @@ void timeReadNodes(benchmark::State& state, std::size_t count)
         }
 }
 
-// Two threads, one node. It lives as long as the program.
+// The node that two threads share. It lives until the program ends.
 template <class Contender>
 typename Contender::Node& sharedNode()
 {
@@ -234,16 +237,16 @@ void addShared(const std::string& row, void (*function)(benchmark::State&))
         ->UseRealTime();
 }
 
-// `inAll` nodes are timed, or each of them once. The caches take some twenty rounds to settle on as many nodes as they
-// can just hold, so that a contender that is given fewer rounds, because it is slower, would look slower still.
+// Times `total` nodes, and each node at least once. The number of rounds is fixed: the first rounds fill the caches, so
+// a slower contender, which Google Benchmark would give fewer rounds, would look slower than it is.
 template <class Contender, class Function>
-void addNodes(const std::string& row, std::size_t inAll, Function function)
+void addNodes(const std::string& row, std::size_t total, Function function)
 {
     for (const auto count : std::initializer_list<std::size_t> {1000, 30000, 1000000}) {
         const auto name = benchmarkName("nodes/" + row + '/' + std::to_string(count), Contender::name);
         benchmark::RegisterBenchmark(name.c_str(), [function, count](benchmark::State& state) {
             function(state, count);
-        })->Iterations(static_cast<benchmark::IterationCount>(std::max(count, inAll)));
+        })->Iterations(static_cast<benchmark::IterationCount>(std::max(count, total)));
     }
 }
 

@@ -1,4 +1,4 @@
-// What the operations are made of, on this machine.
+// The time of what the workloads consist of: an allocation, a throw, a lock, a conversion to digits, a stream.
 
 #include <charconv>
 #include <mutex>
@@ -6,6 +6,7 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "Registration.h"
 #include "Timing.h"
 
 namespace benchmarks {

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-// What the values of the benchmark hold: the same contents for every contender.
+// The contents of the measured values: the same for every contender.
 namespace benchmarks {
 
 using Bytes = std::vector<unsigned char>;
@@ -37,7 +37,7 @@ constexpr const char* nameOf(Subject subject)
     return "";
 }
 
-// Text ending in four digits, so that the texts of neighbouring samples differ only at their ends.
+// A text that ends in four digits: the texts of neighbouring samples differ only at their ends.
 inline std::string textOfLength(std::size_t length, std::size_t index)
 {
     std::string text = "Fan module of the upper rear chassis bay";
@@ -63,14 +63,14 @@ inline Texts textsOfLength(std::size_t length, std::size_t index)
     return texts;
 }
 
-// The content of one sample: ordered by `index`, and equal to the others up to its end.
+// The content of one sample. Samples differ only at their ends, and a larger `index` gives a larger content.
 template <Subject S>
 auto content(std::size_t index)
 {
     if constexpr (S == Subject::number) {
         return static_cast<std::uint32_t>(3600 + index);
     } else if constexpr (S == Subject::real) {
-        // Six significant digits, which every contender prints in full.
+        // Six significant digits: every contender prints all of them.
         return 120.375 + static_cast<double>(index);
     } else if constexpr (S == Subject::text12) {
         return textOfLength(12, index);
@@ -90,7 +90,7 @@ auto content(std::size_t index)
     }
 }
 
-// The library's text forms of these contents, as a stream writes them.
+// The texts that the library gives for these contents.
 inline std::string textOf(std::uint32_t number)
 {
     return std::to_string(number);

@@ -3,7 +3,6 @@
 #include <benchmark/benchmark.h>
 
 #include <cstddef>
-#include <string>
 
 #if defined(__x86_64__)
 #include <immintrin.h>
@@ -11,7 +10,7 @@
 
 namespace benchmarks {
 
-// How many different values a timed loop goes through between two looks at its end.
+// A timed loop uses so many different values before it asks whether it may end.
 constexpr std::size_t batchSize = 16;
 
 #if defined(__x86_64__)
@@ -21,20 +20,14 @@ constexpr std::size_t batchSize = 16;
 }
 #endif
 
-// Called before every timed loop. A contender that leaves the upper halves of the vector registers in use would
-// slow down the next one, which uses the lower halves.
+// Called before every timed loop. If a contender leaves the upper halves of the vector registers in use, the next one,
+// which uses the lower halves, runs slower.
 inline void beforeTiming()
 {
 #if defined(__x86_64__)
     if (__builtin_cpu_supports("avx"))
         clearUpperVectorHalves();
 #endif
-}
-
-// The row of the table and its column. The report takes the name apart at the bar.
-inline std::string benchmarkName(const std::string& row, const char* contender)
-{
-    return row + '|' + contender;
 }
 
 }  // namespace benchmarks

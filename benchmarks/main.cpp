@@ -9,8 +9,8 @@
 
 namespace {
 
-// A second thread that sleeps as long as the object lives. The C library takes short cuts in a process that has
-// but one thread, and locks would look free.
+// A second thread that sleeps as long as the object lives. In a process with one thread the C library skips the atomic
+// operations of locks, which would then look free.
 class SecondThread {
 public:
     ~SecondThread()
@@ -47,7 +47,7 @@ int main(int argc, char** argv)
     benchmark::AddCustomContext("missing peers", benchmarks::missingPeers);
     benchmark::AddCustomContext("compiler", benchmarks::compiler);
 
-    // Records are composed and handed on, and then nobody wants them.
+    // Records are composed and passed to the sink, which drops them.
     VXLog::setRecordSink([](const VXLog::Record&) {});
     const SecondThread secondThread;
     benchmark::RunSpecifiedBenchmarks();

@@ -2,7 +2,7 @@
 
 #include <boost/json.hpp>
 
-#include "Workloads.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 
@@ -13,7 +13,7 @@ struct BoostJson {
     static constexpr bool libraryForm = false;
     using Value = boost::json::value;
 
-    // It has no bytes and no order.
+    // It has neither bytes nor an order.
     static constexpr bool has(Operation operation, Subject subject)
     {
         return subject != Subject::bytes64 && operation != Operation::less;

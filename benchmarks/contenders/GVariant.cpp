@@ -1,10 +1,10 @@
-// GLib's GVariant, held by a smart pointer. Copies share their content, which cannot be changed.
+// GLib's GVariant, held by a smart pointer. Copies share their content, which is immutable.
 
 #include <glib.h>
 
 #include <memory>
 
-#include "Workloads.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 
@@ -41,7 +41,7 @@ struct Glib {
     static constexpr bool libraryForm = false;
     using Value = Handle;
 
-    // It orders no containers.
+    // It has no order of containers.
     static constexpr bool has(Operation operation, Subject subject)
     {
         return operation != Operation::less
@@ -110,7 +110,7 @@ struct Glib {
         return read == content;
     }
 
-    // By asking for the type, not by an exception.
+    // GLib has no exceptions: its users ask for the type first.
     static bool refused(const Value& text)
     {
         return g_variant_is_of_type(text.get(), G_VARIANT_TYPE_UINT32) == FALSE;

@@ -5,6 +5,7 @@
 #include "IC/ICException.h"
 #include "IC/Node.h"
 #include "NodeWorkloads.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 

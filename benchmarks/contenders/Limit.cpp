@@ -1,8 +1,9 @@
-// The limit that the design sets.
+// The limit of the design.
 
 #include "Limit.h"
 
 #include "NodeWorkloads.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 

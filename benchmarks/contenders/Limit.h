@@ -13,12 +13,12 @@
 #include <utility>
 #include <vector>
 
-// The limit that the design sets: the same representation (one heap object a value, an ordered map, a re-entrant
-// mutex) in the shortest code that does the work. All of it is inline; it writes no record, does not look at the
-// locale and holds nothing out of line but what throws. Texts are written where they stay.
+// The limit of the design: the library's representation (one heap object for each value, an ordered map, a re-entrant
+// mutex) in the shortest code that does the work. Everything is inline but the functions that throw. No records are
+// written, and the locale is ignored. Texts are written in place.
 namespace limit {
 
-// The two digits of each byte.
+// The two hexadecimal digits of each byte.
 class HexDigits {
 public:
     constexpr HexDigits()
@@ -30,7 +30,7 @@ public:
         }
     }
 
-    // Returns the end of what was written.
+    // Returns the end of the digits.
     char* write(char* first, unsigned char byte) const
     {
         std::memcpy(first, pairs_ + 2 * std::size_t {byte}, 2);
@@ -94,7 +94,7 @@ public:
         }
     }
 
-    static constexpr std::size_t longestText = 20;  // of a 64-bit integer
+    static constexpr std::size_t longestText = 20;  // the digits of a 64-bit integer
 
     // Returns the end of the text.
     char* write(char* first) const
@@ -124,7 +124,7 @@ public:
         case Kind::unsigned64:
             return std::to_string(load<std::uint64_t>());
         case Kind::real: {
-            // In place: such a text needs no memory but the string's own.
+            // In place: the text fits into the string's own buffer.
             std::string text(15, ' ');
             char* const first = text.data();
             char* const end =
@@ -157,7 +157,7 @@ private:
     }
 
     Kind kind_ = Kind::unknown;
-    alignas(8) unsigned char bytes_[16] = {};  // wide enough for a date-time
+    alignas(8) unsigned char bytes_[16] = {};  // large enough for a date-time
     [[maybe_unused]] NodeReference reference_ = {0, 0};
 };
 
@@ -310,7 +310,7 @@ public:
         return {};
     }
 
-    // Without a string in between where none is needed.
+    // Makes no string if none is needed.
     friend std::ostream& operator<<(std::ostream& out, const Value& value)
     {
         switch (value.kind_) {
@@ -407,7 +407,7 @@ private:
         return text;
     }
 
-    // Through a buffer, so that the string grows seldom.
+    // Through a buffer, so that the string rarely grows.
     static std::string textOf(const Numbers& numbers)
     {
         std::string text;
@@ -431,7 +431,7 @@ private:
         return text;
     }
 
-    // To its exact length at once.
+    // Allocates the exact length once.
     static std::string textOf(const Texts& texts)
     {
         std::size_t length = 2 + (texts.empty() ? 0 : texts.size() * 4 - 2);
@@ -539,7 +539,7 @@ public:
     static constexpr unsigned char isReadOnly = 16;
 
 private:
-    // The text of a node holds the lock while it asks for the status.
+    // Takes the lock twice, as the library's node does: its text holds the lock and calls status().
     std::uint32_t statusTwiceLocked() const
     {
         const std::lock_guard<std::recursive_mutex> lock(mutex_);

@@ -2,7 +2,7 @@
 
 #include <nlohmann/json.hpp>
 
-#include "Workloads.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 
@@ -13,7 +13,7 @@ struct NlohmannJson {
     static constexpr bool libraryForm = false;
     using Value = nlohmann::json;
 
-    // Its text of bytes is an object of decimal numbers.
+    // It writes bytes as an object of decimal numbers, which is no comparable text.
     static constexpr bool has(Operation operation, Subject subject)
     {
         return subject != Subject::bytes64

@@ -3,7 +3,7 @@
 #include <Poco/Dynamic/Var.h>
 #include <Poco/HexBinaryEncoder.h>
 
-#include "Workloads.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 
@@ -14,7 +14,7 @@ struct PocoVar {
     static constexpr bool libraryForm = false;
     using Value = Poco::Dynamic::Var;
 
-    // It orders no vectors.
+    // It has no order of vectors.
     static constexpr bool has(Operation operation, Subject subject)
     {
         return operation != Operation::less

@@ -6,7 +6,7 @@
 #include <QVariant>
 #include <QVariantList>
 
-#include "Workloads.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 
@@ -17,7 +17,7 @@ struct Qt {
     static constexpr bool libraryForm = false;
     using Value = QVariant;
 
-    // It orders no lists of variants.
+    // It has no order of lists of variants.
     static constexpr bool has(Operation operation, Subject subject)
     {
         return operation != Operation::less || subject != Subject::numbers100;
@@ -74,7 +74,7 @@ struct Qt {
         return read == native(content);
     }
 
-    // By a flag, not by an exception.
+    // Qt reports the refusal with a flag, not with an exception.
     static bool refused(const Value& text)
     {
         bool converted = false;

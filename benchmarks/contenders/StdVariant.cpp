@@ -1,5 +1,5 @@
-// std::variant, the idiom of daemons on a message bus; and the plain idiom of a node: a re-entrant mutex and a
-// std::map of variants.
+// std::variant with the types of a message bus, as daemons use it; and a plain node: a re-entrant mutex and a std::map
+// of variants.
 
 #include <cstdint>
 #include <cstdio>
@@ -10,16 +10,17 @@
 #include "NodeWorkloads.h"
 #include "VXLog/VXLogger.h"
 #include "VXLog/VXMessageBuffer.h"
+#include "ValueWorkloads.h"
 
 namespace benchmarks {
 
 namespace {
 
-// The basic types of the bus and the arrays of them that are wanted here.
+// The basic types of the bus, and those arrays of them that the workloads need.
 using Variant = std::variant<bool, std::uint8_t, std::int16_t, std::uint16_t, std::int32_t, std::uint32_t,
                              std::int64_t, std::uint64_t, double, std::string, Bytes, Numbers, Texts>;
 
-// Written to a stream as programs do that have no better: a visitor, the manipulators, a loop.
+// Writes to a stream with standard means: a visitor, manipulators, a loop.
 struct Print {
     std::ostream& out;
 
@@ -70,7 +71,7 @@ struct Print {
     }
 };
 
-// A text without a stream where the standard library has one.
+// Makes a text without a stream, if the standard library offers that.
 struct ToText {
     std::string operator()(bool flag) const { return flag ? "true" : "false"; }
     std::string operator()(const std::string& text) const { return text; }
@@ -176,7 +177,7 @@ public:
         return true;
     }
 
-    // The same with the two records that the library writes, each composed by the message buffer.
+    // The same, with the two records that the library writes, each composed in a message buffer.
     bool setWithRecords(unsigned int key, const Variant& value)
     {
         record(3000, [&](VXLog::VXMessageBuffer& buffer) -> std::ostream& {

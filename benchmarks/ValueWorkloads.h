@@ -1,9 +1,6 @@
 #pragma once
 
-#include <malloc.h>
-
 #include <initializer_list>
-#include <map>
 #include <ostream>
 #include <sstream>
 #include <string>
@@ -11,22 +8,26 @@
 #include <utility>
 #include <vector>
 
+#include "Properties.h"
+#include "Registration.h"
 #include "Samples.h"
 #include "Timing.h"
 
-// The workloads on values. Each is written once, for a contender: a class with
+// The workloads on values. Each is a template over the contender, a class with
 //
-//   name                 its column
-//   Value                its value type
-//   native(content)      the content as its users have it
-//   make(native)         a value
-//   read<S>(value)       the content again, as its users read it
-//   refused(value)       reads a text as a number and says whether that was refused
-//   equal, less          of two values
-//   text(value)          the text form
-//   stream(out, value)   the text form, written to a stream
-//   has(operation, S)    whether it has the operation at all; what it lacks is left out
-//   libraryForm          whether its texts are to be those of the library
+//   name                  its column
+//   Value                 its value type
+//   native(content)       the content in the type that the contender's users have
+//   make(native)          a value
+//   read<S>(value)        the content, as the contender's users read it
+//   same(read, content)   whether both are the same content
+//   refused(value)        reads a text as a number; whether that was refused
+//   equal, less           compare two values
+//   text(value)           the text form
+//   stream(out, value)    writes the text form to a stream
+//   streamMap(out, map)   writes a property map to a stream
+//   has(operation, S)     whether the contender has the operation; otherwise the row has no such column
+//   libraryForm           whether its texts have to equal those of the library
 namespace benchmarks {
 
 enum class Operation { make, copy, move, assign, read, refuse, equal, less, text, stream };
@@ -50,7 +51,7 @@ auto values(std::size_t first = 0)
     return all;
 }
 
-// Another kind of value than the subject's.
+// A value of another kind than the subject's.
 template <class Contender, Subject S>
 auto valueOfAnotherKind()
 {
@@ -58,7 +59,7 @@ auto valueOfAnotherKind()
     return Contender::make(Contender::native(content<another>(0)));
 }
 
-// A stream that is written over and over at the same place, so that it needs no new memory.
+// A stream that is overwritten from its start each time, so that it allocates nothing new.
 class Target {
 public:
     std::ostream& fromTheStart()
@@ -96,7 +97,7 @@ void timeCopy(benchmark::State& state)
         }
 }
 
-// Into a new value and back again.
+// To a new value and back.
 template <class Contender, Subject S>
 void timeMove(benchmark::State& state)
 {
@@ -124,7 +125,7 @@ void timeAssignSameKind(benchmark::State& state)
         }
 }
 
-// To another kind and back again.
+// To another kind and back.
 template <class Contender, Subject S>
 void timeAssignOtherKind(benchmark::State& state)
 {
@@ -146,7 +147,7 @@ void timeRead(benchmark::State& state)
 {
     const auto sources = values<Contender, S>();
     if (!Contender::same(Contender::template read<S>(sources.back()), content<S>(batchSize - 1)))
-        state.SkipWithError("what is read is not what was stored");
+        state.SkipWithError("the content read differs from the content stored");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize))
         for (const auto& source : sources) {
@@ -160,7 +161,7 @@ void timeRefusedRead(benchmark::State& state)
 {
     const auto sources = values<Contender, Subject::text12>();
     if (!Contender::refused(sources.front()))
-        state.SkipWithError("a text is read as a number");
+        state.SkipWithError("reading a text as a number is not refused");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize))
         for (const auto& source : sources) {
@@ -175,7 +176,7 @@ void timeEqual(benchmark::State& state)
     const auto left = values<Contender, S>();
     const auto right = values<Contender, S>();
     if (!Contender::equal(left[0], right[0]) || Contender::equal(left[0], right[1]))
-        state.SkipWithError("equality is wrong");
+        state.SkipWithError("the equality is wrong");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize))
         for (std::size_t i = 0; i < batchSize; ++i) {
@@ -190,7 +191,7 @@ void timeLess(benchmark::State& state)
     const auto left = values<Contender, S>();
     const auto right = values<Contender, S>(1);
     if (!Contender::less(left[0], right[0]) || Contender::less(right[0], left[0]))
-        state.SkipWithError("less-than is wrong");
+        state.SkipWithError("the order is wrong");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize))
         for (std::size_t i = 0; i < batchSize; ++i) {
@@ -207,7 +208,7 @@ void timeText(benchmark::State& state)
         state.SkipWithError("different values have the same text");
     if constexpr (Contender::libraryForm)
         if (Contender::text(sources[0]) != textOf(content<S>(0)))
-            state.SkipWithError("the text is another one");
+            state.SkipWithError("the text is not the library's");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize))
         for (const auto& source : sources) {
@@ -223,61 +224,13 @@ void timeStream(benchmark::State& state)
     Target target;
     Contender::stream(target.fromTheStart(), sources.front());
     if (target.empty())
-        state.SkipWithError("nothing is written");
+        state.SkipWithError("nothing was written");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize)) {
         std::ostream& out = target.fromTheStart();
         for (const auto& source : sources)
             Contender::stream(out, source);
     }
-}
-
-// A property map of 32, as a node may have it: 16 numbers, 4 reals, 8 short and 4 long texts.
-constexpr unsigned int propertyCount = 32;
-
-template <class Contender>
-auto makeProperty(unsigned int key)
-{
-    switch (key % 8) {
-    case 1:
-    case 5:
-        return Contender::make(Contender::native(content<Subject::text12>(key)));
-    case 3:
-        return Contender::make(Contender::native(content<Subject::text40>(key)));
-    case 6:
-        return Contender::make(Contender::native(content<Subject::real>(key)));
-    default:
-        return Contender::make(Contender::native(content<Subject::number>(key)));
-    }
-}
-
-// For nodes, which are to be timed and not the making of texts for them.
-template <class Contender>
-const typename Contender::Value& property(unsigned int key)
-{
-    static const auto all = [] {
-        std::vector<typename Contender::Value> made;
-        for (unsigned int each = 0; each < propertyCount; ++each)
-            made.push_back(makeProperty<Contender>(each));
-        return made;
-    }();
-    return all[key];
-}
-
-constexpr unsigned int aNumber = 16;  // keys of properties
-constexpr unsigned int aReal = 14;
-constexpr unsigned int noProperty = 1000;
-
-template <class Contender>
-using PropertyMap = std::map<unsigned int, typename Contender::Value>;
-
-template <class Contender>
-PropertyMap<Contender> properties()
-{
-    PropertyMap<Contender> map;
-    for (unsigned int key = 0; key < propertyCount; ++key)
-        map.emplace(key, makeProperty<Contender>(key));
-    return map;
 }
 
 template <class Contender>
@@ -328,20 +281,7 @@ void timeMapPrint(benchmark::State& state)
     for (auto _ : state)
         Contender::streamMap(target.fromTheStart(), map);
     if (target.empty())
-        state.SkipWithError("nothing is written");
-}
-
-// The print of a map by a contender whose library has none for it.
-template <class Contender>
-void streamEachProperty(std::ostream& out, const PropertyMap<Contender>& map)
-{
-    const char* separator = "[";
-    for (const auto& [key, value] : map) {
-        out << separator << key << " = ";
-        Contender::stream(out, value);
-        separator = "], [";
-    }
-    out << ']';
+        state.SkipWithError("nothing was written");
 }
 
 template <class Contender, class Native>
@@ -364,44 +304,6 @@ void timeLargeText(benchmark::State& state, const Native& native)
         auto text = Contender::text(source);
         benchmark::DoNotOptimize(text);
     }
-}
-
-// The memory in use, whichever library asked for it.
-inline double bytesInUse()
-{
-    const auto information = mallinfo2();
-    return static_cast<double>(information.uordblks) + static_cast<double>(information.hblkhd);
-}
-
-// The bytes of one of the objects that `make` makes, with everything that it owns.
-template <class Make>
-void countBytes(benchmark::State& state, const Make& make)
-{
-    constexpr std::size_t count = 10000;
-    for (auto _ : state) {
-        using Object = decltype(make(std::size_t {0}));
-        std::vector<Object> objects;
-        objects.reserve(count);
-        const double before = bytesInUse();
-        for (std::size_t i = 0; i < count; ++i)
-            objects.push_back(make(i));
-        const double owned = bytesInUse() - before;
-        state.counters["bytes"] = owned / static_cast<double>(count) + static_cast<double>(sizeof(Object));
-    }
-}
-
-template <class Contender, class Function>
-void add(const std::string& row, Function function)
-{
-    benchmark::RegisterBenchmark(benchmarkName(row, Contender::name).c_str(), function);
-}
-
-template <class Contender, class Make>
-void addBytes(const std::string& row, Make make)
-{
-    const auto count = [make](benchmark::State& state) { countBytes(state, make); };
-    benchmark::RegisterBenchmark(benchmarkName("bytes/" + row, Contender::name).c_str(), count)
-        ->Iterations(1);
 }
 
 template <class Contender, Subject S>
@@ -456,7 +358,7 @@ void addGrowth()
     }
 }
 
-// Everything that a contender can be measured at, nodes apart.
+// Registers every workload that the contender has, without those on nodes.
 template <class Contender>
 bool addValueWorkloads()
 {
