@@ -1,8 +1,8 @@
 #!/usr/bin/env python3
-"""Counts the instructions that the commonest operations execute in the library, the stand-ins and their caller.
+"""Counts the instructions that the most common operations execute in the library, the stand-ins and their caller.
 
-The C and C++ libraries are left out: which instructions they choose depends on the processor. A table of earlier
-counts is compared, or written anew with --update.
+Instructions of the C and C++ libraries do not count: they select code by the processor. The counts are compared with
+a table of earlier ones, or replace it with --update.
 """
 
 import argparse
@@ -14,12 +14,12 @@ import sys
 import tempfile
 
 TOLERANCE = 0.03
-RUNS = (1000, 2000)  # the difference between the two is the operations alone
+RUNS = (1000, 2000)  # the difference leaves out what the program does besides the operation
 OURS = re.compile(r"/(libIC|libZQ|libVXLog)\.so[.\d]*$|/instructions$")
 
 
 def executed(program, operation, count):
-    """The instructions executed in our own objects."""
+    """The number of instructions executed in the library, the stand-ins and the program."""
     with tempfile.TemporaryDirectory() as folder:
         profile = pathlib.Path(folder, "profile")
         subprocess.run(
@@ -38,7 +38,7 @@ def executed(program, operation, count):
                 if match[2]:
                     objects[match[1]] = match[2]
             elif line.startswith("calls="):
-                called = True  # the next line is what the callee costs
+                called = True  # the next line is the cost of the callee
             elif match := re.match(r"[+\-*\d]\S* (\d+)$", line):
                 if ours and not called:
                     total += int(match[1])
@@ -47,7 +47,7 @@ def executed(program, operation, count):
 
 
 def operations_of(program):
-    """What it can be asked for, by its message of usage."""
+    """The operations that the program lists in its usage message."""
     usage = subprocess.run([program], stderr=subprocess.PIPE, text=True).stderr
     return [line.strip() for line in usage.splitlines() if line.startswith("  ")]
 
@@ -76,12 +76,12 @@ def main():
     if not table:
         sys.exit(f"{options.table} has no operations")
     if compiler != options.compiler and not options.update:
-        sys.exit(f"{options.table} counts what {compiler} compiled, not {options.compiler}; "
-                 "write it anew with --update")
+        sys.exit(f"{options.table} has the counts of {compiler}, not of {options.compiler}; "
+                 "replace them with --update")
 
     operations = operations_of(options.program)
     if set(operations) != set(table) and not options.update:
-        sys.exit(f"{options.table} has other operations than the program: "
+        sys.exit(f"{options.table} and the program differ in these operations: "
                  f"{', '.join(sorted(set(operations) ^ set(table)))}")
 
     exceeded = []
@@ -103,7 +103,7 @@ def main():
         options.table.write_text("\n".join(lines) + "\n")
     elif exceeded:
         sys.exit(f"More than 3 % from the table: {', '.join(exceeded)}. "
-                 "Where that is meant, write the table anew with --update")
+                 "If that is intended, replace the table with --update")
 
 
 if __name__ == "__main__":

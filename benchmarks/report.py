@@ -1,9 +1,8 @@
 #!/usr/bin/python3
-"""Reads what the benchmark measured; prints it as a table and draws it.
+"""Prints the results of the benchmark as a table and draws them.
 
-The table has a row for each workload: the medians of this library, of the limit and of the peers, and what the
-library costs as a ratio of the limit and of the best peer, beside the bar for it. Exits with 1 where a bar is
-missed.
+The table has a row for each workload: the medians of this library, of the limit and of the peers, and the ratios of
+the library to the limit and to the best peer, each with its bar. Exits with 1 if a bar is missed.
 """
 
 import argparse
@@ -21,7 +20,7 @@ LIBRARY = "IC"
 LIMIT = "limit"
 RECORDS = "std::variant + records"
 PEERS = ["std::variant", RECORDS, "nlohmann::json", "boost::json", "Poco::Var", "QVariant", "GVariant"]
-SHARING = {"QVariant", "GVariant"}  # a copy is one more reference to the same content
+SHARING = {"QVariant", "GVariant"}  # a copy is a further reference to the same content
 COLUMNS = [LIBRARY, LIMIT] + PEERS
 PRIMITIVE = "primitive"
 NODE_PANELS = {"node", "two-threads", "nodes"}
@@ -32,7 +31,7 @@ END = "<!-- measured: end -->"
 
 @dataclasses.dataclass
 class Bar:
-    """The most that a row may cost; None is no bar."""
+    """The highest ratios that the matching rows may have; None means no bar."""
 
     pattern: str
     limit: float | None
@@ -48,7 +47,7 @@ class Ratio:
 
     @property
     def missed(self):
-        # To two digits, as it is printed and as the bars are given.
+        # Rounded to two digits, like the printed ratio and the bars.
         return self.bar is not None and round(self.value, 2) > self.bar
 
     def __str__(self):
@@ -73,7 +72,7 @@ def read_bars(path):
 
 
 def read_process(path):
-    """The context of one process, and for each of its rows the median of each contender in nanoseconds or bytes."""
+    """The context of one process, and for each of its rows the median of each contender, in nanoseconds or bytes."""
     file = json.loads(path.read_text(encoding="utf-8"))
     samples = {}
     for run in file["benchmarks"]:
@@ -82,11 +81,11 @@ def read_process(path):
         if run.get("error_occurred"):
             sys.exit(f"{run['name']}: {run['error_message']}")
         row, contender = run["name"].split("|")
-        contender = contender.split("/")[0]  # without what the runner appends, such as the number of threads
+        contender = contender.split("/")[0]  # without the runner's suffix, such as the number of threads
         if "bytes" in run:
             sample = run["bytes"]
         else:
-            # The processor's time, which others on the machine disturb least; two threads also wait.
+            # CPU time, which other processes disturb least; for two threads real time, since they also wait.
             sample = run["real_time" if run.get("threads", 1) > 1 else "cpu_time"]
         samples.setdefault(row, {}).setdefault(contender, []).append(sample)
     return file["context"], {
@@ -96,7 +95,7 @@ def read_process(path):
 
 
 class Row(dict):
-    """The median of each contender over all processes, and what each process saw."""
+    """The median of each contender over all processes, and the results of each process."""
 
     def __init__(self, processes):
         self.processes = processes
@@ -105,7 +104,7 @@ class Row(dict):
         )
 
     def ratio(self, contender, other):
-        """Of two that were measured in turn: what slows the machine for a while slows both."""
+        """The median of the ratios within the processes: a slow phase of the machine slows both contenders."""
         return statistics.median(process[contender] / process[other] for process in self.processes)
 
 
@@ -117,7 +116,7 @@ def read_results(paths):
         for row, contenders in rows.items():
             processes.setdefault(row, []).append(contenders)
     kinds = list(dict.fromkeys(kind(row) for row in processes))
-    # Rows of one kind together, and last what is no operation.
+    # Rows of one kind stand together; sizes and primitives come last.
     rows = sorted(processes, key=lambda row: (kind(row) in {"bytes", PRIMITIVE}, kinds.index(kind(row))))
     return context, {row: Row(processes[row]) for row in rows}
 
@@ -130,9 +129,9 @@ def bar_of(row, bars):
 
 
 def ratios(row, medians, bars):
-    """What the library costs against the limit and against the peer; None where one of them is missing.
+    """The ratios of the library to the limit and to the peer; None for what was not measured.
 
-    A bar for what is missing would be met by nothing at all: that ends the report.
+    If a row has a bar against something that was not measured, the report ends with an error.
     """
     if LIBRARY not in medians:
         return None, None
@@ -144,7 +143,7 @@ def ratios(row, medians, bars):
         peer for peer in PEERS if peer not in SHARING and peer != RECORDS]
     candidates = [peer for peer in candidates if peer in medians]
     if not candidates and bar.peer is not None:
-        sys.exit(f"{row}: has a bar against a peer, and none was measured")
+        sys.exit(f"{row}: has a bar against a peer, but none was measured")
     if not candidates:
         return against_limit, None
     best = min(candidates, key=medians.get)
@@ -168,7 +167,7 @@ def heading(contender):
 
 
 def table(results, bars, columns):
-    """The table in Markdown, its columns aligned."""
+    """The table in Markdown, with aligned columns."""
     lines = [["workload"] + [heading(column) for column in columns] + ["÷ limit", "÷ best peer", "best peer"]]
     for row, medians in results.items():
         if PRIMITIVE in medians:
@@ -190,7 +189,7 @@ def table(results, bars, columns):
 
 
 def lacking(results, columns):
-    """What each peer does not offer, in one line a peer."""
+    """One line for each peer, with the workloads that it does not offer."""
     rows = [row for row in results if LIBRARY in results[row] and kind(row) not in NODE_PANELS | {"bytes"}]
     lines = []
     for column in columns:
@@ -222,7 +221,7 @@ def operating_system():
 
 
 def report(context, results, bars):
-    """The lines of the report in Markdown, and how many bars are missed."""
+    """The lines of the report in Markdown, and the number of missed bars."""
     columns = [column for column in COLUMNS if any(column in medians for medians in results.values())]
     judged = [
         (row, ratio)
@@ -233,7 +232,7 @@ def report(context, results, bars):
     missed = [(row, ratio) for row, ratio in judged if ratio.missed]
     for bar in bars:
         if not any(fnmatch.fnmatchcase(row, bar.pattern) for row in results):
-            sys.exit(f"There is a bar for {bar.pattern}, but no such row")
+            sys.exit(f"There is a bar for {bar.pattern}, but no row matches")
     lines = [
         f"- {processor()}, {context['num_cpus']} processors, {operating_system()}, {context['compiler']}; "
         f"{context['date'][:10]}.",
@@ -262,7 +261,7 @@ def report(context, results, bars):
     return lines, len(missed)
 
 
-# The figure: a panel for each kind of workload, a group of bars for each workload.
+# The figure has a panel for each kind of workload and a group of bars for each workload.
 
 COLOURS = {
     LIBRARY: "#c0392b",
@@ -373,7 +372,7 @@ def draw(results):
 
 
 def update(page, lines):
-    """Replaces what stands between the two marks of the page."""
+    """Replaces the text between the two marks of the page."""
     text = page.read_text(encoding="utf-8")
     before, begin, rest = text.partition(BEGIN)
     _, end, after = rest.partition(END)
@@ -385,10 +384,10 @@ def update(page, lines):
 
 def main():
     parser = argparse.ArgumentParser(description=__doc__.splitlines()[0])
-    parser.add_argument("results", type=pathlib.Path, nargs="+", help="what the benchmark wrote as JSON")
+    parser.add_argument("results", type=pathlib.Path, nargs="+", help="the JSON files that the benchmark wrote")
     parser.add_argument("--bars", type=pathlib.Path, default=pathlib.Path(__file__).with_name("bars.txt"))
-    parser.add_argument("--svg", type=pathlib.Path, help="where to draw the figure")
-    parser.add_argument("--update", type=pathlib.Path, help="the page to write the report into")
+    parser.add_argument("--svg", type=pathlib.Path, help="the file for the figure")
+    parser.add_argument("--update", type=pathlib.Path, help="the page whose report is replaced")
     arguments = parser.parse_args()
 
     context, results = read_results(arguments.results)
