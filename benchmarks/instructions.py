@@ -1,8 +1,8 @@
 #!/usr/bin/env python3
 """Counts the instructions that the most common operations execute in the library, the stand-ins and their caller.
 
-Instructions of the C and C++ libraries do not count: they select code by the processor. The counts are compared with
-a table of earlier ones, or replace it with --update.
+Instructions of the C and C++ libraries do not count, because those choose their code by the processor. The counts are
+compared with a table of earlier ones; with --update they replace it.
 """
 
 import argparse
