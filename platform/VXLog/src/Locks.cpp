@@ -23,7 +23,7 @@ void unlockAll()
     composersLock.unlock();
 }
 
-// The system forgets the handlers when the library is unloaded.
+// The C library removes the handlers when this library is unloaded.
 struct ForkHandlers {
     ForkHandlers()
     {

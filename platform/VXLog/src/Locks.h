@@ -4,8 +4,8 @@
 
 namespace VXLog {
 
-// The locks of this library; at most one is held at a time, and under it nothing runs but this library. A child of
-// fork() finds both free, whichever thread of its parent held them.
+// The locks of this library. A thread holds at most one of them at a time, and under it only this library's code runs.
+// fork() acquires both and releases them in parent and child, so a child finds them free.
 extern std::mutex sinkLock;
 extern std::mutex composersLock;
 

@@ -6,7 +6,7 @@ namespace VXLog {
 
 namespace {
 
-// The length of the printable UTF-8 character at the start of `text`, or 0 where there is none.
+// The length of the printable UTF-8 character that `text` begins with, or 0 if it does not begin with one.
 std::size_t printableLength(std::string_view text)
 {
     const auto byte = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };

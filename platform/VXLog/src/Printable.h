@@ -5,9 +5,9 @@
 
 namespace VXLog {
 
-// The text in a form that stays on one line and drives no terminal. What is printable UTF-8 stays as it is;
-// control characters (U+0000 to U+001F, U+007F to U+009F, U+2028, U+2029) and bytes that are not UTF-8 become
-// \n, \r, \t or \x and two digits a byte, and a backslash becomes two.
+// Returns the text in a form that stays on one line and cannot control a terminal. Printable UTF-8 stays as it is.
+// Control characters (U+0000 to U+001F, U+007F to U+009F, U+2028, U+2029) and bytes that are not UTF-8 become \n, \r,
+// \t, or \x and two hexadecimal digits for each byte. A backslash becomes two.
 std::string printable(std::string_view text);
 
 }  // namespace VXLog

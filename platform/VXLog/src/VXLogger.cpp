@@ -26,21 +26,21 @@ void writeLine(const Record& record)
     line += ' ' + std::to_string(record.level) + (trace ? " trace " : " ");
     line += printable(record.logger) + ' ' + printable(record.file) + ':' + std::to_string(record.line) + ' '
         + printable(record.function) + ": " + printable(record.message) + '\n';
-    // A thread that is cancelled writes its line first: clang takes fwrite for a function that nothing leaves by
-    // unwinding, so being cancelled in it would end the program.
+    // Cancellation waits until the line is written: clang assumes that fwrite does not unwind, so a cancellation
+    // inside it would end the program.
     int before = 0;
     pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, &before);
-    // In one call, so that the lines of several threads do not mix. There is nobody to tell of a failure.
+    // One call, so that the lines of several threads do not mix. There is nowhere to report a failure.
     static_cast<void>(std::fwrite(line.data(), 1, line.size(), stderr));
     pthread_setcancelstate(before, nullptr);
 }
 
-// The sink of the program. It is shared with the calls under way, which go on when it is replaced.
+// The sink of the program. Calls in progress share it, so they can finish after it is replaced.
 struct Current {
     std::shared_ptr<const RecordSink> sink = std::make_shared<const RecordSink>(writeLine);
 };
 
-// Ready before the objects of the program, and there until the last of them is gone.
+// Initialised before the program's own objects at namespace scope, and destroyed after them.
 [[gnu::init_priority(101)]] Current current;
 
 std::shared_ptr<const RecordSink> currentSink()
@@ -61,7 +61,7 @@ RecordSink setRecordSink(RecordSink sink)
     auto next = std::make_shared<const RecordSink>(sink ? std::move(sink) : RecordSink(writeLine));
     for (;;) {
         const auto before = currentSink();
-        RecordSink copy = *before;  // outside the lock: it may throw, and it is the program's code
+        RecordSink copy = *before;  // outside the lock: copying runs the program's code and may throw
         const std::lock_guard<std::mutex> lock(sinkLock);
         if (current.sink == before) {
             current.sink = std::move(next);

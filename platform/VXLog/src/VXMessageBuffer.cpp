@@ -14,7 +14,7 @@ namespace VXLog {
 
 namespace {
 
-// Collects what is written to a stream. Where memory runs out it throws.
+// Collects what is written to a stream. Throws std::bad_alloc if memory runs out.
 class TextBuffer : public std::streambuf {
 public:
     std::string text;
@@ -36,17 +36,17 @@ protected:
 
 }  // namespace
 
-// A stream is costly to make, so some are kept for the buffers to come. They belong to no thread: a thread that
-// ends would have to release its own, when this library may be unloaded already.
+// Making a stream is expensive, so some are kept for later buffers. They are not thread-local: a thread would have to
+// release its own when it ends, and this library may already be unloaded then.
 struct VXMessageBuffer::Composer {
     Composer() : stream(&buffer)
     {
         stream.imbue(std::locale::classic());
-        // Otherwise the stream would swallow std::bad_alloc and leave the text cut short.
+        // Otherwise the stream would swallow std::bad_alloc and truncate the text.
         stream.exceptions(std::ios_base::badbit);
     }
 
-    // As new, whatever was done to the stream, but for the memory of texts of ordinary length.
+    // Restores the initial state, but keeps the memory of texts of ordinary length.
     void reset()
     {
         constexpr std::size_t ordinaryLength = 4096;
@@ -55,7 +55,7 @@ struct VXMessageBuffer::Composer {
             if (text->capacity() > ordinaryLength)
                 std::string().swap(*text);
         }
-        stream.rdbuf(&buffer);  // clears the state too
+        stream.rdbuf(&buffer);  // clears the error state too
         stream.exceptions(std::ios_base::badbit);
         stream.tie(nullptr);
         if (stream.getloc() != std::locale::classic())
@@ -66,10 +66,10 @@ struct VXMessageBuffer::Composer {
         stream.fill(' ');
     }
 
-    // Null where none is kept.
+    // Returns a kept composer, which now belongs to the caller, or null if none is kept.
     static Composer* takeKept();
 
-    // Whether it is kept from now on. Otherwise it still belongs to the caller.
+    // Keeps the composer and returns true, or returns false: then it still belongs to the caller.
     static bool keep(Composer* composer);
 
     TextBuffer buffer;
@@ -77,7 +77,7 @@ struct VXMessageBuffer::Composer {
     std::string taken;
 
 private:
-    // Never destroyed: objects of the program may write records to the very end.
+    // Without a destructor: buffers may still be made and destroyed after Closer has deleted the kept composers.
     struct Kept {
         std::array<Composer*, 16> composers {};
         std::size_t count = 0;
@@ -137,7 +137,7 @@ VXMessageBuffer& VXMessageBuffer::operator<<(const char* text)
     return *this;
 }
 
-// Numbers go past the stream: it would ask its locale how to write what is always written plain.
+// Numbers bypass the stream: their form is fixed, so consulting its locale and flags would only cost time.
 std::ostream& VXMessageBuffer::operator<<(unsigned int number)
 {
     char digits[10];

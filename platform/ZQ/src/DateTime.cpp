@@ -20,8 +20,8 @@ struct Date {
     long long day;
 };
 
-// The civil date of a day counted from 0000-03-01: years begin in March, so that a leap day ends a year, and
-// every 400 years hold the same 146097 days.
+// The date of a day that is counted from 0000-03-01. Years begin in March here, so a leap day is the last day of its
+// year. Any 400 years have 146097 days.
 Date dateOf(long long days)
 {
     const long long era = days / 146097;
@@ -76,11 +76,11 @@ DateTime::operator long() const
 
 DateTime::operator std::string() const
 {
-    const long long seconds = seconds_;  // a long of 32 bits ends long before the years do
+    const long long seconds = seconds_;  // a long of 32 bits could not hold the limits
     if (seconds < firstSecond || seconds > lastSecond)
         return std::string("@").append(std::to_string(seconds));
 
-    // Counted from the year 400 before year 0, so that nothing below is negative.
+    // Days count from the year -400, so that no value below is negative.
     constexpr long long daysToMarch = 146097 - 60;
     const long long sinceFirst = seconds - firstSecond;
     Date date = dateOf(sinceFirst / secondsADay + daysToMarch);

@@ -7,9 +7,10 @@
 
 namespace VXLog {
 
-// One record on its way to a sink: the nine arguments of the logging call and which call it was.
-// It refers to the caller's texts and is good only during the call of the sink, so it cannot be copied;
-// a sink copies the texts that it keeps.
+// One record as a sink receives it: which logging call was made, and its nine arguments.
+//
+// It refers to the caller's texts and is valid only during the call of the sink. It cannot be copied: a sink
+// copies the texts that it keeps.
 struct Record {
     enum class Kind { log, trace };
 
@@ -24,6 +25,7 @@ struct Record {
     int b;
     const std::string& message;
 
+    // Makes a record uncopyable without declaring a constructor: a record stays an aggregate.
     struct NotCopied {
         NotCopied() = default;
         NotCopied(const NotCopied&) = delete;
@@ -32,18 +34,18 @@ struct Record {
     NotCopied notCopied = NotCopied();
 };
 
-// Receives every record, on the thread that wrote it and from several threads at once where several write.
-// It may itself write records or replace the sink. What it throws reaches whoever wrote the record.
+// Receives every record on the thread that writes it; several threads may call it at the same time. It may write
+// records itself and may replace the sink. If it throws, the exception propagates from the logging call.
 using RecordSink = std::function<void(const Record&)>;
 
-// Replaces the sink of the whole program and returns the one before it; an empty `sink` restores the default.
-// Any thread may call at any time; a call of the old sink that has begun runs to its end. Where the old sink
-// cannot be copied, or memory runs out, what that throws is thrown and the old sink stays.
+// Replaces the sink of the whole program and returns the previous one. An empty `sink` restores the default sink.
+// Thread-safe; a call of the previous sink that has begun runs to its end. If copying the previous sink throws or
+// memory runs out, the exception propagates and the previous sink stays.
 //
-// The default sink writes each log record to standard error as one line: time, level, category, file and
-// line, function, text. Control characters, backslashes and bytes that are not UTF-8 are written escaped, so
-// that no text can forge a line or drive a terminal. Trace records are written, with the word "trace" after
-// the level, only while the environment variable VXLOG_TRACE is set.
+// The default sink writes each log record to standard error as one line: time, level, category, file and line,
+// function, text. It escapes control characters, backslashes and bytes that are not UTF-8, so no text can forge a
+// line or control a terminal. It writes trace records only while the environment variable VXLOG_TRACE is set, with
+// the word "trace" after the level.
 RecordSink setRecordSink(RecordSink sink);
 
 }  // namespace VXLog

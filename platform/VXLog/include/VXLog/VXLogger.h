@@ -6,17 +6,18 @@
 
 namespace VXLog {
 
-// Writes records: each call hands one to the current sink (RecordSink.h), on the calling thread. Any thread
-// may call at any time, and so may a child of fork(), whatever the other threads of its parent were doing.
-// What the sink throws reaches the caller.
+// Writes records: each call passes one to the current sink (RecordSink.h) on the calling thread.
+//
+// Thread-safe. A child of fork() may write records too, whatever the other threads of its parent were doing.
+// If the sink throws, the exception propagates to the caller.
 class __attribute__((visibility("default"))) VXLogger {
 public:
-    // `function` and `file` name the place in the source together with `line`; `logger` is the category.
-    // `data`, `a` and `b` are handed on untouched.
+    // Writes a log record. `function`, `file` and `line` name the place in the source; `logger` is the category and
+    // `message` the text. The sink receives `data`, `a` and `b` unchanged.
     static void logLevelMessage(const char* function, const char* file, int line, const std::string& logger,
                                 int level, char* data, int a, int b, const std::string& message);
 
-    // The same for a trace record.
+    // Writes a trace record, with the same arguments.
     static void traceLevelMessage(const char* function, const char* file, int line, const std::string& logger,
                                   int level, char* data, int a, int b, const std::string& message);
 };

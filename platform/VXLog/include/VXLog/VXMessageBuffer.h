@@ -7,12 +7,11 @@
 
 namespace VXLog {
 
-// Composes the text of a record: pieces go in with <<, the text comes out with str.
+// Composes the text of a record: << inserts the pieces, str returns the text.
 //
-// Numbers are written in the classic locale, so that a record reads the same in every program; unsigned int
-// and double take no heed of what manipulators have set. Where memory runs out, the construction or the
-// insertion throws std::bad_alloc; a text is never cut short. One buffer belongs to one thread at a time;
-// several may be composed at once.
+// Numbers are written in the classic locale, so a record reads the same in every program. If memory runs out, the
+// constructor or the insertion throws std::bad_alloc; a text is never truncated. One buffer belongs to one thread
+// at a time; several buffers may be in use at once, in one thread or in several.
 class __attribute__((visibility("default"))) VXMessageBuffer {
 public:
     VXMessageBuffer();
@@ -21,14 +20,16 @@ public:
     VXMessageBuffer& operator=(const VXMessageBuffer&) = delete;
 
     VXMessageBuffer& operator<<(const char* text);
+
+    // In decimal, and in at most six significant digits as printf's %g writes them; manipulators have no effect.
     std::ostream& operator<<(unsigned int number);
     std::ostream& operator<<(double number);
 
     // The stream that the pieces are written to.
     operator std::ostream&();
 
-    // What was composed since the last call of str. The argument is what the last insertion returned. The
-    // reference is good until the next call of str or the end of the buffer.
+    // Returns what was composed since the last call of str. `last` is what the last insertion returned. The
+    // reference is valid until the next call of str or the destruction of the buffer.
     const std::string& str(std::ostream& last);
     const std::string& str(VXMessageBuffer& last);
 
@@ -37,10 +38,10 @@ private:
 
     const std::string& take();
 
-    Composer* composer_;  // owned; then kept for the next buffer
+    Composer* composer_;  // owned; the destructor keeps it for a later buffer
 };
 
-// Every other type, by its own stream insertion.
+// Inserts a piece of any other type with that type's own stream operator.
 template <class T>
 std::ostream& operator<<(VXMessageBuffer& buffer, const T& piece)
 {

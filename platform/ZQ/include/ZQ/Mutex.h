@@ -4,23 +4,24 @@
 
 #pragma GCC visibility push(default)
 #pragma GCC diagnostic push
-// Only clang knows a capability; its -Wthread-safety follows it.
+// Only clang knows the attribute `capability`, which its -Wthread-safety checks.
 #pragma GCC diagnostic ignored "-Wattributes"
 
 namespace ZQ {
 
-// A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as often. Every
-// operation may be called from any thread. It is destroyed when no thread holds it, and a child of fork()
-// must not use one that another thread of its parent held.
+// A re-entrant mutex: the thread that holds it may lock it again, and must unlock it as many times.
+//
+// Thread-safe. No thread may hold it when it is destroyed. A child of fork() must not use a mutex that another
+// thread of its parent held.
 class __attribute__((visibility("default"))) __attribute__((capability("mutex"))) Mutex {
 public:
     Mutex() = default;
     Mutex(const Mutex&) = delete;
     Mutex& operator=(const Mutex&) = delete;
 
-    // Waits at most `timeoutMilliseconds`, 0 not at all, 0xFFFFFFFF for ever. Returns whether the calling
-    // thread now holds the mutex (once more). Throws std::system_error where the system refuses the lock,
-    // such as for a depth of nesting that it cannot count.
+    // Waits at most `timeoutMilliseconds`: 0 does not wait, 0xFFFFFFFF waits for ever. Returns whether the calling
+    // thread has acquired the mutex (once more). Throws std::system_error if the system refuses the lock, for
+    // example because it is nested too deeply.
     bool lock(unsigned int timeoutMilliseconds)
     {
         if (timeoutMilliseconds != forEver)
@@ -29,7 +30,7 @@ public:
         return true;
     }
 
-    // Gives back one lock; throws nothing. The calling thread must hold the mutex.
+    // Releases one lock; throws nothing. The calling thread must hold the mutex.
     void unlock() { mutex_.unlock(); }
 
 private:

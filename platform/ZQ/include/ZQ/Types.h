@@ -1,7 +1,7 @@
 #pragma once
 
-// The agent's fixed-width numeric names. `Uint64` is `unsigned long long` on every machine; on 64-bit Linux
-// std::uint64_t is `unsigned long`, a different type.
+// The agent's fixed-width numeric names. Uint64 is `unsigned long long` on every machine; std::uint64_t is another
+// type, `unsigned long`, on 64-bit Linux.
 namespace ZQ {
 
 using Uint8 = unsigned char;
