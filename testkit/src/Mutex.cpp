@@ -10,7 +10,7 @@ namespace {
 
 constexpr unsigned int forEver = 0xFFFFFFFF;
 
-// Returns what lock is to return.
+// Lists the call. Returns what lock() has to return.
 bool note(observe::LockCall call)
 {
     observe::Observed& all = observe::observed();

@@ -24,12 +24,12 @@ struct State {
 };
 
 struct Observed {
-    // A lock is obtained and given back without memory; so it is here, but for the calls after these.
+    // The platform's lock and unlock do not allocate. Nor do these, for the first 64 calls after reset().
     Observed() { state.lockCalls.reserve(64); }
 
     std::mutex mutex;
     State state;
-    // Not reset: these live as long as the objects that they count.
+    // Not reset: what they count may outlive a test.
     int locksHeld = 0;
     int buffersAlive = 0;
     int dateTimesAlive = 0;
@@ -40,13 +40,13 @@ Observed& observed();
 // Adds to one of the three counts.
 void count(int Observed::*counter, int change);
 
-// Seconds and milliseconds of the clock; the reading is counted.
+// Returns seconds and milliseconds of the clock, and counts the reading.
 std::pair<long, unsigned int> readClock();
 
-// Calls what onLock has set.
+// Calls the action that onLock has set.
 void held(bool lock);
 
-// To be called at the start of each call that can be made to throw.
+// Throws if throwAt asks for it. Every call that can be made to throw begins with this.
 void reached(Call call);
 
 }  // namespace observe

@@ -6,14 +6,14 @@ namespace observe {
 
 Observed& observed()
 {
-    // Never destroyed: objects of the test program may outlive any order of destruction.
+    // Never destroyed: static objects of the test program may use it until the end.
     static auto* const only = new Observed;
     return *only;
 }
 
 namespace {
 
-// Reads or changes something while no other thread does.
+// Runs the action under the mutex of the state.
 template <class Action>
 auto guarded(Action action)
 {
@@ -55,7 +55,7 @@ void reset()
 {
     guarded([](Observed& all) {
         State fresh;
-        fresh.lockCalls.swap(all.state.lockCalls);  // with its room
+        fresh.lockCalls.swap(all.state.lockCalls);  // keeps its capacity
         fresh.lockCalls.clear();
         all.state = std::move(fresh);
     });

@@ -6,8 +6,9 @@
 
 namespace VXLog {
 
-// Composes a record's text; objects are counted and calls can be made to throw (observe/Platform.h).
-// It remembers what its last insertion returned: str throws std::logic_error for the wrong overload.
+// Composes the text of a record: << inserts the pieces, str returns the text. One buffer belongs to one thread at a
+// time. The objects are counted, and the constructor, each insertion and str can be made to throw
+// (observe/Platform.h).
 class VXMessageBuffer {
 public:
     VXMessageBuffer();
@@ -18,7 +19,12 @@ public:
     VXMessageBuffer& operator<<(const char* text);
     std::ostream& operator<<(unsigned int number);
     std::ostream& operator<<(double number);
+
+    // The stream that the pieces are written to.
     operator std::ostream&();
+
+    // Returns what was composed since the last call of str. Throws std::logic_error if `last` is not what the last
+    // insertion returned. The reference is valid until the next call of str or the destruction of the buffer.
     const std::string& str(std::ostream& last);
     const std::string& str(VXMessageBuffer& last);
 
@@ -30,6 +36,7 @@ private:
     bool streamReturned_ = false;
 };
 
+// Inserts a piece of any other type with that type's own stream operator.
 template <class T>
 std::ostream& operator<<(VXMessageBuffer& buffer, const T& piece)
 {

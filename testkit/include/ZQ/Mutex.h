@@ -6,12 +6,18 @@
 
 namespace ZQ {
 
-// A re-entrant mutex that tells every call of lock and unlock to observe/Platform.h.
+// A re-entrant mutex whose calls observe::lockCalls() lists. Thread-safe. No thread may hold it when it is destroyed.
 class Mutex {
 public:
     Mutex();
     ~Mutex();
+
+    // Waits at most `timeoutMilliseconds`: 0 does not wait, 0xFFFFFFFF waits for ever. Returns false if the time is
+    // over; otherwise the calling thread holds the mutex (once more) and the result is what observe::setLockResult
+    // has set. Can be made to throw (observe/Platform.h).
     bool lock(unsigned int timeoutMilliseconds);
+
+    // Releases one lock. The calling thread must hold the mutex.
     void unlock();
 
 private:

@@ -1,5 +1,6 @@
 #pragma once
 
+// The agent's fixed-width numeric names. Uint64 is `unsigned long long` on every machine.
 namespace ZQ {
 
 typedef unsigned char Uint8;

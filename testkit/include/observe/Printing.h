@@ -9,12 +9,12 @@
 #include "IC/Number.h"
 #include "IC/Property.h"
 
-// How GoogleTest prints values: with the name of the kind, since a text form does not tell 5 from "5".
+// Makes GoogleTest print values with the name of their kind, because the texts of 5 and "5" are equal:
 //
 //   IC::Number(5u)                     KIND_UINT32 5
 //   IC::PropertyValue("5", true)       KIND_STRING "5", read-only
 //
-// Included by all of a program's test files or by none: GoogleTest prints one type in one way.
+// Include this header in all test files of a program or in none: they must agree on how a type is printed.
 namespace IC {
 
 inline void PrintTo(const Number& number, std::ostream* out)
@@ -43,7 +43,7 @@ inline void PrintTo(const PropertyValue& value, std::ostream* out)
                                             "KIND_STRINGARRAY"};
     const PropertyValue::KindType kind = value.getKind();
     *out << names[kind];
-    const std::string text = value;  // "invalid" without an object, which a conversion would refuse
+    const std::string text = value;  // "invalid" if the value has no object; a conversion would throw then
     if (kind == PropertyValue::KIND_STRING)
         *out << ' ' << testing::PrintToString(text);
     else if (kind == PropertyValue::KIND_NUMBER && text != "invalid")

@@ -10,32 +10,15 @@
 
 #include "observe/Platform.h"
 
-// What the tests of every class expect of a refusal: a log record, the same record again at trace level, and
-// then the exception.
+// Checks for a refusal: a log record, the same record again as a trace record, then the exception.
 //
-// Including this header is enough for observe::reset() to run before each test, and for a check after each
-// test that no message buffer lives on and no lock is held.
-//
-//   expectRefusal<std::out_of_range>([&] { return static_cast<bool>(number); },
-//                                    "operator bool", "Number", "Vexilon.IC.Number",         // where
-//                                    "bool: Can't return current value as a Boolean, kind=2",  // logged
-//                                    "Can't return current value as a Boolean");               // what()
-//
-// A test file wraps this in a helper of its own that fills in file and category. That the object is unchanged
-// is for the caller to check. The line in the records is returned (0 when there was no record).
-//
-// expectRecordPair checks two neighbours among the records, for operations that write several pairs or that
-// write without throwing:
-//
-//   const auto records = observe::records();
-//   ASSERT_EQ(records.size(), 4u);
-//   expectRecordPair(records, 0, "setProperty", "Node", "Vexilon.IC.Node", 3000, "setProperty: 7 true");
-//   expectRecordPair(records, 2, "setProperty", "Node", "Vexilon.IC.Node", 6000, "setProperty: 7 read-only");
+// In a program that includes this header, observe::reset() runs before each test, and each test fails if it leaves a
+// message buffer alive or a lock held.
 
 namespace observe {
 
-// GoogleTest's report lists with each test what it expected to be refused, numbers left out, as
-// "file|function|level|message" and "exception|what()".
+// Adds a refusal that a test expected to GoogleTest's report of that test: a property with the name
+// "file|function|level|message", where # stands for each run of digits, and the value "type of the exception|what()".
 inline void report(const std::string& function, const std::string& file, int level,
                    const std::string& message, const std::string& exception)
 {
@@ -51,14 +34,20 @@ inline void report(const std::string& function, const std::string& file, int lev
 
 }  // namespace observe
 
-// Expects records[first] to be a log record and records[first + 1] its trace record, with these fields, and
-// null, 0 and 0 in between. Returns their line.
+// Expects records[first] to be a log record and records[first + 1] its trace record, with these fields and with null,
+// 0 and 0 for `data`, `a` and `b`. Returns their line, or 0 if there are too few records. For operations that write
+// several pairs, or that write without throwing:
+//
+//   const auto records = observe::records();
+//   ASSERT_EQ(records.size(), 4u);
+//   expectRecordPair(records, 0, "setProperty", "Node", "Vexilon.IC.Node", 3000, "setProperty: 7 true");
+//   expectRecordPair(records, 2, "setProperty", "Node", "Vexilon.IC.Node", 6000, "setProperty: 7 read-only");
 inline int expectRecordPair(const std::vector<observe::Record>& records, std::size_t first,
                             const std::string& function, const std::string& file, const std::string& category,
                             int level, const std::string& message)
 {
     if (records.size() < first + 2) {
-        ADD_FAILURE() << "no records " << first << " and " << first + 1 << " for: " << message;
+        ADD_FAILURE() << "records " << first << " and " << first + 1 << " are missing, expected: " << message;
         return 0;
     }
     if (level == 6000)
@@ -81,8 +70,14 @@ inline int expectRecordPair(const std::vector<observe::Record>& records, std::si
     return records[first].line;
 }
 
-// Expects the operation to write exactly one such pair of level 6000 and to throw exactly this exception: a
-// class derived from it will not do.
+// Expects the operation to write exactly one such pair, of level 6000, and to throw this exception with this what().
+// An exception of a derived class fails the test. Returns the line in the records, or 0 if they are missing. The caller
+// checks that the object is unchanged.
+//
+//   expectRefusal<std::out_of_range>([&] { return static_cast<bool>(number); },
+//                                    "operator bool", "Number", "Vexilon.IC.Number",           // where
+//                                    "bool: Can't return current value as a Boolean, kind=2",  // logged
+//                                    "Can't return current value as a Boolean");               // what()
 template <class Exception, class Operation>
 int expectRefusal(Operation operation, const std::string& function, const std::string& file,
                   const std::string& category, const std::string& logged, const std::string& sentence)
@@ -90,14 +85,14 @@ int expectRefusal(Operation operation, const std::string& function, const std::s
     const std::size_t before = observe::records().size();
     try {
         static_cast<void>(operation());
-        ADD_FAILURE() << "nothing was thrown; expected: " << sentence;
+        ADD_FAILURE() << "no exception was thrown, expected: " << sentence;
     } catch (const Exception& exception) {
         EXPECT_TRUE(typeid(exception) == typeid(Exception)) << typeid(exception).name();
         EXPECT_EQ(std::string(exception.what()), sentence);
     } catch (const std::exception& other) {
         ADD_FAILURE() << "another exception was thrown: " << typeid(other).name() << ": " << other.what();
     } catch (...) {
-        ADD_FAILURE() << "another exception was thrown; expected: " << sentence;
+        ADD_FAILURE() << "another exception was thrown, expected: " << sentence;
     }
     const std::vector<observe::Record> records = observe::records();
     EXPECT_EQ(records.size(), before + 2) << "records written by the refusal: " << records.size() - before;
@@ -109,7 +104,7 @@ int expectRefusal(Operation operation, const std::string& function, const std::s
 
 namespace observe {
 
-// One message of the library, as a log record and as the same trace record.
+// A message that the library writes twice: as a log record and as a trace record.
 struct Message {
     std::string function;
     std::string logger;
@@ -119,8 +114,8 @@ struct Message {
 
 }  // namespace observe
 
-// Expects the records since the test began, or since observe::reset(), to be those of these messages, in this order,
-// and no others.
+// Expects the records since the start of the test, or since observe::reset(), to be those of these messages in this
+// order, and no others.
 //
 //   expectRecords({{"setProperty", "Vexilon.IC.Node", 3000, "setProperty: 7 true"}});
 inline void expectRecords(const std::vector<observe::Message>& expected)
@@ -138,14 +133,15 @@ inline void expectRecords(const std::vector<observe::Message>& expected)
     std::string written;
     for (const observe::Record& record : observe::records())
         written += line(record.trace, record.function, record.logger, record.level, record.message);
-    EXPECT_EQ(written, wanted);  // texts of several lines, of which GoogleTest prints the difference
+    EXPECT_EQ(written, wanted);  // GoogleTest prints the difference of texts that have several lines
 }
 
 namespace observe {
 
+// Begins each test with reset() and checks what it leaves behind.
 class ObserveEachTest : public testing::EmptyTestEventListener {
 public:
-    // Appended before main runs; GoogleTest owns and deletes it.
+    // Runs before main. GoogleTest deletes the listener.
     static bool append()
     {
         testing::UnitTest::GetInstance()->listeners().Append(new ObserveEachTest);
