@@ -18,5 +18,5 @@ set(IC_LEFT_OUT
     inventory     # the libraries that it reads this machine with, and umockdev, are installed for this machine alone
     link_orders)  # links and starts programs by itself; an order of objects is the same for the linker everywhere
 if(emulator)  # it grants its programs memory beyond any limit that they set themselves
-    list(APPEND IC_LEFT_OUT MemoryLimit.LeavesTheOldStateWhereAHugeValueDoesNotFit)
+    list(APPEND IC_LEFT_OUT MemoryLimit.KeepsTheOldValueWhenMemoryRunsOut)
 endif()

@@ -1,4 +1,4 @@
-// Whatever bytes a text is made of, it comes back, is printed and is recorded byte by byte.
+// Values keep, print and record every byte of a text, whatever the bytes are.
 
 #include "HostileTexts.h"
 
@@ -51,7 +51,7 @@ std::string streamed(const Value& value)
     return out.str();
 }
 
-// Runs the check once for each text; the bytes of one that fails are shown.
+// Runs the check for each text up to the first that fails, and shows the first bytes of that one.
 template <class Check>
 void forEachText(Check check)
 {
@@ -66,7 +66,7 @@ void forEachText(Check check)
     }
 }
 
-TEST(HostileContent, ComesBackFromAPropertyByteByByte)
+TEST(HostileContent, PropertyKeepsEveryByteOfAText)
 {
     forEachText([](const std::string& text) {
         const PropertyValue value(text);
@@ -79,7 +79,7 @@ TEST(HostileContent, ComesBackFromAPropertyByteByByte)
     });
 }
 
-TEST(HostileContent, ComesBackFromAnArrayByteByByte)
+TEST(HostileContent, StringArrayKeepsEveryByte)
 {
     forEachText([](const std::string& text) {
         const PropertyValue value(IC::StringArray {text, "", text});
@@ -90,7 +90,7 @@ TEST(HostileContent, ComesBackFromAnArrayByteByByte)
     });
 }
 
-TEST(HostileContent, ComesBackFromBytesAsTheyAre)
+TEST(HostileContent, BufferKeepsEveryByte)
 {
     forEachText([](const std::string& text) {
         IC::Buffer bytes;
@@ -101,7 +101,7 @@ TEST(HostileContent, ComesBackFromBytesAsTheyAre)
     });
 }
 
-TEST(HostileContent, ComesBackFromANodeByteByByte)
+TEST(HostileContent, NodeKeepsEveryByte)
 {
     forEachText([](const std::string& text) {
         Provider node(text, 7);
@@ -118,7 +118,7 @@ TEST(HostileContent, ComesBackFromANodeByteByByte)
     });
 }
 
-TEST(HostileContent, IsRecordedByteByByteWhenAPropertyIsSet)
+TEST(HostileContent, SetPropertyRecordsEveryByte)
 {
     forEachText([](const std::string& text) {
         Provider node("ab", 7);
@@ -135,7 +135,7 @@ TEST(HostileContent, IsRecordedByteByByteWhenAPropertyIsSet)
     });
 }
 
-TEST(HostileContent, ComesBackFromAnErrorByteByByte)
+TEST(HostileContent, ErrorKeepsEveryByte)
 {
     forEachText([](const std::string& text) {
         const IC::Error error(text, 5);
@@ -147,7 +147,7 @@ TEST(HostileContent, ComesBackFromAnErrorByteByByte)
     });
 }
 
-TEST(HostileContent, ComesBackFromAnAlertByteByByte)
+TEST(HostileContent, AlertKeepsEveryByte)
 {
     forEachText([](const std::string& text) {
         ZQ::DateTime time(1234567890, 3);

@@ -1,4 +1,4 @@
-// Whatever bytes a record is made of, the default sink writes one line of printable text for it.
+// The default sink writes each record as one line of printable text, whatever bytes the record contains.
 
 #include "HostileTexts.h"
 
@@ -17,7 +17,7 @@
 
 namespace {
 
-// Three records for each text: a request and its refusal, and one whose every field is hostile.
+// Writes three records for each text: a request, its refusal, and a record in which every text is hostile.
 void writeRecords()
 {
     IC::Node node(20);
@@ -27,7 +27,7 @@ void writeRecords()
     }
 }
 
-// What a child process that runs `write` leaves on its standard error.
+// What a child process that runs `write` writes to its standard error.
 std::string standardErrorOf(void (*write)())
 {
     std::FILE* const file = std::tmpfile();
@@ -51,8 +51,8 @@ std::string standardErrorOf(void (*write)())
     return all;
 }
 
-// Whether the system's own reading of UTF-8 finds characters, and no control, in the whole line. By iconv, which needs
-// no locale: there is none for another byte order than the machine's.
+// Whether the line is valid UTF-8 without control characters. Asks iconv, because mbstowcs would need a UTF-8 locale,
+// which emulators for machines of the other byte order do not have.
 bool isPrintable(std::string line)
 {
     const iconv_t reading = iconv_open("WCHAR_T", "UTF-8");
@@ -70,7 +70,7 @@ bool isPrintable(std::string line)
            });
 }
 
-TEST(HostileRecords, AreOnePrintableLineEach)
+TEST(HostileRecords, EachBecomesOnePrintableLine)
 {
     const std::string all = standardErrorOf(writeRecords);
     std::size_t lines = 0;

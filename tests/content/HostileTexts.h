@@ -3,8 +3,8 @@
 #include <string>
 #include <vector>
 
-// Texts that a careless reader would cut, expand, obey or choke on: every byte alone and amid others, NULs, line ends,
-// terminal sequences, format strings, and what is not UTF-8.
+// Texts that careless code would truncate, expand, execute or fail on: every byte alone and between others, NULs, line
+// ends, terminal sequences, format strings, and bytes that are not UTF-8.
 inline std::vector<std::string> hostileTexts()
 {
     std::vector<std::string> texts {

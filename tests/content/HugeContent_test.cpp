@@ -1,17 +1,16 @@
-// Values of millions of elements are exact, and what they cost grows with their size and no faster: that is told by
-// counting allocations.
+// Values with a million elements are exact, and the number of allocations grows no faster than their size.
 //
-// The environment variable IC_TEST_BYTES sets the size of the largest bytes and text, such as 2147483649 for one that
-// no int can count.
+// The environment variable IC_TEST_BYTES sets the size of the largest buffer and text. 2147483649 is more than an int
+// can count.
 
 #include <gtest/gtest.h>
 
 #include <cstdlib>
 #include <sstream>
 
-#include "support/AllocationFailure.h"
 #include "IC/Node.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
 
 namespace {
 
@@ -26,7 +25,7 @@ std::size_t manyBytes()
     return wanted != nullptr ? std::strtoul(wanted, nullptr, 10) : std::size_t(64) << 20;
 }
 
-// The text of an element, too long for a string's own buffer.
+// The text of an element, too long for the short-string buffer of std::string.
 std::string elementText(std::size_t i)
 {
     return "an element that needs memory of its own " + std::to_string(i);
@@ -130,7 +129,7 @@ TEST(HugeContent, HoldsAHundredThousandProperties)
     Provider node(count);
     for (unsigned int key = 0; key < count; key += 2)
         ASSERT_EQ(node.setProperty(key, PropertyValue(Number(count + key))).getStatus(), 0);
-    EXPECT_EQ(observe::records().size(), count);  // two for each
+    EXPECT_EQ(observe::records().size(), count);  // two for each property that was set
     const auto properties = node.getProperties();
     ASSERT_EQ(properties.size(), count);
     std::string expected;
@@ -147,7 +146,7 @@ TEST(HugeContent, HoldsAHundredThousandProperties)
     EXPECT_TRUE(out.str() == expected);
 }
 
-// Allocations of the operation on an array of `count` elements.
+// How many allocations the operation makes on an array of `count` elements.
 template <class Make, class Operation>
 long allocations(Make make, std::size_t count, Operation operation)
 {
@@ -155,7 +154,7 @@ long allocations(Make make, std::size_t count, Operation operation)
     return allocation::countOf([&] { operation(value); });
 }
 
-TEST(HugeContent, CostsAsManyAllocationsAsItHasElements)
+TEST(HugeContent, CopyAllocatesOncePerTextAndComparisonNever)
 {
     const auto copy = [](const PropertyValue& value) { const PropertyValue another(value); };
     const auto text = [](const PropertyValue& value) { static_cast<void>(value.operator std::string()); };
@@ -164,10 +163,10 @@ TEST(HugeContent, CostsAsManyAllocationsAsItHasElements)
     };
     for (const std::size_t count : {std::size_t(10000), std::size_t(100000), million}) {
         SCOPED_TRACE(count);
-        // The object, its elements, and one for each text.
+        // One for the object, one for its elements, one for each text.
         EXPECT_EQ(allocations(manyTexts, count, copy), 2 + static_cast<long>(count));
         EXPECT_EQ(allocations(manyNumbers, count, copy), 2);
-        // A text is made by doubling.
+        // The text doubles its capacity as it grows.
         EXPECT_LE(allocations(manyTexts, count, text), 40);
         EXPECT_LE(allocations(manyNumbers, count, text), 40);
         EXPECT_EQ(allocations(manyTexts, count, compare), 0);
@@ -175,7 +174,7 @@ TEST(HugeContent, CostsAsManyAllocationsAsItHasElements)
     }
 }
 
-TEST(HugeContent, CostsAsManyAllocationsAsANodeHasProperties)
+TEST(HugeContent, GetPropertiesAllocatesTwicePerProperty)
 {
     for (const unsigned int count : {1000u, 10000u, 100000u}) {
         SCOPED_TRACE(count);
@@ -184,7 +183,7 @@ TEST(HugeContent, CostsAsManyAllocationsAsANodeHasProperties)
         observe::reset();
         node.getProperty(0, value);
         EXPECT_LE(allocation::countOf([&] { node.getProperty(count / 2, value); }), 2);
-        // For each property its place in the map and its number; and what the observer notes.
+        // Each property allocates a node of the map and its number. The test kit's list of locks may grow too.
         EXPECT_NEAR(
             static_cast<double>(allocation::countOf([&] { static_cast<void>(node.getProperties()); })),
             2.0 * count, 8);

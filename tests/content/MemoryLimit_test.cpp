@@ -1,4 +1,4 @@
-// Where the system refuses memory, std::bad_alloc is thrown and the old state stays.
+// When the system refuses memory, operations throw std::bad_alloc and leave the old state.
 
 #include <gtest/gtest.h>
 #include <sys/resource.h>
@@ -23,7 +23,7 @@ public:
     using Node::properties;
 };
 
-// Lets the process have so many more bytes.
+// Limits the process to the memory that it has now and `more` bytes.
 void limitMemory(std::size_t more)
 {
     std::FILE* const file = std::fopen("/proc/self/statm", "r");
@@ -47,7 +47,7 @@ bool runsOut(Operation operation)
     return false;
 }
 
-// The number of the first thing that went wrong, or 0.
+// Returns the number of the first check that fails, or 0.
 int useWithLittleMemory()
 {
     constexpr std::size_t mebibyte = 1 << 20;
@@ -80,11 +80,11 @@ int useWithLittleMemory()
         return 33;
     if (observe::locksHeld() != 0 || observe::buffersAlive() != 0)
         return 34;
-    old = PropertyValue("a new text");  // there is memory for what is small
+    old = PropertyValue("a new text");  // small values still fit
     return std::string(old) == "a new text" ? 0 : 35;
 }
 
-TEST(MemoryLimit, LeavesTheOldStateWhereAHugeValueDoesNotFit)
+TEST(MemoryLimit, KeepsTheOldValueWhenMemoryRunsOut)
 {
     const pid_t child = fork();
     ASSERT_GE(child, 0);
