@@ -8,7 +8,7 @@
 
 constexpr int threadCount = 8;
 
-// Runs work(0) to work(7), each on a thread of its own, which all begin when the last of them is there.
+// Runs work(0) to work(7), each on its own thread. All of them begin when the last thread has started.
 inline void runAtOnce(const std::function<void(int)>& work)
 {
     pthread_barrier_t barrier;

@@ -1,4 +1,4 @@
-// A thread may be cancelled in an operation on a node: the lock is given back, and nothing stays behind.
+// A thread may be cancelled in an operation on a node: the lock is released and no memory leaks.
 
 #include <gtest/gtest.h>
 #include <pthread.h>
@@ -7,16 +7,16 @@
 #include <memory>
 #include <string>
 
-#include "support/HeapInUse.h"
 #include "IC/Node.h"
 #include "VXLog/RecordSink.h"
+#include "support/HeapInUse.h"
 
 namespace {
 
 using IC::Node;
 using IC::PropertyValue;
 
-// Takes effect at the next cancellation point. A thread that cancels itself does so in the same place each time.
+// Takes effect at the next cancellation point. The thread cancels itself, so it is always cancelled in the same place.
 void cancelThisThread()
 {
     pthread_cancel(pthread_self());
@@ -63,7 +63,7 @@ void cancelOnceIn(void (*operation)(Fan&))
     ASSERT_EQ(result, PTHREAD_CANCELED);
     if (!job->fan.mutex.lock(0)) {
         static_cast<void>(job.release());  // its destructor would wait for ever
-        FAIL() << "the lock was not given back";
+        FAIL() << "the lock was not released";
     }
     job->fan.mutex.unlock();
     PropertyValue value("");
@@ -73,7 +73,7 @@ void cancelOnceIn(void (*operation)(Fan&))
 
 void cancelIn(void (*operation)(Fan&))
 {
-    for (int i = 0; i < 10; ++i)  // leaves room for the texts of later records, and whatever the system keeps
+    for (int i = 0; i < 10; ++i)  // the platform and the C library keep some memory for later rounds
         ASSERT_NO_FATAL_FAILURE(cancelOnceIn(operation));
     const std::size_t memory = heapInUse();
     constexpr int rounds = 100;
@@ -92,7 +92,7 @@ private:
     VXLog::RecordSink before_;
 };
 
-TEST_F(Cancellation, InARecordBeforeTheLockLeavesNothingBehind)
+TEST_F(Cancellation, WhileARecordIsWrittenLeaksNothing)
 {
     VXLog::setRecordSink([](const VXLog::Record&) {
         cancelThisThread();
@@ -102,7 +102,7 @@ TEST_F(Cancellation, InARecordBeforeTheLockLeavesNothingBehind)
         [](Fan& fan) { fan.setProperty(1, PropertyValue("another text that needs memory of its own")); });
 }
 
-TEST_F(Cancellation, InARecordUnderTheLockGivesTheLockBack)
+TEST_F(Cancellation, WhileARecordIsWrittenUnderTheLockReleasesTheLock)
 {
     VXLog::setRecordSink([](const VXLog::Record& record) {
         if (record.level != 6000)
@@ -114,12 +114,12 @@ TEST_F(Cancellation, InARecordUnderTheLockGivesTheLockBack)
         [](Fan& fan) { fan.setProperty(7, PropertyValue("another text that needs memory of its own")); });
 }
 
-TEST_F(Cancellation, InAnOverrideUnderTheLockGivesTheLockBack)
+TEST_F(Cancellation, InAnOverrideUnderTheLockReleasesTheLock)
 {
     cancelIn([](Fan& fan) { static_cast<void>(fan.operator std::string()); });
 }
 
-TEST_F(Cancellation, TakesEffectOnceTheDefaultSinkHasWrittenItsLine)
+TEST_F(Cancellation, TakesEffectAfterTheDefaultSinkHasWrittenItsLine)
 {
     testing::internal::CaptureStderr();
     cancelIn([](Fan& fan) {
@@ -128,7 +128,8 @@ TEST_F(Cancellation, TakesEffectOnceTheDefaultSinkHasWrittenItsLine)
         pthread_testcancel();
     });
     const std::string written = testing::internal::GetCapturedStderr();
-    EXPECT_EQ(std::count(written.begin(), written.end(), '\n'), 2 * 110);  // a request and its refusal
+    EXPECT_EQ(std::count(written.begin(), written.end(), '\n'),
+              2 * 110);  // a request and its refusal in each round
     EXPECT_NE(written.find(": setProperty: 7 does not exist\n"), std::string::npos) << written;
 }
 

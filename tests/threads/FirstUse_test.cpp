@@ -1,5 +1,5 @@
-// Eight threads of a fresh process use everything for the first time at once. CTest runs each test in a process of its
-// own; nothing here uses the library before the threads do.
+// Eight threads of a new process use the whole library for the first time, at the same time. CTest runs each test in
+// its own process, and nothing here uses the library before the threads do.
 
 #include <gtest/gtest.h>
 
@@ -15,7 +15,7 @@
 
 namespace {
 
-// Everything that has a text, and every exception, through the default sink.
+// Writes a value of every class that has a text, and the texts of refusals; the default sink writes their records.
 std::string useEverything()
 {
     const IC::Node node(20);
@@ -41,10 +41,10 @@ std::string useEverything()
 
 class FirstUse : public testing::TestWithParam<int> { };
 
-TEST_P(FirstUse, OfEverythingMayBeAtOnce)
+TEST_P(FirstUse, OfEverythingMayHappenOnAllThreadsAtOnce)
 {
     try {
-        throw 0;  // the first exception of a process initialises the language's run-time library
+        throw 0;  // the first exception of a process initialises the C++ runtime
     } catch (int) {
     }
     std::array<std::string, threadCount> seen;

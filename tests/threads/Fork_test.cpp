@@ -1,4 +1,4 @@
-// A child of fork() can use the library, whatever the other threads of its parent were doing.
+// A child of fork() can use the library, whatever the other threads of its parent are doing.
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
@@ -24,7 +24,7 @@ public:
     Fan() : Node(SENSOR_FAN) { properties.insert({1u, PropertyValue("old")}); }
 };
 
-// Makes, sets, prints and logs, on objects of its own. What did not go well, or 0.
+// Makes, changes and prints objects of its own, and writes records. Returns 0, or which checks failed, one bit each.
 int useInChild()
 {
     Fan fan;
@@ -47,17 +47,17 @@ int useInChild()
         + (text.str() == "Node  : 20, status = 0 [1 = new]" ? 0 : 8);
 }
 
-TEST(Fork, LeavesAChildThatMakesSetsPrintsAndLogs)
+TEST(Fork, ChildCanMakeChangePrintAndLog)
 {
 #if defined(__GLIBCXX__) && !defined(_GLIBCXX_HAVE_ATOMIC_LOCK_POLICY)
     GTEST_SKIP()
-        << "This standard library counts references under a lock of its own, and nobody gives it back in a "
-           "child (libstdc++ of GCC 12 for riscv64)";
+        << "this standard library counts references under a global lock, which a child of fork() may find "
+           "locked for ever (libstdc++ of GCC 12 for riscv64)";
 #endif
     const auto before = VXLog::setRecordSink([](const VXLog::Record&) {});
     std::atomic<bool> isOver {false};
     std::atomic<long> rounds {0};
-    // Works on records alone, and on no memory of the heap, whose own locks are not the library's business.
+    // Writes records and allocates nothing: this test is not about the locks of malloc.
     std::thread working([&] {
         const PropertyValue value("short");
         for (Fan fan; !isOver; ++rounds)
@@ -69,15 +69,16 @@ TEST(Fork, LeavesAChildThatMakesSetsPrintsAndLogs)
         const pid_t child = fork();
         ASSERT_GE(child, 0);
         if (child == 0) {
-            alarm(60);  // where a lock is never given back, the child does not end by itself
+            alarm(60);  // ends a child that waits for a lock for ever
             dup2(open("/dev/null", O_WRONLY), STDERR_FILENO);
             _exit(useInChild());
         }
         int status = 0;
         ASSERT_EQ(waitpid(child, &status, 0), child);
-        ASSERT_TRUE(WIFEXITED(status)) << "child " << i << " did not end: a lock was never given back";
+        ASSERT_TRUE(WIFEXITED(status))
+            << "child " << i << " was killed: it crashed or waited for a lock for ever";
         ASSERT_EQ(WEXITSTATUS(status), 0);
-        // Each fork meets the thread at another place.
+        // Lets the thread go on, so that each fork meets it at another place.
         for (const long reached = rounds; rounds == reached;)
             std::this_thread::yield();
     }

@@ -1,7 +1,7 @@
-// Eight threads on shared nodes: no value is torn, no change is lost, and what was read had been written.
+// Eight threads work on shared nodes: no value is torn, no change is lost, and no reader sees an older value again.
 //
-// The environment variable IC_TEST_OPERATIONS sets the number of operations, such as 100000000 for a long run. What
-// the threads share besides the nodes is guarded by mutexes, which every tool that looks for races understands.
+// The environment variable IC_TEST_OPERATIONS sets the number of operations; 100000000 is a long run. What the threads
+// share besides the nodes is protected by mutexes, which all race detectors understand.
 
 #include <gtest/gtest.h>
 
@@ -32,7 +32,7 @@ int operationsPerThread()
 
 enum : unsigned int { MIXED = 1, COUNT = 2, READ_ONLY = 3, MISSING = 4, OWN = 10 };
 
-// What everybody writes to MIXED: of all kinds, and of such lengths that a torn one equals none of them.
+// The values that all threads write to MIXED. Kinds and lengths differ, so that a torn value equals none of them.
 const std::vector<PropertyValue>& mixedValues()
 {
     static const std::vector<PropertyValue> values {
@@ -70,7 +70,7 @@ public:
             properties.insert({OWN + number, PropertyValue(Number(0u))});
     }
 
-    // Reads, adds one and writes, as one change.
+    // Adds 1 to COUNT; reading and writing are one change under the lock.
     void increment()
     {
         const Guard guard(mutex);
@@ -92,7 +92,7 @@ protected:
     };
 };
 
-// Every operation that can be overridden is, and calls back into the node while it holds the lock.
+// Overrides every virtual operation, and calls back into the node while it holds the lock.
 class CallingBack : public Provider {
 public:
     StatusType getStatus() const override
@@ -128,7 +128,7 @@ public:
         Error outcome = Node::setProperty(key, value);
         PropertyValue stored("");
         if (outcome.getStatus() == 0 && Node::getProperty(key, stored).getStatus() == 0 && stored != value)
-            return {"another thread came in between", 1};
+            return {"another thread changed the property under the lock", 1};
         return outcome;
     }
 
@@ -139,14 +139,14 @@ public:
     }
 };
 
-// What went wrong; each thread counts for itself.
+// How often something was wrong. Each thread has its own.
 struct Faults {
-    long torn = 0;
-    long outcomes = 0;
-    long backwards = 0;
+    long torn = 0;       // a value that no thread has written
+    long outcomes = 0;   // an unexpected status
+    long backwards = 0;  // a value older than one that was read before
 };
 
-// The records that the threads have written. The sink counts on the thread that writes.
+// How many records this thread has written: the sink runs on the thread that writes.
 thread_local long recordsWritten = 0;
 
 class SharedNodes : public testing::Test {
@@ -177,7 +177,7 @@ void write(Node& node, int number, int step, Faults& faults)
     }
 }
 
-// `seen` is what this thread has read of each writer's own property before: no writer goes back.
+// `seen` holds what this thread has last read of each writer's own property. Writers only count up.
 void read(const Node& node, std::array<unsigned int, threadCount>& seen, Faults& faults)
 {
     PropertyValue value("");
@@ -197,9 +197,9 @@ void read(const Node& node, std::array<unsigned int, threadCount>& seen, Faults&
 template <class Class>
 void workOnSharedNodes()
 {
-    constexpr int operationsAStep = 8;  // two to five of `write`, three of `read` or of `increment`
+    constexpr int operationsAStep = 8;  // about: 2 or 4 in `write`, 4 in `read`, and 2 increments
     const int steps = std::max(operationsPerThread() / operationsAStep, 10);
-    // On the heap: tools that look for races do not see a mutex on the stack go.
+    // On the heap, because race detectors do not notice the end of a mutex on the stack.
     const auto allNodes = std::make_unique<std::array<Class, 4>>();
     auto& nodes = *allNodes;
     std::array<Faults, threadCount> faults;
@@ -240,7 +240,7 @@ void workOnSharedNodes()
         EXPECT_EQ(its.torn, 0);
         EXPECT_EQ(its.outcomes, 0);
         EXPECT_EQ(its.backwards, 0);
-        // A log and a trace record for each request and for each refusal.
+        // A log record and a trace record for each request and for each refusal.
         EXPECT_EQ(records.at(static_cast<std::size_t>(number)), 2L * (4 * steps + 4 * (steps / 8)));
     }
 }
@@ -250,19 +250,19 @@ TEST_F(SharedNodes, LoseNoChangeAndTearNoValue)
     workOnSharedNodes<Provider>();
 }
 
-TEST_F(SharedNodes, LoseNoChangeAndTearNoValueWhereOverridesCallBack)
+TEST_F(SharedNodes, LoseNoChangeAndTearNoValueWhenOverridesCallBack)
 {
     workOnSharedNodes<CallingBack>();
 }
 
-// A node that goes with its last user.
+// A node that its last user destroys.
 class Shared {
 public:
     Shared() : node_(std::make_unique<CallingBack>()) { }
 
     Node& node() const { return *node_; }
 
-    // Whether this was the last user: then the node is gone.
+    // Ends one use. Returns whether it was the last: then the node is destroyed.
     bool release()
     {
         const std::lock_guard<std::mutex> lock(mutex_);
@@ -278,7 +278,7 @@ private:
     std::unique_ptr<CallingBack> node_;
 };
 
-TEST_F(SharedNodes, GoWithTheirLastUser)
+TEST_F(SharedNodes, CanBeDestroyedByTheirLastUser)
 {
     constexpr int operationsAVisit = 5;
     std::vector<Shared> nodes(
