@@ -1,7 +1,7 @@
 #pragma once
 
-// Says on standard output, by a line with its name, whether the library's names and categories are right when it is
-// made and when it goes.
+// Uses the library when it is constructed and when it is destroyed, and prints each time a line with its name and
+// whether the library's names and categories were right.
 class Check {
 public:
     explicit Check(const char* name);

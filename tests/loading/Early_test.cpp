@@ -1,4 +1,4 @@
-// The library's objects at namespace scope are ready before those of a program and go after them.
+// The library's objects at namespace scope are constructed before those of a program and destroyed after them.
 
 #include <gtest/gtest.h>
 
@@ -6,12 +6,12 @@
 #include <cstdlib>
 #include <string>
 
-#include "support/EveryCategory.h"
 #include "IC/Number.h"
+#include "support/EveryCategory.h"
 
 namespace {
 
-// What the library says and a name of its table.
+// The categories that the library writes, and a name of its table.
 std::string used()
 {
     return everyCategory() + std::string(IC::Number(IC::NodeRef {73, 1}));
@@ -24,7 +24,7 @@ struct Global {
     ~Global()
     {
         if (used() != everyCategoryExpected + std::string(lanEndPoint)) {
-            std::fputs("the library's objects were gone before the program's\n", stderr);
+            std::fputs("the library's objects were destroyed before the program's\n", stderr);
             std::_Exit(1);
         }
     }
@@ -36,12 +36,12 @@ struct Global {
 
 const Global global;
 
-TEST(Early, ObjectsOfTheProgramMayRefuseAndPrintBeforeMain)
+TEST(Early, GlobalObjectsCanUseTheLibraryBeforeMain)
 {
     EXPECT_EQ(global.seen, everyCategoryExpected + std::string(lanEndPoint));
 }
 
-TEST(Early, ObjectsOfTheProgramMayRefuseAndPrintAfterMain)
+TEST(Early, GlobalObjectsCanUseTheLibraryAfterMain)
 {
     EXPECT_EXIT(std::exit(0), testing::ExitedWithCode(0), "");
 }

@@ -1,4 +1,4 @@
-// A program that does not know the library loads a plug-in that does, uses it, and unloads it.
+// A program that is not linked with the library loads a plug-in that is, uses it, and unloads it.
 
 #include <dlfcn.h>
 #include <gmock/gmock.h>
@@ -18,7 +18,7 @@
 
 namespace {
 
-// The files that are mapped, and everything else that the system says of the program's memory.
+// The system's list of what is mapped into the process.
 std::string mapped()
 {
     std::ifstream maps("/proc/self/maps");
@@ -33,7 +33,7 @@ void expectUnmapped()
         EXPECT_THAT(all, testing::Not(testing::HasSubstr(name)));
 }
 
-// A thread that lives on when the library that it has used is gone.
+// A thread that outlives the library that it uses.
 class Worker {
 public:
     Worker() : thread_([this] { work(); }) { }
@@ -45,7 +45,7 @@ public:
     Worker(const Worker&) = delete;
     Worker& operator=(const Worker&) = delete;
 
-    // Waits until the thread has done it. Nothing ends the thread.
+    // Returns when the thread has run the task. An empty task ends the thread.
     void run(std::function<void()> task)
     {
         std::unique_lock<std::mutex> lock(mutex_);
@@ -89,7 +89,7 @@ void cycle(Worker& worker)
     expectUnmapped();
 }
 
-// The number of the next thread-specific key.
+// The number of the next thread-specific key: it grows if a key is never deleted.
 unsigned int nextKey()
 {
     pthread_key_t key = 0;
@@ -98,7 +98,7 @@ unsigned int nextKey()
     return key;
 }
 
-TEST(Unload, LeavesNothingMappedAndNothingBehindAThousandTimes)
+TEST(Unload, LeavesNothingMappedAndLeaksNothing)
 {
     Worker worker;
     for (int i = 0; i < 10; ++i)
@@ -111,7 +111,7 @@ TEST(Unload, LeavesNothingMappedAndNothingBehindAThousandTimes)
         ASSERT_NO_FATAL_FAILURE(cycle(worker));
         ASSERT_FALSE(HasFailure()) << "in cycle " << i;
     }
-    // Blocks are of slightly different sizes each time, and none is smaller than this.
+    // The sizes of blocks differ slightly from cycle to cycle. A block that leaks in each cycle has at least this size.
     constexpr std::size_t smallestBlock = 32;
     EXPECT_LT(heapInUse(), memory + static_cast<std::size_t>(cycles) * smallestBlock);
     EXPECT_EQ(nextKey(), key);

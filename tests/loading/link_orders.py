@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
-"""Links the objects of the library and of a program in many orders, runs each program, and fails where the library
-was not ready before the program's own objects or not there until they were gone."""
+"""Links the objects of the library and of a program in many orders and runs each program. Fails if the library's
+objects are not constructed before the program's or not destroyed after them."""
 
 import argparse
 import pathlib
@@ -16,7 +16,7 @@ def shuffled(objects, source):
 
 
 def order(number, client, library):
-    """The program first, the program last, and both mixed, in turn."""
+    """In turn: the program's objects first, the library's objects first, all objects shuffled."""
     source = random.Random(number)
     client, library = shuffled(client, source), shuffled(library, source)
     return [client + library, library + client, shuffled(client + library, source)][number % 3]

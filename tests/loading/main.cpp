@@ -2,12 +2,12 @@
 #include <string>
 
 #include "Check.h"
-#include "support/EveryCategory.h"
 #include "IC/Number.h"
+#include "support/EveryCategory.h"
 
 namespace {
 
-// What each source file writes, and names of the table.
+// The categories that the library writes, and names of its table.
 std::string seen()
 {
     std::size_t length = 0;

@@ -1,4 +1,4 @@
-// What a plug-in of the agent does with the library, as one function that says whether all of it went well.
+// Uses the library as a plug-in of the agent does. Its one function returns whether every result was right.
 
 #include <sstream>
 #include <stdexcept>
@@ -25,7 +25,7 @@ public:
 
 extern "C" [[gnu::visibility("default")]] bool useLibrary()
 {
-    // Threads may call this at the same time, so each looks at its own records.
+    // Each thread counts its own records, because several threads may call this function at the same time.
     thread_local int records = 0;
     records = 0;
     VXLog::setRecordSink([](const VXLog::Record&) { ++records; });
