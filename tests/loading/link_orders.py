@@ -8,7 +8,8 @@ import random
 import subprocess
 import sys
 
-EXPECTED = sorted(f"{name} {when}: right" for name in ("first", "second", "third", "main") for when in ("begins", "ends"))
+CHECKS = ("first", "second", "third", "main")
+EXPECTED = sorted(f"{name} {when}: right" for name in CHECKS for when in ("begins", "ends"))
 
 
 def shuffled(objects, source):
