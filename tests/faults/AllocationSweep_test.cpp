@@ -3,18 +3,18 @@
 
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
-#include "support/GroupingLocale.h"
 #include "Operations.h"
 #include "Sweep.h"
+#include "support/AllocationFailure.h"
+#include "support/GroupingLocale.h"
 
-// Every allocation of every operation fails in turn, the platform's own included: std::bad_alloc reaches the caller
-// and everything is as it was, or all goes as if nothing had failed. What an exception itself is thrown in does not
-// count: the compiler's runtime takes it from a store of its own where memory runs out.
+// Every allocation of every operation fails in turn, those of the platform included. Either std::bad_alloc reaches the
+// caller and everything is as before, or the operation succeeds as if nothing had failed. The memory of the exception
+// objects does not count: if malloc fails, the C++ runtime takes it from its emergency pool.
 
 namespace {
 
-// Under a locale of its own a try begins with empty caches of digits, which need memory too.
+// A new locale starts with empty caches for digits, and filling these caches allocates too.
 Operation withDigitsGrouped(const Operation& operation)
 {
     return {operation.name + ", digits grouped",
@@ -25,7 +25,7 @@ Operation withDigitsGrouped(const Operation& operation)
             true};
 }
 
-// Fails the first allocation, then the second, until there are no more. How many there were.
+// Makes the first allocation fail, then the second, until there are no more. Returns how many there were.
 long sweep(const Operation& operation, bool once)
 {
     const Outcome undisturbed = operation.run(noFault());
@@ -51,12 +51,12 @@ void sweepAll(bool once)
     EXPECT_GE(points, 15000);
 }
 
-TEST(AllocationSweep, OneAllocationFails)
+TEST(AllocationSweep, EveryAllocationMayFailOnce)
 {
     sweepAll(true);
 }
 
-TEST(AllocationSweep, AnAllocationAndAllAfterItFail)
+TEST(AllocationSweep, EveryAllocationAndAllAfterItMayFail)
 {
     sweepAll(false);
 }

@@ -14,13 +14,13 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "support/SensorNames.h"
 #include "Trial.h"
 #include "ZQ/DateTime.h"
 #include "observe/Refusal.h"
+#include "support/SensorNames.h"
 
-// Every operation that takes a code, with every code of one byte, and with the codes of 32 bits up to 65535 and on
-// both sides of each power of two. Where two operations share the check, one of them does with fewer.
+// Tries every operation that takes a code. Codes of one byte: all. Codes of 32 bits: all up to 65535, and the values
+// around each power of two; fewer for an operation whose check another operation shares.
 
 namespace {
 
@@ -44,7 +44,7 @@ std::set<unsigned int> byteCodes()
     return codes;
 }
 
-// Those of a byte, and both sides of each power of two.
+// All codes of one byte, and each power of two with its neighbours.
 std::set<unsigned int> fewWordCodes()
 {
     std::set<unsigned int> codes = byteCodes();
@@ -64,7 +64,8 @@ std::set<unsigned int> wordCodes()
     return codes;
 }
 
-// How a try ends, as Outcome has it, what it leaves behind, and where the refusal is logged, with which text.
+// How a try has to end and what has to be afterwards (see Outcome); for a refusal, the function and the text of its
+// records.
 struct Expected {
     std::string ended;
     std::string after = "nothing";
@@ -74,7 +75,7 @@ struct Expected {
 
 struct Row {
     const char* name;
-    const char* file;  // that its records name
+    const char* file;  // the name in its records
     std::set<unsigned int> (*codes)();
     std::function<Operation(unsigned int)> operation;
     std::function<Expected(unsigned int)> expected;
@@ -85,7 +86,7 @@ void PrintTo(const Row& row, std::ostream* out)
     *out << row.name;
 }
 
-// A number of each kind that a code makes; null where the code is refused. The time of day is replaced by 0.
+// The number that a kind code makes, or null if the code is refused. For a date-time the current time is replaced by 0.
 const char* firstNumber(unsigned int kind)
 {
     const char* const texts[] = {
@@ -99,7 +100,7 @@ Number withoutTimeOfDay(const Number& number)
     return number.getKind() == Number::KIND_DATETIME ? Number(0L, 0) : number;
 }
 
-// The same for property values.
+// The property value that a kind code makes, or null if the code is refused.
 const char* firstProperty(unsigned int kind)
 {
     const char* const texts[] = {"0 writable: unknown", "1 writable: unknown", "2 writable: ",
@@ -129,7 +130,7 @@ Expected numberAfterInitKind(unsigned int code)
 
 Expected numberAfterSetKind(unsigned int code)
 {
-    // A date-time has its seconds where the number was, in as many bytes as long has.
+    // The new kind reads the bytes of 7u, a date-time reads a long. A node reference has storage of its own.
     const char* const ofLittleEndian[] = {"0: unknown",
                                           "1: true",
                                           "2: 7",
@@ -193,7 +194,7 @@ std::function<Expected(unsigned int)> errorWith(const std::string& content)
     };
 }
 
-// An alert shows the code between the texts before and after it.
+// An alert whose text has the code between `before` and `after`.
 std::function<Expected(unsigned int)> alertWith(const std::string& before, unsigned int largest,
                                                 const std::string& after, const std::string& what,
                                                 const std::string& subject)
@@ -334,7 +335,7 @@ std::vector<Row> rows()
     };
 }
 
-// Whether these are the log record and the trace record of the refusal, or none where nothing is refused.
+// Whether the records are the log record and the trace record of the refusal, or none if nothing is refused.
 bool areOf(const Expected& expected, const std::string& file, const std::vector<observe::Record>& records)
 {
     if (expected.logged.empty() || records.size() != 2)
@@ -351,7 +352,7 @@ bool areOf(const Expected& expected, const std::string& file, const std::vector<
 
 class EveryCode : public testing::TestWithParam<Row> { };
 
-TEST_P(EveryCode, IsTakenOrRefusedAsStated)
+TEST_P(EveryCode, IsAcceptedOrRefusedAsExpected)
 {
     const Row& row = GetParam();
     for (const unsigned int code : row.codes()) {
@@ -360,14 +361,14 @@ TEST_P(EveryCode, IsTakenOrRefusedAsStated)
         EXPECT_EQ(tried.ended, expected.ended) << row.name << " with " << code;
         EXPECT_EQ(tried.after, expected.after) << row.name << " with " << code;
         EXPECT_TRUE(areOf(expected, row.file, tried.records))
-            << row.name << " with " << code << "\n  wanted: " << expected.function << ": " << expected.logged
-            << "\n  records:" << listed(tried.records);
+            << row.name << " with " << code << "\n  expected: " << expected.function << ": "
+            << expected.logged << "\n  records:" << listed(tried.records);
         if (HasFailure())
             return;
     }
 }
 
-TEST(Codes, AreAllThere)
+TEST(Codes, AreComplete)
 {
     EXPECT_EQ(byteCodes().size(), 256u);
     EXPECT_EQ(wordCodes().size(), 65536u + 2 + 15 * 3 + 1);

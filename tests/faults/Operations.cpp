@@ -13,8 +13,8 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "support/PropertySamples.h"
 #include "ZQ/DateTime.h"
+#include "support/PropertySamples.h"
 
 namespace {
 
@@ -45,7 +45,7 @@ struct Named {
     T value;
 };
 
-// One number of each kind, in the order of the codes, and the one that a refused initKind leaves behind.
+// One number of each kind, in the order of the kind codes, and one with the code that a refused initKind stores.
 std::vector<Named<Number>> numbers()
 {
     Number invalid(1u);
@@ -67,8 +67,8 @@ std::vector<Named<Number>> numbers()
             {"invalid", invalid}};
 }
 
-// One property value of each kind, in the order of the codes; those that write records of their own when they
-// are printed; and those that a refused setKind leaves without an object.
+// One property value of each kind, in the order of the kind codes; some that write records when they are printed; and
+// some without an object, as a refused setKind leaves them.
 std::vector<Named<PropertyValue>> properties(std::vector<PropertyValue> ofEachKind)
 {
     std::vector<Named<PropertyValue>> all;
@@ -76,7 +76,7 @@ std::vector<Named<PropertyValue>> properties(std::vector<PropertyValue> ofEachKi
     for (const char* const name : names)
         all.push_back({name, ofEachKind[all.size()]});
     all.push_back({"date", PropertyValue(Number(1234567890L, 123), true)});
-    // Its strings have to grow, one after another, when longer ones are assigned.
+    // Assigning longer strings makes each of these grow.
     all.push_back({"short texts", IC::StringArray {"a", "b", "c", "d"}});
     all.push_back({"dates", IC::NumberArray {Number(1234567890L, 123), Number(1L, 7), Number(5.25)}});
     for (const char* const name : {"text", "numbers"}) {
@@ -102,7 +102,7 @@ auto given(const A& a, const B& b)
     return [a, b] { return std::make_pair(a, b); };
 }
 
-// What every value can do.
+// What every value supports.
 template <class T>
 void addValue(Operations& all, const std::string& name, const T& value)
 {
@@ -114,6 +114,23 @@ void addValue(Operations& all, const std::string& name, const T& value)
     }));
 }
 
+// Inserts into a stream that throws if the insertion fails.
+const auto toThrowingStream = [](const auto& value) {
+    std::ostringstream out;
+    out.exceptions(std::ios_base::badbit | std::ios_base::failbit);
+    out << value;
+    return out.str();
+};
+
+// Inserts into a stream that turns bad if the insertion fails, and throws then, as the sweeps expect.
+const auto toStream = [](const auto& value) {
+    std::ostringstream out;
+    out << value;
+    if (!out)
+        throw std::bad_alloc();
+    return out.str();
+};
+
 template <class T>
 void addText(Operations& all, const std::string& name, const T& value)
 {
@@ -123,19 +140,8 @@ void addText(Operations& all, const std::string& name, const T& value)
     };
     if constexpr (std::is_convertible_v<T, std::string>)
         add(on("text of " + name, given(value), [](const T& v) { return v.operator std::string(); }));
-    add(on(name + " to a stream that throws", given(value), [](const T& v) {
-        std::ostringstream out;
-        out.exceptions(std::ios_base::badbit | std::ios_base::failbit);
-        out << v;
-        return out.str();
-    }));
-    add(on(name + " to a stream that turns bad", given(value), [](const T& v) {
-        std::ostringstream out;
-        out << v;
-        if (!out)
-            throw std::bad_alloc();  // so the caller is told
-        return out.str();
-    }));
+    add(on(name + " to a stream that throws", given(value), toThrowingStream));
+    add(on(name + " to a stream that turns bad", given(value), toStream));
 }
 
 template <class T>
@@ -144,7 +150,7 @@ void addAssignment(Operations& all, const std::string& from, const T& source, co
 {
     all.push_back(on(to + " = " + from, given(target, source), [](auto& two) { two.first = two.second; }));
     all.push_back(on(to + " = moved " + from, given(target, source), [](auto& two) {
-        T moving(two.second);  // may fail, the assignment may not
+        T moving(two.second);  // may throw; the assignment does not
         two.first = std::move(moving);
     }));
 }
@@ -166,7 +172,7 @@ void addConversion(Operations& all, const std::string& name, const T& value, con
     all.push_back(on(name + " to " + to, given(value), [](const T& v) { return v.operator To(); }));
 }
 
-// Construction from a native type, and assignment from it to a value that has another content.
+// Construction from a native type, and assignment from it to a value with other content.
 template <class T, class Native>
 void addNative(Operations& all, const std::string& name, const T& old, const Native& native)
 {
@@ -197,7 +203,7 @@ void addNumbers(Operations& all)
         all.push_back(on("initKind" + name, given(old), [kind](Number& n) { n.initKind(kind); }));
         all.push_back(on("setKind" + name, given(old), [code](Number& n) { n.setKind(byte(code)); }));
     }
-    // The time of day is no result to compare.
+    // Without the content, which is the current time.
     all.push_back(on("Number(9)", [] { return Number(byte(9)).getKind(); }));
     all.push_back(on("initKind(9)", [old] {
         Number now(old);
@@ -455,19 +461,8 @@ void addNodes(Operations& all)
     all.push_back(on("getParent of a node", node, [](SampleNode& n) { return n.getParent(); }));
     all.push_back(on("hexstring of a node", node, [](SampleNode& n) { return n.hexstring(longText); }));
     all.push_back(on("text of a node", node, [](SampleNode& n) { return n.operator std::string(); }));
-    all.push_back(on("a node to a stream that throws", node, [](SampleNode& n) {
-        std::ostringstream out;
-        out.exceptions(std::ios_base::badbit);
-        out << n;
-        return out.str();
-    }));
-    all.push_back(on("a node to a stream that turns bad", node, [](SampleNode& n) {
-        std::ostringstream out;
-        out << n;
-        if (!out)
-            throw std::bad_alloc();  // so the caller is told
-        return out.str();
-    }));
+    all.push_back(on("a node to a stream that throws", node, toThrowingStream));
+    all.push_back(on("a node to a stream that turns bad", node, toStream));
 
     const auto two = [] {
         return TwoNodes {SampleNode(PropertyValue(longText), "/a"),

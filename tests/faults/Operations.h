@@ -4,5 +4,5 @@
 
 #include "Trial.h"
 
-// Every public operation, on values of every kind and with codes that are refused.
+// Every public operation, on values of every kind, and with codes that are refused.
 std::vector<Operation> operations();

@@ -6,8 +6,8 @@
 #include "Operations.h"
 #include "Sweep.h"
 
-// Every call of the platform in every operation throws in turn: that very exception reaches the caller, what the
-// operation had begun is undone, and the platform is left balanced.
+// Every call of the platform in every operation throws in turn: that same exception reaches the caller, everything is
+// as before, and no lock stays held and no buffer or date-time alive.
 
 namespace {
 
@@ -24,7 +24,7 @@ const struct {
              {"making or changing of a date-time", observe::Call::dateTime},
              {"lock", observe::Call::lock}};
 
-// Lets the first call throw, then the second, until there are no more. How many there were.
+// Makes the first call throw, then the second, until there are no more. Returns how many there were.
 long sweep(const Operation& operation, const Outcome& undisturbed, observe::Call call,
            const std::string& name)
 {
@@ -43,7 +43,7 @@ long sweep(const Operation& operation, const Outcome& undisturbed, observe::Call
     }
 }
 
-TEST(PlatformSweep, EveryCallThrows)
+TEST(PlatformSweep, EveryCallMayThrow)
 {
     const auto all = operations();
     long points = 0;
@@ -58,7 +58,7 @@ TEST(PlatformSweep, EveryCallThrows)
     EXPECT_GE(points, 11000);
 }
 
-TEST(PlatformSweep, NobodyAsksWhetherTheLockWasObtained)
+TEST(PlatformSweep, ResultOfLockIsIgnored)
 {
     long locks = 0;
     for (const Operation& operation : operations()) {

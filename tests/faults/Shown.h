@@ -17,10 +17,10 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "support/PropertySamples.h"
 #include "ZQ/DateTime.h"
+#include "support/PropertySamples.h"
 
-// A node with everything filled in, whose members everybody may see.
+// A node with a value in every member, and all members public.
 class SampleNode : public IC::Node {
 public:
     explicit SampleNode(const IC::PropertyValue& first,
@@ -43,7 +43,7 @@ public:
     using Node::status;
 };
 
-// Whatever an operation works on.
+// Subjects of operations.
 struct Nothing { };
 struct NodeAndValue {
     SampleNode node;
@@ -54,7 +54,7 @@ struct TwoNodes {
     SampleNode b;
 };
 
-// All that can be seen of a value, as text.
+// shown: everything that can be observed of a value, as text.
 template <class T, std::enable_if_t<std::is_arithmetic_v<T> || std::is_enum_v<T>, int> = 0>
 std::string shown(T value)
 {
@@ -201,7 +201,7 @@ std::string shown(const std::unique_ptr<T>& object)
     return shown(*object);
 }
 
-// The mutex of the node in a subject, where there is one.
+// The mutex of the node in a subject, or null if it has none.
 template <class Subject>
 ZQ::Mutex* mutexOf(Subject&)
 {

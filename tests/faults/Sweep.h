@@ -4,13 +4,14 @@
 
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
 #include "Trial.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
 
-// Tries the operation with the fault and adds a failure, which names `where`, for anything that is wrong then.
-// Right is what wrongAfterFault says, or, if `mayGoOn`, that all went as undisturbed. Whether the fault was reached
-// and all was right: the next fault is worth a try.
+// Tries the operation with the fault. Expects `exception` and no change, as wrongAfterFault describes, or the same
+// outcome as without the fault, if `mayGoOn` or the fault is not reached. Also expects that nothing stays allocated,
+// alive or locked. Failures name `where`. Returns whether the fault was reached and all was right: then the next fault
+// is to be tried.
 inline bool tryWith(const Fault& fault, const std::string& exception, bool mayGoOn,
                     const Operation& operation, const Outcome& undisturbed, const std::string& where)
 {
@@ -30,7 +31,7 @@ inline bool tryWith(const Fault& fault, const std::string& exception, bool mayGo
     const long aliveAfter = allocation::aliveNow;
     EXPECT_EQ(wrong, "") << where;
     if (!wrong.empty())
-        return false;  // and its text is alive
+        return false;  // `wrong` itself is an allocation that is alive
     EXPECT_EQ(aliveAfter, alive) << "allocations alive: " << where;
     EXPECT_EQ(observe::dateTimesAlive(), dateTimes) << where;
     EXPECT_EQ(observe::buffersAlive(), buffers) << where;

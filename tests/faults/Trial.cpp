@@ -47,8 +47,8 @@ std::string endOf(const std::function<std::string()>& act)
     }
 }
 
-// By pthread: std::thread frees in one thread what it allocates in another, and allocations are counted by
-// thread.
+// Uses pthread, because std::thread frees in one thread what it allocates in another, and the allocations are counted
+// for each thread.
 bool isFree(ZQ::Mutex& mutex)
 {
     struct Attempt {
@@ -100,27 +100,27 @@ std::string listed(const std::vector<observe::Record>& records)
 std::string difference(const Outcome& tried, const Outcome& undisturbed)
 {
     if (tried.lockIsHeld)
-        return "another thread does not get the lock";
+        return "another thread cannot acquire the lock";
     if (tried.ended != undisturbed.ended)
-        return tried.ended + "\n  undisturbed: " + undisturbed.ended;
+        return tried.ended + "\n  without the fault: " + undisturbed.ended;
     if (tried.after != undisturbed.after)
-        return "left behind " + tried.after + "\n  undisturbed: " + undisturbed.after;
+        return "afterwards " + tried.after + "\n  without the fault: " + undisturbed.after;
     if (tried.records.size() != undisturbed.records.size() || !beginWith(undisturbed.records, tried.records))
-        return "records:" + listed(tried.records) + "\n  undisturbed:" + listed(undisturbed.records);
+        return "records:" + listed(tried.records) + "\n  without the fault:" + listed(undisturbed.records);
     return {};
 }
 
 std::string wrongAfterFault(const Outcome& tried, const Outcome& undisturbed, const std::string& exception)
 {
     if (tried.lockIsHeld)
-        return "another thread does not get the lock";
+        return "another thread cannot acquire the lock";
     if (tried.ended != exception)
-        return tried.ended + "\n  wanted: " + exception + "\n  undisturbed: " + undisturbed.ended;
+        return tried.ended + "\n  expected: " + exception + "\n  without the fault: " + undisturbed.ended;
     const bool refused = undisturbed.ended.rfind("returned", 0) != 0;
     if (tried.after != tried.before && !(refused && tried.after == undisturbed.after))
-        return "left behind " + tried.after + "\n  before: " + tried.before
-            + "\n  undisturbed: " + undisturbed.after;
+        return "afterwards " + tried.after + "\n  before: " + tried.before
+            + "\n  without the fault: " + undisturbed.after;
     if (!beginWith(undisturbed.records, tried.records))
-        return "records:" + listed(tried.records) + "\n  undisturbed:" + listed(undisturbed.records);
+        return "records:" + listed(tried.records) + "\n  without the fault:" + listed(undisturbed.records);
     return {};
 }

@@ -9,19 +9,19 @@
 #include "Shown.h"
 #include "observe/Platform.h"
 
-// One try of an operation while something fails, and what is right afterwards.
+// One try of an operation while something fails, and what has to be true afterwards.
 
 // How a try went.
 struct Outcome {
-    std::string before;  // what the operation was tried on
+    std::string before;  // the subject of the operation before it
     std::string ended;   // "returned" and the result, or the exception
-    std::string after;   // what it was tried on, afterwards
+    std::string after;   // the subject after it
     std::vector<observe::Record> records;
     bool struck = false;      // the fault was reached
-    bool lockIsHeld = false;  // another thread does not get the lock
+    bool lockIsHeld = false;  // another thread cannot acquire the node's lock
 };
 
-// Something that fails between `begin` and `end`, which says whether it was reached.
+// Something that fails between `begin` and `end`. `end` returns whether it was reached.
 struct Fault {
     std::function<void()> begin;
     std::function<bool()> end;
@@ -32,26 +32,27 @@ const Fault& noFault();
 struct Operation {
     std::string name;
     std::function<Outcome(const Fault&)> run;
-    bool writesText = false;  // for which the global locale counts
+    bool writesText = false;  // the global locale affects it
 };
 
-// What is wrong with a try in which the fault was reached; empty where nothing is. Right is that `exception`
-// reached the caller, with all else as it was or, where the operation refuses anyhow, as that leaves it.
+// Says what is wrong with a try in which the fault was reached, or nothing. Right is: `exception` reached the caller,
+// the subject is as before (or as a refusal leaves it, if the operation refuses without the fault too), and the records
+// are the first of those that the operation writes without the fault.
 std::string wrongAfterFault(const Outcome& tried, const Outcome& undisturbed, const std::string& exception);
 
-// What went otherwise than undisturbed; empty where nothing did.
+// Says how the try differs from the one without a fault, or nothing.
 std::string difference(const Outcome& tried, const Outcome& undisturbed);
 
-// What `act` returns, or the type of the exception that left it and what that says.
+// Returns what `act` returns, or the type and the text of the exception that it throws.
 std::string endOf(const std::function<std::string()>& act);
 
 // The records, a line each.
 std::string listed(const std::vector<observe::Record>& records);
 
-// Whether another thread obtains the mutex; the one that holds it always does.
+// Whether another thread can acquire the mutex. (The thread that holds it always can.)
 bool isFree(ZQ::Mutex& mutex);
 
-// The time in which the fault is there. Takes down what was recorded in it.
+// Begins the fault, and ends it at the latest when it is destroyed. Stores whether it was reached, and the records.
 class Exposure {
 public:
     Exposure(const Fault& fault, Outcome& outcome) : fault_(fault), outcome_(outcome) { fault_.begin(); }
@@ -74,7 +75,7 @@ private:
     bool ended_ = false;
 };
 
-// An operation that does `act` on what `prepare` makes; nothing fails but in `act`.
+// An operation that runs `act` on the subject that `prepare` makes. The fault exists during `act` only.
 template <class Prepare, class Act>
 Operation on(std::string name, Prepare prepare, Act act)
 {
