@@ -16,11 +16,11 @@
 #include "Outcome.h"
 #include "PropertyValue.h"
 
-// Does with a value of the library what the model does with its own, and says where the two differ: an empty text
-// where they agree in value, exception and records.
+// Runs operations on a value of the library and on the model's, and describes the difference in value, exception and
+// records. An empty text means that they agree.
 namespace agreement {
 
-// A call of the logger. `plain`: the three arguments that say nothing are null, 0 and 0.
+// A call of the logger. `plain` means that `data`, `a` and `b` are null, 0 and 0, as in every record of the library.
 struct LoggerCall {
     bool trace;
     int line;
@@ -28,11 +28,11 @@ struct LoggerCall {
     model::Record record;
 };
 
-// What the platform that the program is linked with was told since the last call, which forgets it
-// (ObservedRecords.cpp, StandInRecords.cpp).
+// Returns the calls of the logger since the last call of this function. Defined for the test kit in
+// ObservedRecords.cpp and for the stand-in in StandInRecords.cpp; a program is linked with one of them.
 std::vector<LoggerCall> takeLoggerCalls();
 
-// Each log record with the trace record after it; anything else becomes a record that no model expects.
+// Combines each log record with the trace record after it. Anything else becomes a record that the model never expects.
 inline std::vector<model::Record> inPairs(std::vector<LoggerCall> calls)
 {
     std::vector<model::Record> records;
@@ -47,7 +47,7 @@ inline std::vector<model::Record> inPairs(std::vector<LoggerCall> calls)
     return records;
 }
 
-// The library's values as the model has them.
+// Converts the library's values to those of the model.
 template <class T>
 const T& asModel(const T& value)
 {
@@ -70,7 +70,7 @@ inline unsigned int asModel(const IC::EnumValue& value)
     return value;
 }
 
-// How the operation of the library ended.
+// Runs the library's operation and returns how it ended.
 template <class Operation>
 auto outcomeOf(Operation operation)
 {
@@ -173,13 +173,13 @@ bool same(const T& a, const T& b)
 {
     return a == b;
 }
-// Bit by bit: NaNs and the sign of a zero count.
+// Compares the bits, so that NaNs and the signs of zeros have to agree too.
 inline bool same(double a, double b)
 {
     return std::memcmp(&a, &b, sizeof a) == 0;
 }
 
-// Empty, or what the operation should have done and what it did.
+// Returns what the operation should have done and what it did, or an empty text if both are the same.
 template <class T>
 std::string difference(const char* operation, const model::Outcome<T>& expected,
                        const model::Outcome<T>& actual)
@@ -189,7 +189,7 @@ std::string difference(const char* operation, const model::Outcome<T>& expected,
     if (values && expected.exception == actual.exception && expected.sentence == actual.sentence
         && expected.records == actual.records)
         return {};
-    return std::string(operation) + ": expected " + shown(expected) + ", came " + shown(actual);
+    return std::string(operation) + ": expected " + shown(expected) + ", but was " + shown(actual);
 }
 
 // The conversions of a number; the text is one of them.
@@ -229,7 +229,7 @@ inline std::string differenceInConversion(const IC::Number& number, const model:
     }
 }
 
-// Whether the two are the same number: kind, content and node reference, looked at without any refusal.
+// Compares kind, content and node reference. Reads the content as KIND_UINT64 and KIND_NODEREF, which are not refused.
 inline std::string differenceInContent(const IC::Number& number, const model::Number& expected)
 {
     if (number.getKind() != expected.kind)
@@ -278,7 +278,8 @@ enum PropertyTarget {
 };
 constexpr unsigned int propertyTargets = 11;
 
-// For what the model does not compare itself: the outcome without its value, and the value beside it.
+// For results that have no operator== in the model, numbers and arrays of numbers: compares how the operation ended,
+// then the content of its result.
 template <class Value, class Expected, class Operation>
 std::string differenceInNumbers(const char* name, const model::Outcome<Expected>& expected,
                                 Operation operation)
@@ -286,7 +287,7 @@ std::string differenceInNumbers(const char* name, const model::Outcome<Expected>
     std::string inContent;
     const auto actual = outcomeOf([&] {
         const Value value = operation();
-        inContent = expected.value ? differenceInContent(value, *expected.value) : "not refused";
+        inContent = expected.value ? differenceInContent(value, *expected.value) : "was not refused";
         return model::Nothing();
     });
     model::Outcome<model::Nothing> ending;
@@ -339,24 +340,24 @@ inline std::string differenceInConversion(const IC::PropertyValue& value,
     }
 }
 
-// Kind, mark and content.
+// Compares the kind, the read-only mark and the content.
 inline std::string differenceInContent(const IC::PropertyValue& value, const model::PropertyValue& expected)
 {
-    // The conversion that gives the content back whole, by kind.
+    // For each kind, the conversion that returns the whole content.
     constexpr PropertyTarget content[model::propertyKinds] = {
         PROPERTY_TEXT,       PROPERTY_NUMBER,       PROPERTY_TEXT,      PROPERTY_BUFFER,
         PROPERTY_ENUM_VALUE, PROPERTY_NUMBER_ARRAY, PROPERTY_TEXT_ARRAY};
     if (value.getKind() != expected.kind)
         return "kind " + std::to_string(value.getKind()) + " instead of " + std::to_string(expected.kind);
     if (value.readOnly() != expected.readOnly)
-        return "read-only: " + shown(value.readOnly());
+        return "read-only is " + shown(value.readOnly()) + " instead of " + shown(expected.readOnly);
     return differenceInConversion(value, expected, expected.empty ? PROPERTY_TEXT : content[expected.kind]);
 }
 
 enum Comparison { EQUAL, UNEQUAL, LESS, LESS_OR_EQUAL, GREATER, GREATER_OR_EQUAL };
 constexpr unsigned int comparisons = 6;
 
-// Of two numbers, or of two property values.
+// Compares two numbers, or two property values.
 template <class Value, class Expected>
 std::string differenceInComparison(const Value& a, const Value& b, const Expected& expectedA,
                                    const Expected& expectedB, unsigned int comparison)

@@ -1,4 +1,4 @@
-// The library against a second, simple model of the same rules.
+// Compares the library with a second, simple implementation of the same rules.
 
 #include <gtest/gtest.h>
 
@@ -19,7 +19,7 @@ using agreement::pairOf;
 using agreement::pairOfKind;
 using agreement::ValuePair;
 
-// In unsigned arithmetic, which goes round at the limits.
+// Adds the value and its neighbours. Unsigned arithmetic wraps around at the limits.
 template <class T>
 void addAround(std::vector<T>& values, T value)
 {
@@ -29,7 +29,7 @@ void addAround(std::vector<T>& values, T value)
             values.push_back(neighbour);
 }
 
-// Zero, the limits and all powers of two, each with its neighbours.
+// Zero, the limits and all powers of two, with their neighbours.
 template <class T>
 std::vector<T> boundaryIntegers()
 {
@@ -51,7 +51,7 @@ std::vector<int> boundaryInts()
     return values;
 }
 
-// Each as it is and negated.
+// Each value and its negation.
 std::vector<double> boundaryReals()
 {
     using Limits = std::numeric_limits<double>;
@@ -105,7 +105,7 @@ std::vector<NumberPair> boundaryNumbers()
     return numbers;
 }
 
-// A few of each kind, and what setKind and a refused initKind leave behind.
+// A few numbers of each kind, and some as setKind and a refused initKind leave them.
 std::vector<NumberPair> fewNumbers()
 {
     using Limits = std::numeric_limits<double>;
@@ -202,7 +202,7 @@ void expectConversionsAgree(const NumberPair& pair)
 {
     for (unsigned int target = 0; target < agreement::targets; ++target)
         EXPECT_EQ(agreement::differenceInConversion(pair.actual, pair.expected, target), "")
-            << "of the number " << *model::textOf(pair.expected).value << " of kind " << pair.expected.kind;
+            << "the number " << *model::textOf(pair.expected).value << " of kind " << pair.expected.kind;
     EXPECT_EQ(agreement::differenceInContent(pair.actual, pair.expected), "");
 }
 
@@ -210,7 +210,7 @@ void expectConversionsAgree(const ValuePair& pair)
 {
     for (unsigned int target = 0; target < agreement::propertyTargets; ++target)
         EXPECT_EQ(agreement::differenceInConversion(pair.actual, pair.expected, target), "")
-            << "of the value " << *model::textOf(pair.expected).value << " of kind " << pair.expected.kind;
+            << "the value " << *model::textOf(pair.expected).value << " of kind " << pair.expected.kind;
     EXPECT_EQ(agreement::differenceInContent(pair.actual, pair.expected), "");
 }
 
@@ -220,8 +220,20 @@ void expectComparisonsAgree(const Pair& a, const Pair& b)
     for (unsigned int comparison = 0; comparison < agreement::comparisons; ++comparison)
         EXPECT_EQ(agreement::differenceInComparison(a.actual, b.actual, a.expected, b.expected, comparison),
                   "")
-            << *model::textOf(a.expected).value << " of kind " << a.expected.kind << " beside "
+            << *model::textOf(a.expected).value << " of kind " << a.expected.kind << " and "
             << *model::textOf(b.expected).value << " of kind " << b.expected.kind;
+}
+
+// Changes the kind of both values of the pair, and expects them to stay alike.
+template <class Pair>
+void expectSetKindAgrees(Pair& pair, unsigned char code)
+{
+    EXPECT_EQ(agreement::difference("setKind", model::setKind(pair.expected, code), agreement::outcomeOf([&] {
+                                        pair.actual.setKind(code);
+                                        return model::Nothing();
+                                    })),
+              "");
+    EXPECT_EQ(agreement::differenceInContent(pair.actual, pair.expected), "");
 }
 
 TEST(ModelOfNumber, ConvertsEveryKindToEveryTypeAtTheBoundaries)
@@ -239,12 +251,12 @@ TEST(ModelOfNumber, ReadsTheStorageOfEveryKindAsEveryOther)
             NumberPair read = pair;
             read.actual.setKind(kind);
             ASSERT_TRUE(model::setKind(read.expected, kind).value);
-            SCOPED_TRACE("made of kind " + std::to_string(pair.expected.kind));
+            SCOPED_TRACE("constructed with the kind " + std::to_string(pair.expected.kind));
             expectConversionsAgree(read);
         }
 }
 
-TEST(ModelOfNumber, GivesEveryVersionAsRealTextAndVersion)
+TEST(ModelOfNumber, ConvertsEveryVersionToRealTextAndVersion)
 {
     for (unsigned int version = 0; version < 65536; ++version) {
         const NumberPair pair = pairOf(IC::Version2 {static_cast<unsigned char>(version / 256),
@@ -254,7 +266,7 @@ TEST(ModelOfNumber, GivesEveryVersionAsRealTextAndVersion)
     }
 }
 
-TEST(ModelOfNumber, GivesEveryMillisecondAsDateTimeAndText)
+TEST(ModelOfNumber, ConvertsEveryMillisecondToDateTimeAndText)
 {
     for (unsigned int milliseconds = 0; milliseconds < 65536; ++milliseconds) {
         const NumberPair pair = pairOf(1234567890L, static_cast<unsigned short>(milliseconds));
@@ -281,7 +293,7 @@ TEST(ModelOfNumber, ComparesNeighboursAtTheBoundaries)
         }
 }
 
-// The number that came out, and how.
+// Compares the number that the operation makes, or its refusal.
 template <class Operation>
 void expectMadeAlike(const char* name, const model::Outcome<model::Number>& expected, Operation make)
 {
@@ -305,7 +317,7 @@ TEST(ModelOfNumber, MakesOrRefusesEveryKindCode)
     }
 }
 
-TEST(ModelOfNumber, MakesTheKindOfDateTimesFromTheCurrentTime)
+TEST(ModelOfNumber, StartsTheKindOfDateTimesAtTheCurrentTime)
 {
     const std::time_t before = std::time(nullptr);
     const IC::Number number(IC::Number::KIND_DATETIME);
@@ -323,14 +335,7 @@ TEST(ModelOfNumber, ChangesTheKindOfEveryNumber)
             SCOPED_TRACE("the number " + *model::textOf(pair.expected).value + ", the code "
                          + std::to_string(code));
             NumberPair set = pair;
-            EXPECT_EQ(agreement::difference("setKind",
-                                            model::setKind(set.expected, static_cast<unsigned char>(code)),
-                                            agreement::outcomeOf([&] {
-                                                set.actual.setKind(static_cast<unsigned char>(code));
-                                                return model::Nothing();
-                                            })),
-                      "");
-            EXPECT_EQ(agreement::differenceInContent(set.actual, set.expected), "");
+            expectSetKindAgrees(set, static_cast<unsigned char>(code));
             if (code == model::DATE_TIME)
                 continue;
             NumberPair begun = pair;
@@ -414,14 +419,7 @@ TEST(ModelOfPropertyValue, ChangesTheKindOfEveryValue)
         for (unsigned int code = 0; code < 256; ++code) {
             SCOPED_TRACE("kind " + std::to_string(pair.expected.kind) + ", the code " + std::to_string(code));
             ValuePair set = pair;
-            EXPECT_EQ(agreement::difference("setKind",
-                                            model::setKind(set.expected, static_cast<unsigned char>(code)),
-                                            agreement::outcomeOf([&] {
-                                                set.actual.setKind(static_cast<unsigned char>(code));
-                                                return model::Nothing();
-                                            })),
-                      "");
-            EXPECT_EQ(agreement::differenceInContent(set.actual, set.expected), "");
+            expectSetKindAgrees(set, static_cast<unsigned char>(code));
             if (set.expected.empty && (code == 7 || code == 255))
                 expectConversionsAgree(set);
         }

@@ -8,8 +8,8 @@
 #include <utility>
 
 #include "Outcome.h"
-#include "support/SensorNames.h"
 #include "ZQ/DateTime.h"
+#include "support/SensorNames.h"
 
 namespace model {
 
@@ -59,13 +59,13 @@ inline bool operator==(const NodeReference& a, const NodeReference& b)
     return a.type == b.type && a.id == b.id;
 }
 
-// The kind, the storage that all kinds but the node reference share, and the node reference beside it.
+// The kind, the storage that all kinds except the node reference share, and the node reference.
 struct Number {
     unsigned int kind = UNKNOWN;
     std::array<unsigned char, 16> storage {};
     NodeReference nodeReference;
 
-    // The fields of a date-time follow each other; every other content begins where the storage does.
+    // The fields of a date-time stand one after another. Every other content begins at the start of the storage.
     static constexpr std::size_t atMilliseconds = sizeof(long);
     static constexpr std::size_t atScope = sizeof(long) + sizeof(unsigned short);
 
@@ -131,7 +131,7 @@ inline Record numberRecord(std::string function, std::string text)
     return {std::move(function), "Number", "Vexilon.IC.Number", 6000, std::move(text)};
 }
 
-// The kind is stored before it is refused. A date-time begins at `now`.
+// A kind is stored even if it is refused. A date-time begins at `now`.
 inline Outcome<Nothing> initKind(Number& number, unsigned int kind, long now)
 {
     number.kind = kind;
@@ -194,7 +194,7 @@ inline Outcome<Number> numberOfCode(unsigned char code, long now)
     return numberOfKind(code, now);
 }
 
-// The refusal that every conversion but the node reference's words alike.
+// The refusal of every conversion except the one to a node reference, which has a text of its own.
 template <class T>
 Outcome<T> refusedKind(const Number& number, const std::string& function, const std::string& target,
                        const std::string& description)
@@ -228,7 +228,7 @@ inline Outcome<bool> toBool(const Number& number)
     }
 }
 
-// What both 32-bit conversions share: everything but the name and, for the signed one, the kind INT.
+// Both 32-bit conversions, which differ in their names. The one to int also converts the kind INT.
 inline Outcome<unsigned int> to32Bits(const Number& number, const char* function)
 {
     const char* const start = "Uint32: number out of range: ";
@@ -300,7 +300,7 @@ inline Outcome<unsigned long long> toUint64(const Number& number)
                                         "A negative number cannot convert to an unsigned 64-bit integer");
         if (std::isnan(real))
             return returned<Target>(9223372036854775808ull);
-        // In two halves, so that neither comes near a limit.
+        // In two halves, so that neither comes near the limit of its type.
         const double upper = std::floor(integral / 4294967296.0);
         const double lower = integral - upper * 4294967296.0;
         return returned(static_cast<Target>(upper) * 4294967296ull + static_cast<Target>(lower));
@@ -318,7 +318,7 @@ inline Outcome<double> toReal(const Number& number)
     case UINT32:
         return returned(static_cast<double>(number.read<unsigned int>()));
     case UINT64: {
-        // Each half is exact, and so the sum is rounded once.
+        // Each half is exact, so only the sum is rounded.
         const auto value = number.read<unsigned long long>();
         const auto upper = static_cast<unsigned int>(value / 0x100000000ull);
         const auto lower = static_cast<unsigned int>(value % 0x100000000ull);
@@ -333,7 +333,7 @@ inline Outcome<double> toReal(const Number& number)
     case VERSION: {
         const double major = number.read<unsigned char>(0);
         const double minor = number.read<unsigned char>(1);
-        // Each step through memory, since some processors calculate in more digits than a double has.
+        // volatile rounds each step to a double: x87 processors calculate with more digits.
         const volatile double decimals = minor / (minor <= 9.0 ? 10.0 : minor <= 99.0 ? 100.0 : 1000.0);
         const volatile double sum = major + decimals;
         return returned(static_cast<double>(sum));
@@ -382,7 +382,7 @@ inline Outcome<NodeReference> toNodeReference(const Number& number)
         "std::out_of_range", "Can't return current value as pair");
 }
 
-// Milliseconds that are no multiple of ten leave a record.
+// Adds a record if the number is a date-time whose milliseconds are not a multiple of ten.
 inline void write(std::ostream& out, std::vector<Record>& records, const Number& number)
 {
     switch (number.kind) {
@@ -437,7 +437,7 @@ inline void write(std::ostream& out, std::vector<Record>& records, const Number&
     }
 }
 
-// Never refused.
+// Never throws.
 inline Outcome<std::string> textOf(const Number& number)
 {
     std::ostringstream out;

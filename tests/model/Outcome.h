@@ -6,8 +6,8 @@
 #include <utility>
 #include <vector>
 
-// The rules of the values once more, as plainly as they can be said: slow, and sharing no code with the library, so
-// that what the two agree on was worked out twice.
+// The rules of the values, implemented a second time: as plainly as possible, slowly, and without the library's code.
+// Where the two agree, both were derived from the rules independently.
 namespace model {
 
 // A log record and the trace record that repeats it.
@@ -25,7 +25,7 @@ inline bool operator==(const Record& a, const Record& b)
         && a.level == b.level;
 }
 
-// How an operation ended: a value, or an exception of this class that says this sentence. And what it logged.
+// How an operation ended: with a value, or with an exception of this class and this text. And what it logged.
 template <class T>
 struct Outcome {
     std::optional<T> value;
@@ -59,7 +59,7 @@ Outcome<T> refused(Record record, std::string exception, std::string sentence)
     return outcome;
 }
 
-// What a record says of a number: plain, whatever the locale of the program.
+// A number as a record shows it: in the classic locale, whatever the global one is.
 template <class T>
 std::string plain(const T& number)
 {

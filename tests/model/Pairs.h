@@ -9,7 +9,7 @@
 #include "Number.h"
 #include "PropertyValue.h"
 
-// A value of the library and what the model makes of the same arguments.
+// A value of the library, and the value that the model makes from the same arguments.
 namespace agreement {
 
 struct NumberPair {
@@ -49,7 +49,7 @@ inline NumberPair pairOf(long seconds, unsigned short milliseconds)
 {
     return {IC::Number(seconds, milliseconds), model::numberOfDateTime(seconds, milliseconds, 3)};
 }
-// Of a date-time of the platform: its milliseconds are cut to 16 bits, and its scope to 8.
+// From the platform's date-time, whose milliseconds are cut to 16 bits and its scope to 8.
 inline NumberPair pairOf(long seconds, unsigned int milliseconds, unsigned int scope)
 {
     ZQ::DateTime time(seconds, scope);
@@ -58,7 +58,7 @@ inline NumberPair pairOf(long seconds, unsigned int milliseconds, unsigned int s
             model::numberOfDateTime(seconds, static_cast<unsigned short>(milliseconds % 65536),
                                     static_cast<unsigned char>(scope % 256))};
 }
-// Of a kind without a value: UNKNOWN, NOT_A_NUMBER, INFINITE.
+// For the kinds without content: UNKNOWN, NOT_A_NUMBER, INFINITE.
 inline NumberPair pairOfKind(model::NumberKind kind)
 {
     return {IC::Number(static_cast<IC::Number::KindType>(kind)), *model::numberOfKind(kind, 0).value};

@@ -45,11 +45,11 @@ inline Outcome<unsigned int> toUint8(unsigned int enumValue)
         "std::out_of_range", "The number is too large to convert to an 8-bit integer");
 }
 
-// Every kind has a member of its own; the kind says which of them counts.
+// Every kind has its own member; the kind says which of them is valid.
 struct PropertyValue {
     unsigned int kind = NOTHING;
     bool readOnly = false;
-    bool empty = false;  // without an object, after a refused setKind
+    bool empty = false;  // has no object, as a refused setKind leaves it
     Number number;
     std::string text;
     std::vector<unsigned char> buffer;
@@ -81,7 +81,7 @@ inline Outcome<Nothing> refusedPropertyKind(unsigned char code)
         "IC::PropertyValueInvalidKind", "Invalid kind of property");
 }
 
-// The value that a kind code makes; a wider code has been cut to a byte before.
+// Makes the value of a kind code. The caller has cut a wider code to one byte.
 inline Outcome<Nothing> makeKind(PropertyValue& value, unsigned char code, bool readOnly)
 {
     if (code > 6)
@@ -90,7 +90,7 @@ inline Outcome<Nothing> makeKind(PropertyValue& value, unsigned char code, bool 
     return returned(Nothing());
 }
 
-// A refused code costs the value, though not its kind.
+// A refused code destroys the content and keeps the kind.
 inline Outcome<Nothing> setKind(PropertyValue& value, unsigned char code)
 {
     if (code == value.kind)
@@ -170,7 +170,7 @@ inline Outcome<Version> toVersion(const PropertyValue& value)
         "PropertyValue:Version2: can't return current value as a Version2, kind=", "Number");
 }
 
-// Refused without a record.
+// A refusal writes no record.
 inline Outcome<unsigned int> toEnumValue(const PropertyValue& value)
 {
     if (value.holds(ENUM_VALUE))
@@ -292,7 +292,7 @@ inline bool equal(const PropertyValue& a, const PropertyValue& b)
     }
 }
 
-// Of texts and buffers: their bytes count as unsigned.
+// The order of texts and buffers, by their bytes as unsigned numbers.
 template <class Bytes>
 bool precedesByBytes(const Bytes& a, const Bytes& b)
 {
@@ -376,7 +376,7 @@ inline Outcome<bool> greater(const PropertyValue& a, const PropertyValue& b)
     return precedes(b, a);
 }
 
-// For numbers and for property values alike: equal ones are never refused.
+// For numbers and property values. The comparison of equal values is never refused.
 template <class Value>
 Outcome<bool> lessOrEqual(const Value& a, const Value& b)
 {

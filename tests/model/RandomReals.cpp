@@ -1,6 +1,5 @@
-// RandomReals COUNT SEED: converts random reals, each to one of the types that take reals, and compares value,
-// exception and records with those of the second model (Number.h). Prints SEED, and exits with 1 at the first
-// difference.
+// RandomReals [COUNT [SEED]]: converts random reals, each to one type that a real converts to, and compares value,
+// exception and records with those of the model (Number.h). Prints SEED. Exits with 1 at the first difference.
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
@@ -17,7 +16,7 @@ class RandomReals {
 public:
     explicit RandomReals(std::uint64_t seed) : bits_(seed) { }
 
-    // By turns: any bits; any magnitude from 2^-4 to 2^70; beside a limit of an integer type.
+    // In turn: a real of random bits, one of a random magnitude from 2^-4 to 2^70, one near a limit of an integer type.
     double next(unsigned long long turn)
     {
         switch (turn % 3) {
@@ -49,7 +48,7 @@ private:
     {
         constexpr int powers[] = {0, 1, 8, 16, 31, 32, 53, 63, 64};
         const double limit = std::ldexp(1.0, powers[bits_() % std::size(powers)]);
-        // In steps of the distance between reals there, or of a quarter.
+        // In steps of 0.25, or of the distance to the next real.
         const double step = bits_() % 2 == 0 ? std::nextafter(limit, 0x1p70) - limit : 0.25;
         return withSign(limit + step * (static_cast<double>(bits_() % 17) - 8.0));
     }
@@ -59,7 +58,7 @@ private:
     std::mt19937_64 bits_;
 };
 
-// The types in turn too: a refusal costs more than all else here.
+// Converts each real to one type only, the types in turn, because refusals take most of the time.
 bool agree(double real, unsigned long long turn)
 {
     constexpr agreement::Target targets[] = {agreement::BOOL, agreement::INT, agreement::UINT32,

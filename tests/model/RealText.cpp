@@ -1,6 +1,6 @@
-// Compares the texts of so many reals (the argument) with those of fresh streams: random bits, random decimals of up
-// to nine digits, halfway cases, powers of ten and of two with their neighbours, denormals. Ends with 1 at the first
-// difference.
+// RealText [COUNT]: compares the texts of reals with those that new streams write. First come powers of ten and of two
+// with their neighbours, and denormals; then COUNT reals: random bits, random decimals of up to nine digits, halfway
+// cases. Exits with 1 at the first difference.
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
@@ -58,14 +58,14 @@ double ofRandomBits()
     return real;
 }
 
-// A decimal of up to nine digits with the point somewhere.
+// A decimal of up to nine digits with the point anywhere.
 double randomDecimal()
 {
     const auto digits = static_cast<double>(randomBits() % 1000000000);
     return digits / std::pow(10.0, static_cast<double>(randomBits() % 16));
 }
 
-// Six digits and a five: in the middle between two texts or next to it, as near as a real comes.
+// Six digits and a five: the real nearest to the middle between two texts, or one of its neighbours.
 double halfway()
 {
     const auto digits = static_cast<double>((randomBits() % 1000000) * 10 + 5);

@@ -9,7 +9,7 @@ namespace {
 
 std::vector<LoggerCall> calls;
 
-// The program's first look at its records is after its first operation at the latest.
+// Initialised at the latest when takeLoggerCalls is first called: outcomeOf does that before each operation.
 const VXLog::RecordSink before = VXLog::setRecordSink([](const VXLog::Record& record) {
     calls.push_back({record.kind == VXLog::Record::Kind::trace,
                      record.line,
