@@ -1,19 +1,18 @@
-# A page shows each example as its file has it and what it prints, in this order, and nothing else: every block ```cpp
-# is an example, every block ```text the output of the example before it, and every block ```cmake a part of an example
-# that is a CMakeLists.txt.
+# Checks that a page shows the given examples, in this order, and nothing else. A block ```cpp is a whole source file, a
+# block ```text the output of the example before it, and a block ```cmake a part of a CMakeLists.txt.
 #
 #   PAGE        the page
-#   EXAMPLES    the sources; behind a "|" the program, where there is one: then what it prints stands beside the
-#               source in a .txt
-#   EMULATOR    what runs a program of another machine; empty for this one
+#   EXAMPLES    the source files. SOURCE|PROGRAM names a program too: its output is in the .txt file beside SOURCE.
+#   EMULATOR    the command that runs the programs; empty if this machine runs them itself
 file(READ ${PAGE} rest)
 separate_arguments(emulator UNIX_COMMAND "${EMULATOR}")
 
-# The page from here on must show `content` as its next block.
+# Fails unless the next block of `rest` has this language and this content. Then removes it from `rest`. `origin` is the
+# file with the content.
 function(expect_block language content origin)
     string(REGEX MATCH "\n```(cpp|text|cmake)\n" fence "${rest}")
     if(NOT fence STREQUAL "\n```${language}\n")
-        message(FATAL_ERROR "${PAGE} does not show ${origin}")
+        message(FATAL_ERROR "The next block of ${PAGE} is not ${origin}")
     endif()
     string(FIND "${rest}" "${fence}" position)
     string(LENGTH "${fence}" length)

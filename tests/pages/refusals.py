@@ -1,7 +1,7 @@
-"""Compares docs/refusals.md with what the tests saw: refusals.py PAGE PROGRAM...
+"""Compares docs/refusals.md with the refusals that the tests expect: refusals.py PAGE PROGRAM...
 
-Each test program reports what it expected to be refused. Every one of these has to stand in the page, and every row
-of the page has to have been seen.
+Runs each test program, which reports the refusals that it expected. Fails if the page does not list one of them, or
+lists one that no test expects.
 """
 
 import pathlib
@@ -20,7 +20,7 @@ TYPES = {
 
 
 def rows(page):
-    """(file, function, record, exception) of each row, the last two as patterns."""
+    """Yields (file, function, record, exception) for each row of the page, the last two as patterns."""
     file = None
     for line in page.read_text(encoding="utf-8").splitlines():
         if line.startswith("## "):
@@ -34,12 +34,12 @@ def rows(page):
 def pattern(text):
     if text == "none":
         return ""
-    text = re.sub(r"\d+", "#", text)  # as the tests report it
+    text = re.sub(r"\d+", "#", text)  # the tests report numbers as # too
     return re.sub(r"<[a-z]+>", "[-+.e#]+|-?inf", re.escape(text)).replace("[-+.e#]+|-?inf", "(?:[-+.e#]+|-?inf)")
 
 
 def seen(program):
-    """The same of each refusal that a test expected."""
+    """Yields the same, as texts, for each refusal that a test of the program expected."""
     with tempfile.TemporaryDirectory() as folder:
         report = pathlib.Path(folder) / "report.xml"
         subprocess.run([program, "--gtest_brief=1", f"--gtest_output=xml:{report}"], check=True,
@@ -66,9 +66,11 @@ def main():
         if not matching:
             unlisted.append((file, function, record, exception))
     for refusal in unlisted:
-        print("Seen by a test, but not in the page:", *refusal, sep="\n    ")
+        print("A test expects this refusal, but the page does not list it:", *refusal, sep="\n    ")
     for row in sorted(unseen):
-        print("In the page, but seen by no test:", *row, sep="\n    ")
+        print("The page lists this refusal, but no test expects it:", *row, sep="\n    ")
+    if not refusals:
+        print("The tests have reported no refusal")
     if not refusals or unlisted or unseen:
         sys.exit(1)
     print(f"{len(expected)} refusals")

@@ -10,7 +10,7 @@ void compare(bool& result, const IC::Number& number, const IC::EnumValue& state,
     result = state == IC::EnumValue(5u);
     result = value == number;  // does not compile: ambiguous
     result = value == IC::PropertyValue(number);
-    result = value == "AFB0812";  // a text is no trap
+    result = value == "AFB0812";  // a text compiles
     result = error != 0;          // does not compile: ambiguous
     result = error != IC::Error::STATUS_SUCCESS;
 }

@@ -5,7 +5,7 @@
 int main()
 {
     try {
-        const IC::Error error(0, 5);  // 0 is a null text
+        const IC::Error error(0, 5);  // 0 is a null pointer to a text
         std::cout << error << '\n';
     } catch (const std::logic_error&) {
         std::cout << "a null text\n";
