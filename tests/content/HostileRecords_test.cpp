@@ -51,8 +51,8 @@ std::string standardErrorOf(void (*write)())
     return all;
 }
 
-// Whether the line is valid UTF-8 without control characters. Asks iconv, because mbstowcs would need a UTF-8 locale,
-// which emulators for machines of the other byte order do not have.
+// Whether the line is valid UTF-8 without control characters. Uses iconv, which needs no locale: the system's locales
+// have its own byte order, so a program under emulation cannot always load them.
 bool isPrintable(std::string line)
 {
     const iconv_t reading = iconv_open("WCHAR_T", "UTF-8");

@@ -317,7 +317,7 @@ TEST(ModelOfNumber, MakesOrRefusesEveryKindCode)
     }
 }
 
-TEST(ModelOfNumber, StartsTheKindOfDateTimesAtTheCurrentTime)
+TEST(ModelOfNumber, KindOfDateTimesStartsAtTheCurrentTime)
 {
     const std::time_t before = std::time(nullptr);
     const IC::Number number(IC::Number::KIND_DATETIME);

@@ -6,8 +6,8 @@
 #include <utility>
 #include <vector>
 
-// The rules of the values, implemented a second time: as plainly as possible, slowly, and without the library's code.
-// Where the two agree, both were derived from the rules independently.
+// The rules of the values, implemented a second time: plain, slow, and without any code of the library, so that an
+// error in the library is not repeated here.
 namespace model {
 
 // A log record and the trace record that repeats it.

@@ -9,7 +9,7 @@ namespace {
 
 std::vector<LoggerCall> calls;
 
-// Initialised at the latest when takeLoggerCalls is first called: outcomeOf does that before each operation.
+// The sink is set at the latest when takeLoggerCalls is first called; outcomeOf calls that before each operation.
 const VXLog::RecordSink before = VXLog::setRecordSink([](const VXLog::Record& record) {
     calls.push_back({record.kind == VXLog::Record::Kind::trace,
                      record.line,

@@ -128,8 +128,7 @@ TEST_F(Cancellation, TakesEffectAfterTheDefaultSinkHasWrittenItsLine)
         pthread_testcancel();
     });
     const std::string written = testing::internal::GetCapturedStderr();
-    EXPECT_EQ(std::count(written.begin(), written.end(), '\n'),
-              2 * 110);  // a request and its refusal in each round
+    EXPECT_EQ(std::count(written.begin(), written.end(), '\n'), 2 * 110);  // two in each round
     EXPECT_NE(written.find(": setProperty: 7 does not exist\n"), std::string::npos) << written;
 }
 
