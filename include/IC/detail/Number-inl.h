@@ -103,7 +103,7 @@ inline Number::operator sNodeRef() const
 inline Number::Number(Tag, KindType kind) noexcept : kind_(kind), value_ {}, nodeRef_ {0, 0} { }
 
 template <class T>
-T Number::load() const noexcept
+inline T Number::load() const noexcept
 {
     T content;
     std::memcpy(&content, value_, sizeof content);
@@ -111,7 +111,7 @@ T Number::load() const noexcept
 }
 
 template <class T>
-void Number::store(const T& content) noexcept
+inline void Number::store(const T& content) noexcept
 {
     std::memcpy(value_, &content, sizeof content);
 }

@@ -203,13 +203,13 @@ inline bool PropertyValue::bothHold(KindType kind, const PropertyValue& a, const
 }
 
 template <class T>
-T& PropertyValue::object() noexcept
+inline T& PropertyValue::object() noexcept
 {
     return *static_cast<T*>(value_);
 }
 
 template <class T>
-const T& PropertyValue::object() const noexcept
+inline const T& PropertyValue::object() const noexcept
 {
     return *static_cast<const T*>(value_);
 }
