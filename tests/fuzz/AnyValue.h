@@ -15,9 +15,9 @@
 
 #include "model/Pairs.h"
 
-// Values made of the bytes of an input, each together with what the model makes of them.
+// Values made from the bytes of an input, each paired with the model's value.
 
-// FuzzedDataProvider is asked for unsigned integers alone: of signed ones it makes conversions that a sanitizer reports.
+// Consumes unsigned integers only: FuzzedDataProvider converts signed ones in a way that a sanitizer reports.
 template <class T>
 T anyInteger(FuzzedDataProvider& bytes)
 {
@@ -97,7 +97,7 @@ inline agreement::NumberPair anyConstructedNumber(FuzzedDataProvider& bytes)
     }
 }
 
-// Of one input in four, also read as another kind, or left with a kind that initKind has refused.
+// In one case of four, the number also changes to another kind, or initKind refuses a kind.
 inline agreement::NumberPair anyNumber(FuzzedDataProvider& bytes)
 {
     agreement::NumberPair pair = anyConstructedNumber(bytes);
@@ -113,7 +113,7 @@ inline agreement::NumberPair anyNumber(FuzzedDataProvider& bytes)
     const auto kind = change % 2 == 0 ? 11u : 4294967295u;
     try {
         pair.actual.initKind(static_cast<IC::Number::KindType>(kind));
-    } catch (const std::invalid_argument&) {  // which another target looks at
+    } catch (const std::invalid_argument&) {  // the fuzzer `values` checks this refusal
     }
     model::initKind(pair.expected, kind, 0);
     return pair;

@@ -4,7 +4,7 @@
 #include <iostream>
 #include <string>
 
-// Ends the program, which the fuzzer reports together with its input.
+// Aborts, so that the fuzzer reports the input.
 [[noreturn]] inline void fail(const std::string& what)
 {
     std::cerr << "broken: " << what << std::endl;
@@ -17,7 +17,7 @@ inline void require(bool holds, const char* rule)
         fail(rule);
 }
 
-// Takes what the functions of tests/model/Agreement.h return.
+// Fails if there is a difference, as returned by the functions of tests/model/Agreement.h.
 inline void requireNone(const std::string& difference)
 {
     if (!difference.empty())

@@ -1,4 +1,4 @@
-// Two containers of one kind: text, comparison and copies are the model's, and a copy is independent.
+// Two containers of one kind: their texts, comparisons and copies match the model, and copies are independent.
 #include <utility>
 
 #include "AnyValue.h"
@@ -8,7 +8,7 @@ namespace {
 
 using agreement::ValuePair;
 
-// Empties what the value gave back, and takes the value by move and by copy.
+// The container that a value returns, and a value constructed from it, can change without changing the first value.
 template <class Container>
 void requireIndependent(const ValuePair& pair)
 {

@@ -1,29 +1,29 @@
-// Two numbers, or two property values: every comparison is the model's, the six fit each other, and none changes what
-// it compares.
+// Two numbers or two property values: every comparison matches the model, the six operators are consistent, and none
+// changes its operands.
 #include "AnyValue.h"
 #include "Check.h"
 
 namespace {
 
-// What must hold whatever the model says.
+// Checks the six operators against each other, without the model.
 template <class Value>
-void requireFit(const Value& a, const Value& b)
+void requireConsistent(const Value& a, const Value& b)
 {
     const bool equal = a == b;
     require((b == a) == equal, "== is symmetric");
     require((a != b) != equal, "!= is the negation of ==");
     if (equal) {
-        require(a <= b && b <= a && a >= b && b >= a, "what is equal is <= and >=");
+        require(a <= b && b <= a && a >= b && b >= a, "equal values are <= and >=");
         return;
     }
     const auto less = agreement::outcomeOf([&] { return a < b; });
     const auto lessOrEqual = agreement::outcomeOf([&] { return a <= b; });
     require(less.value == lessOrEqual.value && less.records == lessOrEqual.records,
-            "of unequal values <= is <");
+            "for unequal values, <= gives the result and the records of <");
     const auto greater = agreement::outcomeOf([&] { return b > a; });
-    if (less.value && greater.value) {  // an infinity is not less than what refuses to be compared with it
-        require(*less.value == *greater.value, "a < b is b > a");
-        require(!*less.value || (!(a > b) && !(b < a)), "what is less is not greater");
+    if (less.value && greater.value) {  // infinity < x is false, but x > infinity throws
+        require(*less.value == *greater.value, "a < b equals b > a");
+        require(!*less.value || (!(a > b) && !(b < a)), "a < b excludes a > b and b < a");
     }
 }
 
@@ -31,7 +31,7 @@ template <class Pair>
 void compare(const Pair& a, const Pair& b, unsigned int comparison)
 {
     requireNone(agreement::differenceInComparison(a.actual, b.actual, a.expected, b.expected, comparison));
-    requireFit(a.actual, b.actual);
+    requireConsistent(a.actual, b.actual);
     requireNone(agreement::differenceInContent(a.actual, a.expected));
     requireNone(agreement::differenceInContent(b.actual, b.expected));
 }

@@ -1,5 +1,5 @@
-// A number of any kind and content, alone or in a property value, converted: every outcome is the model's, and the
-// conversion changes nothing.
+// Converts a number of any kind and content, alone or in a property value: every outcome matches the model, and the
+// conversion leaves the number unchanged.
 #include "AnyValue.h"
 #include "Check.h"
 

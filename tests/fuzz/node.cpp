@@ -1,5 +1,4 @@
-// A node under a program of operations: results, properties, texts and records are those of a map that the same is
-// done to.
+// Runs a program of operations on a node and on a map: the node's results, properties, texts and records match the map.
 #include <iterator>
 #include <map>
 
@@ -34,8 +33,8 @@ model::Record nodeRecord(int level, const std::string& text)
     return {"setProperty", "Node", "Vexilon.IC.Node", level, text};
 }
 
-// The pairs of records of one file among the calls. A request's text is composed while its two records are written,
-// and so records of Number stand between them.
+// The pairs of records that one source file logged. setProperty composes its text while it writes its two records, so
+// records of Number stand between them.
 Records recordsOf(const std::string& file, const std::vector<agreement::LoggerCall>& calls)
 {
     std::vector<agreement::LoggerCall> ofFile;
@@ -47,9 +46,9 @@ Records recordsOf(const std::string& file, const std::vector<agreement::LoggerCa
 
 void requireError(const IC::Error& error, unsigned int status)
 {
-    require(error.getStatus() == status, "the status that a node returns");
+    require(error.getStatus() == status, "a node returns the expected status");
     require(error.getValue().getKind() == IC::Number::KIND_UNKNOWN && error.getMessage().empty(),
-            "a node returns neither value nor message");
+            "the error that a node returns has no value and no message");
 }
 
 void setProperty(IC::Node& node, Expected& expected, unsigned int key, const ValuePair& value)
@@ -74,9 +73,9 @@ void setProperty(IC::Node& node, Expected& expected, unsigned int key, const Val
     agreement::takeLoggerCalls();
     requireError(node.setProperty(key, value.actual), status);
     const auto calls = agreement::takeLoggerCalls();
-    require(recordsOf("Node", calls) == records, "the records of a node");
-    require(recordsOf("Number", calls) == ofText, "the records of a value's text in a node's");
-    require(calls.size() == 2 * (records.size() + ofText.size()), "no records but these");
+    require(recordsOf("Node", calls) == records, "setProperty logs the expected records");
+    require(recordsOf("Number", calls) == ofText, "composing the text of a value logs the expected records");
+    require(calls.size() == 2 * (records.size() + ofText.size()), "setProperty logs no other records");
 }
 
 void getProperty(const IC::Node& node, const Expected& expected, unsigned int key, ValuePair value)
@@ -84,7 +83,7 @@ void getProperty(const IC::Node& node, const Expected& expected, unsigned int ke
     const auto found = expected.properties.find(key);
     agreement::takeLoggerCalls();
     requireError(node.getProperty(key, value.actual), found == expected.properties.end() ? 5 : 0);
-    require(agreement::takeLoggerCalls().empty(), "reading a property leaves no record");
+    require(agreement::takeLoggerCalls().empty(), "reading a property logs nothing");
     requireNone(agreement::differenceInContent(
         value.actual, found == expected.properties.end() ? value.expected : found->second));
 }
@@ -92,16 +91,16 @@ void getProperty(const IC::Node& node, const Expected& expected, unsigned int ke
 void requireAsExpected(const IC::Node& node, const Expected& expected)
 {
     const auto properties = node.getProperties();
-    require(properties.size() == expected.properties.size(), "as many properties");
+    require(properties.size() == expected.properties.size(), "a node has the expected number of properties");
     auto wanted = expected.properties.begin();
     for (const auto& [key, value] : properties) {
-        require(key == wanted->first, "the same keys");
+        require(key == wanted->first, "a node has the expected keys");
         requireNone(agreement::differenceInContent(value, wanted->second));
         ++wanted;
     }
     require(node.getSensor() == expected.sensor && node.getStatus() == expected.status
                 && node.operator IC::Node::StatusType() == expected.status,
-            "sensor and status");
+            "a node has the expected sensor and status");
     requireSame(node.getDescription(), expected.description, "description");
     requireSame(node.getPath(), expected.path, "path");
     std::string hexadecimal;
@@ -126,15 +125,16 @@ void requireSensorRefused(unsigned int sensor)
     agreement::takeLoggerCalls();
     try {
         const IC::Node node(sensor);
-        fail("a sensor type that there is not");
+        fail("an invalid sensor type is accepted");
     } catch (const IC::NodeInvalidSensor& refusal) {
         requireSame(refusal.what(),
                     std::to_string(sensor) + " is not a valid sensor. The largest possible sensor is 73",
-                    "refusal of a sensor type");
+                    "exception text for an invalid sensor type");
     }
     const Records expected = {{"Node", "Node", "Vexilon.IC.Node", 6000,
                                "Node: Sensor value out of range: " + std::to_string(sensor)}};
-    require(agreement::inPairs(agreement::takeLoggerCalls()) == expected, "the record of a sensor type");
+    require(agreement::inPairs(agreement::takeLoggerCalls()) == expected,
+            "an invalid sensor type logs the expected record");
 }
 
 }  // namespace

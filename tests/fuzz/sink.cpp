@@ -1,5 +1,5 @@
-// The stand-in for the logging library with bytes of any kind: the message buffer gives back what was put in, and the
-// default sink writes one line for a record, of printable characters alone, from which the texts can be read back.
+// The stand-in for the logging library, with arbitrary bytes: the message buffer returns the text inserted, and the
+// default sink writes one line of printable characters for each record, with every other byte escaped.
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -19,7 +19,7 @@
 
 namespace {
 
-// What is written to standard error while it is taken.
+// Captures what an action writes to standard error.
 class StandardError {
 public:
     template <class Action>
@@ -40,7 +40,8 @@ private:
     FILE* stream_ = open_memstream(&text_, &size_);
 };
 
-// How many bytes the UTF-8 character at the start of the text has, or 0; its code comes back too.
+// The length in bytes of the UTF-8 character that the text begins with, or 0 if it is invalid; sets `code` to the
+// character's code.
 std::size_t decode(std::string_view text, unsigned int& code)
 {
     const unsigned int first = static_cast<unsigned char>(text.front());
@@ -80,12 +81,12 @@ void requirePrintable(std::string_view line)
     while (!line.empty()) {
         unsigned int code = 0;
         const std::size_t length = decode(line, code);
-        require(length != 0 && isPrintable(code), "a line is of printable characters");
+        require(length != 0 && isPrintable(code), "a line has only printable characters");
         line.remove_prefix(length);
     }
 }
 
-// The escaped form, as the interface says it.
+// The escaped text, as documented in VXLog/RecordSink.h.
 std::string escaped(std::string_view text)
 {
     std::string out;
@@ -116,8 +117,8 @@ void requireTime(std::string_view time)
                 "a line begins with a time");
 }
 
-// A text composed in a message buffer, piece by piece. Manipulators reach what goes through the stream, and no further
-// than to the end of the buffer; unsigned int and double stay plain.
+// Composes a text in a message buffer, piece by piece. Manipulators affect later pieces of the same buffer, except
+// unsigned int and double.
 std::string anyMessage(FuzzedDataProvider& bytes)
 {
     VXLog::VXMessageBuffer buffer;
@@ -163,8 +164,8 @@ std::string anyMessage(FuzzedDataProvider& bytes)
     }
     const auto taken = [&] { return last == nullptr ? buffer.str(buffer) : buffer.str(*last); };
     const std::string message = taken();
-    requireSame(message, expected.str(), "what was composed");
-    requireSame(taken(), "", "what was composed since it was taken");
+    requireSame(message, expected.str(), "text of a message buffer");
+    requireSame(taken(), "", "text of a message buffer after str()");
     return message;
 }
 
@@ -192,18 +193,18 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         unsetenv("VXLOG_TRACE");
 
     if (trace && !traceIsWritten) {
-        requireSame(line, "", "an unwanted trace record");
+        requireSame(line, "", "output of a disabled trace record");
         return 0;
     }
-    require(!line.empty() && line.back() == '\n', "a record ends its line");
+    require(!line.empty() && line.back() == '\n', "a record ends with a newline");
     requirePrintable(std::string_view(line).substr(0, line.size() - 1));
     const std::size_t end = line.find(' ');
-    require(end != std::string::npos, "a record has a time and more");
+    require(end != std::string::npos, "a blank follows the time");
     requireTime(line.substr(0, end));
     requireSame(line.substr(end),
                 ' ' + std::to_string(level) + (trace ? " trace " : " ") + escaped(category) + ' '
                     + escaped(file.c_str()) + ':' + std::to_string(number) + ' ' + escaped(function.c_str())
                     + ": " + escaped(message) + '\n',
-                "the line of a record");
+                "line of a record after the time");
     return 0;
 }

@@ -1,5 +1,5 @@
-// The texts of values, property maps, errors and alerts, under the classic locale and under ones that group digits,
-// into streams of any settings: the model's, the same for a copy, and inserted as one text.
+// The texts of values, property maps, errors and alerts match the model, under the classic locale and under locales
+// that group digits. A copy has the same text. Streams of any settings insert each text as a whole.
 #include <iomanip>
 #include <locale>
 #include <map>
@@ -7,15 +7,15 @@
 
 #include "AnyValue.h"
 #include "Check.h"
-#include "support/GroupingLocale.h"
 #include "IC/Alert.h"
 #include "IC/Error.h"
+#include "support/GroupingLocale.h"
 
 namespace {
 
 using agreement::ValuePair;
 
-// Makes a locale the global one while it lives.
+// Sets the global locale, and restores the previous one on destruction.
 class GlobalLocale {
 public:
     explicit GlobalLocale(const std::locale& locale) : before_(std::locale::global(locale)) { }
@@ -61,7 +61,7 @@ void requireInsertedAsOneText(const Value& value, const Settings& settings)
     out << value << '|' << 255;
     std::ostringstream expected = settings.stream();
     expected << value.operator std::string() << '|' << 255;
-    requireSame(out.str(), expected.str(), "a value in a stream");
+    requireSame(out.str(), expected.str(), "value in a stream");
 }
 
 void requirePropertiesInPieces(const ValuePair& first, const ValuePair& second, unsigned int key,
@@ -78,7 +78,7 @@ void requirePropertiesInPieces(const ValuePair& first, const ValuePair& second, 
         before = "], [";
     }
     expected << "]";
-    requireSame(out.str(), expected.str(), "a property map in a stream");
+    requireSame(out.str(), expected.str(), "property map in a stream");
 }
 
 void requireErrorText(FuzzedDataProvider& bytes, const agreement::NumberPair& value, const Settings& settings)

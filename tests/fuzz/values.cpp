@@ -1,5 +1,5 @@
-// Property values and a number under a program of operations: after each, what it touched is as the model has it, and
-// what it did not touch is as before.
+// Runs a program of operations on property values and a number: after each operation its operands match the model, and
+// at the end all values do.
 #include <array>
 #include <utility>
 
@@ -35,7 +35,7 @@ void construct(FuzzedDataProvider& bytes, ValuePair& pair)
                                           pair.actual = IC::PropertyValue(code, readOnly);
                                           return model::Nothing();
                                       })));
-    pair.expected = made;  // refused: the assignment never began
+    pair.expected = made;  // unchanged if the constructor threw: there was no assignment
 }
 
 void changeNumber(FuzzedDataProvider& bytes, NumberPair& pair)
@@ -47,7 +47,7 @@ void changeNumber(FuzzedDataProvider& bytes, NumberPair& pair)
                                               pair.actual.setKind(code);
                                               return model::Nothing();
                                           })));
-    } else if (code != model::DATE_TIME) {  // which begins with the time of day
+    } else if (code != model::DATE_TIME) {  // skipped: initKind sets it to the current time
         const auto expected = model::initKind(pair.expected, code, 0);
         requireNone(agreement::difference("initKind of a number", expected, agreement::outcomeOf([&] {
                                               pair.actual.initKind(static_cast<IC::Number::KindType>(code));
@@ -57,7 +57,7 @@ void changeNumber(FuzzedDataProvider& bytes, NumberPair& pair)
     requireNone(agreement::differenceInContent(pair.actual, pair.expected));
 }
 
-// A value without an object is neither copied nor moved: it is given another one.
+// Replaces a value without an object, which must not be copied or moved.
 void fill(FuzzedDataProvider& bytes, ValuePair& pair)
 {
     if (pair.expected.empty)
