@@ -15,18 +15,6 @@ namespace {
 
 using agreement::ValuePair;
 
-// Sets the global locale, and restores the previous one on destruction.
-class GlobalLocale {
-public:
-    explicit GlobalLocale(const std::locale& locale) : before_(std::locale::global(locale)) { }
-    ~GlobalLocale() { std::locale::global(before_); }
-    GlobalLocale(const GlobalLocale&) = delete;
-    GlobalLocale& operator=(const GlobalLocale&) = delete;
-
-private:
-    std::locale before_;
-};
-
 struct Settings {
     std::ios_base::fmtflags flags;
     std::streamsize width;

@@ -8,22 +8,22 @@
 
 #include <gtest/gtest.h>
 
-// Lets memory run out on purpose, and counts. It replaces the global operator new, so one source of a program
-// includes it. Everything here is about the calling thread alone.
+// Makes memory run out on purpose, and counts allocations. This header defines the global operator new, so exactly one
+// source of a program includes it. All counters and limits belong to the calling thread.
 //
-// The observer allocates too. Where it must not fail (in unlock, which no caller expects to throw), the test
-// first gives its lists room by using them.
+// The observer of the test kit allocates too. It must not fail in unlock, which no caller expects to throw: there, the
+// test first fills the observer's lists, so that they have room.
 namespace allocation {
 
 inline thread_local long allowedNow = -1;    // how many more allocations succeed; below 0: all
-inline thread_local bool failsOnce = false;  // the allocations after the first that fails succeed again
+inline thread_local bool failsOnce = false;  // after one failure, allocations succeed again
 inline thread_local bool failedNow = false;
 inline thread_local long madeSoFar = 0;
 inline thread_local long aliveNow = 0;
 inline thread_local void (*onRelease)() = nullptr;  // called before each release of memory
 
-// Runs the operation with memory for so many allocations; every later one throws std::bad_alloc. Whether the
-// operation returned: false means that std::bad_alloc left it, other exceptions pass.
+// Runs the operation with memory for `allowed` allocations; every later one throws std::bad_alloc. Returns false when
+// the operation threw std::bad_alloc. Other exceptions propagate.
 template <class Operation>
 bool completesWith(long allowed, Operation operation)
 {
@@ -40,7 +40,7 @@ bool completesWith(long allowed, Operation operation)
     return true;
 }
 
-// Makes the n-th allocation from now on (from 1) throw std::bad_alloc, and every one after it unless `once`.
+// Makes the n-th allocation from now on (counted from 1) throw std::bad_alloc, and, unless `once`, every later one.
 inline void failFrom(long nth, bool once)
 {
     failsOnce = once;
@@ -48,7 +48,7 @@ inline void failFrom(long nth, bool once)
     allowedNow = nth - 1;
 }
 
-// Ends that. Whether an allocation failed.
+// Ends what failFrom began. Returns whether an allocation failed.
 inline bool stopFailing()
 {
     allowedNow = -1;
@@ -65,8 +65,23 @@ long countOf(Operation operation)
     return madeSoFar - before;
 }
 
-// Expects the text form to throw std::bad_alloc or to be whole, whatever memory there is, and a stream to be
-// whole or bad.
+// Runs the operation with memory for no allocation, for one, for two, and so on until it completes. Expects that each
+// run releases all that it allocated. Returns how many allocations the operation needs.
+template <class Operation>
+long expectAllMemoryGivenBack(Operation operation)
+{
+    const long before = aliveNow;
+    long allowed = 0;
+    while (!completesWith(allowed, operation) && allowed < 100)
+        ++allowed;
+    EXPECT_EQ(aliveNow, before);
+    EXPECT_GT(allowed, 0) << "the operation needs no memory";
+    EXPECT_LT(allowed, 100) << "the operation does not complete";
+    return allowed;
+}
+
+// Expects, for every amount of memory, that the text form is complete or throws std::bad_alloc, and that a stream
+// receives the complete text or becomes bad.
 template <class Value>
 void expectTextWholeOrNotAtAll(const Value& value, const std::string& whole)
 {
@@ -91,7 +106,7 @@ void expectTextWholeOrNotAtAll(const Value& value, const std::string& whole)
 
 }  // namespace allocation
 
-// Never inlined: the compiler would see free() on what came from operator new, and warn.
+// Out of line: otherwise the compiler sees free() called on memory from operator new, and warns.
 [[gnu::noinline]] void* operator new(std::size_t size)
 {
     if (allocation::allowedNow == 0) {

@@ -7,7 +7,7 @@
 #include "IC/ICException.h"
 #include "VXLog/RecordSink.h"
 
-// The category of the log record that each source file writes, one after another: six refusals make them write.
+// Causes one refusal in each of the six source files. Returns the categories of their log records, one after another.
 inline std::string everyCategory()
 {
     std::string seen;

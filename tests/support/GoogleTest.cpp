@@ -1,2 +1,2 @@
-// Nothing but the precompiled headers that the tests share.
+// An empty program: CMake needs one to build the precompiled headers that the tests share.
 int main() { }

@@ -3,7 +3,7 @@
 #include <locale>
 #include <string>
 
-// Writes a comma between the groups of the digits of a number.
+// Separates groups of digits with commas.
 class GroupingDigits : public std::numpunct<char> {
 public:
     explicit GroupingDigits(char digitsPerGroup) : grouping_(1, digitsPerGroup) { }
@@ -20,17 +20,20 @@ inline std::locale groupingLocale(char digitsPerGroup = 3)
     return std::locale(std::locale::classic(), new GroupingDigits(digitsPerGroup));
 }
 
-// Makes such a locale the global one while it lives.
-class GlobalGroupingLocale {
+// Makes a locale the global one for the lifetime of the object.
+class GlobalLocale {
 public:
-    explicit GlobalGroupingLocale(char digitsPerGroup = 3)
-        : before_(std::locale::global(groupingLocale(digitsPerGroup)))
-    {
-    }
-    ~GlobalGroupingLocale() { std::locale::global(before_); }
-    GlobalGroupingLocale(const GlobalGroupingLocale&) = delete;
-    GlobalGroupingLocale& operator=(const GlobalGroupingLocale&) = delete;
+    explicit GlobalLocale(const std::locale& locale) : before_(std::locale::global(locale)) { }
+    ~GlobalLocale() { std::locale::global(before_); }
+    GlobalLocale(const GlobalLocale&) = delete;
+    GlobalLocale& operator=(const GlobalLocale&) = delete;
 
 private:
     std::locale before_;
+};
+
+// Makes a grouping locale the global one for the lifetime of the object.
+class GlobalGroupingLocale : GlobalLocale {
+public:
+    explicit GlobalGroupingLocale(char digitsPerGroup = 3) : GlobalLocale(groupingLocale(digitsPerGroup)) { }
 };

@@ -4,12 +4,12 @@
 
 #include <cstddef>
 
-// How many bytes malloc has handed out. It stays 0 with a sanitizer that has an allocator of its own; AddressSanitizer
-// looks for leaks itself.
+// How many bytes allocated by malloc are in use. Always 0 under a sanitizer that replaces malloc; AddressSanitizer finds
+// leaks itself.
 inline std::size_t heapInUse()
 {
 #ifdef __has_feature
-#if __has_feature(memory_sanitizer)  // does not know what mallinfo2 writes
+#if __has_feature(memory_sanitizer)  // does not know that mallinfo2 initialises its result
     return 0;
 #endif
 #endif

@@ -6,8 +6,8 @@
 
 #include "IC/Property.h"
 
-// One value of each kind, in the order of the kind codes. The texts are too long for a string's own buffer,
-// so a copy has to allocate for them.
+// One value of each kind, in the order of the kind codes. The long texts do not fit into a string's internal buffer,
+// so a copy allocates memory for them.
 inline std::vector<IC::PropertyValue> samples(bool readOnly = false)
 {
     using IC::PropertyValue;
@@ -22,7 +22,7 @@ inline std::vector<IC::PropertyValue> samples(bool readOnly = false)
     };
 }
 
-// The same with other contents, of other lengths.
+// The same kinds with other contents of other lengths.
 inline std::vector<IC::PropertyValue> otherSamples(bool readOnly = false)
 {
     using IC::PropertyValue;
@@ -39,14 +39,14 @@ inline std::vector<IC::PropertyValue> otherSamples(bool readOnly = false)
     };
 }
 
-// All that can be seen of a value: "2 writable: abc".
+// The kind, the mark and the text of a value: "2 writable: abc".
 inline std::string seen(const IC::PropertyValue& value)
 {
     return std::to_string(static_cast<unsigned int>(value.getKind()))
         + (value.readOnly() ? " read-only: " : " writable: ") + value.operator std::string();
 }
 
-// "1: 2 writable: abc; 7: 4 read-only: 5; "
+// The same for each property: "1: 2 writable: abc; 7: 4 read-only: 5; ".
 inline std::string seen(const std::map<unsigned int, IC::PropertyValue>& properties)
 {
     std::string all;

@@ -1,6 +1,6 @@
 #pragma once
 
-// The display names of the sensor types, by code; the last one belongs to no code.
+// The display names of the sensor types 0 to 73. The last entry stands for every larger type.
 constexpr const char* sensorNames[75] = {
     "Unknown",
     "Chassis",
