@@ -1,6 +1,4 @@
-#include <cstring>
 #include <cxxabi.h>
-#include <functional>
 
 #include <exception>
 #include <initializer_list>
@@ -17,7 +15,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
 #include "IC/Alert.h"
 #include "IC/EnumValue.h"
 #include "IC/Error.h"
@@ -27,6 +24,8 @@
 #include "IC/Property.h"
 #include "ZQ/DateTime.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
+#include "support/VirtualTable.h"
 
 namespace {
 
@@ -41,7 +40,7 @@ using IC::PropertyValue;
 using IC::PropertyValueInvalidKind;
 using testing::ElementsAre;
 
-// A root of its own.
+// ICException derives from nothing.
 static_assert(std::is_polymorphic_v<ICException>);
 static_assert(std::has_virtual_destructor_v<ICException>);
 static_assert(!std::is_base_of_v<std::exception, ICException>);
@@ -51,7 +50,7 @@ static_assert(std::is_copy_constructible_v<ICException>);
 static_assert(std::is_copy_assignable_v<ICException>);
 static_assert(std::is_same_v<decltype(std::declval<const ICException&>().what()), std::string>);
 
-// The two others have it for a base, and nobody outside may know. They are built from a message alone.
+// The two other classes derive from ICException, but not publicly. They are constructed from a message only.
 template <class Exception>
 constexpr bool hidesItsBase()
 {
@@ -85,7 +84,7 @@ void refuseNode()
     const Node node(74u);
 }
 
-// Names the handler that gets what the operation throws; the one for the root stands first.
+// The name of the handler that catches the operation's exception. The handler for ICException comes first.
 template <class Operation>
 std::string handlerOf(Operation operation)
 {
@@ -103,12 +102,12 @@ std::string handlerOf(Operation operation)
     return "none";
 }
 
-TEST(ExceptionClasses, ARootWithoutMessageIsEmpty)
+TEST(ExceptionClasses, ICExceptionWithoutAMessageHasAnEmptyText)
 {
     EXPECT_EQ(ICException().what(), "");
 }
 
-TEST(ExceptionClasses, GiveBackTheMessageThatTheyWereBuiltFrom)
+TEST(ExceptionClasses, WhatReturnsTheMessage)
 {
     const std::string message("two\0parts", 9);
     EXPECT_EQ(ICException(message).what(), message);
@@ -118,7 +117,7 @@ TEST(ExceptionClasses, GiveBackTheMessageThatTheyWereBuiltFrom)
     EXPECT_EQ(NodeInvalidSensor("").what(), "");
 }
 
-TEST(ExceptionClasses, GiveBackACopyOfTheMessage)
+TEST(ExceptionClasses, WhatReturnsACopy)
 {
     const PropertyValueInvalidKind exception("Invalid kind of property");
     std::string text = exception.what();
@@ -157,38 +156,38 @@ TEST(ExceptionClasses, CopiesKeepTheMessage)
     expectCopiesKeepTheMessage<NodeInvalidSensor>();
 }
 
-TEST(ExceptionClasses, TheRootLetsADerivedClassSayWhat)
+TEST(ExceptionClasses, DerivedClassesCanOverrideWhat)
 {
     struct Derived : ICException {
         std::string what() const override { return "derived: " + message; }
     };
     const Derived derived;
-    const ICException& root = derived;
-    EXPECT_EQ(root.what(), "derived: ");
+    const ICException& exception = derived;
+    EXPECT_EQ(exception.what(), "derived: ");
 }
 
-TEST(ExceptionClasses, AHandlerOfTheRootCatchesTheRootAlone)
+TEST(ExceptionClasses, AHandlerOfICExceptionCatchesOnlyICException)
 {
     EXPECT_EQ(handlerOf([] { throw ICException("message"); }), "ICException");
     EXPECT_EQ(handlerOf([] { throw PropertyValueInvalidKind("message"); }), "PropertyValueInvalidKind");
     EXPECT_EQ(handlerOf([] { throw NodeInvalidSensor("message"); }), "NodeInvalidSensor");
 }
 
-TEST(ExceptionClasses, AHandlerOfTheRootDoesNotCatchARefusalOfTheLibrary)
+TEST(ExceptionClasses, AHandlerOfICExceptionDoesNotCatchRefusals)
 {
     EXPECT_EQ(handlerOf(refuseProperty), "PropertyValueInvalidKind");
     EXPECT_EQ(handlerOf(refuseNode), "NodeInvalidSensor");
     EXPECT_EQ(handlerOf([] { return Number(kindCode(11)); }), "std::exception");
 }
 
-#ifdef __GLIBCXX__  // the other standard library does not declare what type information consists of
-TEST(ExceptionClasses, TheRootHasNoBaseInItsTypeInformation)
+#ifdef __GLIBCXX__  // libc++ does not declare these classes of type information
+TEST(ExceptionClasses, ICExceptionHasNoBaseClass)
 {
-    const std::type_info& root = typeid(ICException);
-    EXPECT_TRUE(typeid(root) == typeid(abi::__class_type_info));
+    const std::type_info& type = typeid(ICException);
+    EXPECT_TRUE(typeid(type) == typeid(abi::__class_type_info));
 }
 
-TEST(ExceptionClasses, TypeInformationRecordsOneBaseNeitherVirtualNorPublic)
+TEST(ExceptionClasses, TheOthersHaveOneBaseThatIsNeitherVirtualNorPublic)
 {
     for (const std::type_info* type : {&typeid(PropertyValueInvalidKind), &typeid(NodeInvalidSensor)}) {
         SCOPED_TRACE(type->name());
@@ -204,7 +203,12 @@ TEST(ExceptionClasses, TypeInformationRecordsOneBaseNeitherVirtualNorPublic)
 }
 #endif
 
-TEST(FailurePath, EachSourceFileHasItsFileNameAndCategory)
+TEST(ExceptionClasses, WhatFollowsTheTwoDestructorsInTheVirtualTable)
+{
+    EXPECT_EQ(slotOf(&ICException::what), 2);
+}
+
+TEST(FailurePath, EachSourceFileRecordsItsNameAndCategory)
 {
     expectRefusal<std::invalid_argument>([] { return Number(kindCode(11)); },  //
                                          "Number", "Number", "Vexilon.IC.Number",
@@ -228,7 +232,7 @@ TEST(FailurePath, EachSourceFileHasItsFileNameAndCategory)
                                      "74 is not a valid sensor. The largest possible sensor is 73");
 }
 
-// A refusal during static initialisation, before main: the categories have to be ready by then.
+// A refusal before main: the categories must be initialised before the program's own static objects.
 const std::string categoryBeforeMain = [] {
     try {
         const Number refused(kindCode(11));
@@ -239,7 +243,7 @@ const std::string categoryBeforeMain = [] {
     return std::string("no refusal");
 }();
 
-TEST(FailurePath, CategoriesAreReadyBeforeTheProgramsOwnObjects)
+TEST(FailurePath, CategoriesAreReadyDuringStaticInitialisation)
 {
     EXPECT_EQ(categoryBeforeMain, "Vexilon.IC.Number");
 }
@@ -273,7 +277,7 @@ TEST(FailurePath, UsesOneBufferForBothRecordsAndDestroysIt)
     EXPECT_FALSE(observe::thrown());
 }
 
-TEST(FailurePath, TheLineIsThatOfTheRefusal)
+TEST(FailurePath, RecordsTheLineOfTheRefusal)
 {
     Number number(3u);
     const auto refuseConstructor = [] {
@@ -300,8 +304,8 @@ TEST(FailurePath, TheLineIsThatOfTheRefusal)
     EXPECT_EQ(refuseInitKind(), initKindLine);
 }
 
-// Runs the operation, which has to be refused, with `change` made between the log record and the trace
-// record. Returns the texts of the records.
+// Runs the operation, which must be refused, and calls `change` between the log record and the trace record. Returns
+// the texts of the records.
 template <class Operation, class Change>
 std::vector<std::string> textsWithChangeBetween(Operation operation, Change change)
 {
@@ -322,7 +326,7 @@ std::vector<std::string> textsWithChangeBetween(Operation operation, Change chan
     return texts;
 }
 
-TEST(FailurePath, TheTraceRecordReadsACodeAfresh)
+TEST(FailurePath, TheTraceRecordReadsACodeAgain)
 {
     Number number(3u);
     unsigned char code = 11;
@@ -333,7 +337,7 @@ TEST(FailurePath, TheTraceRecordReadsACodeAfresh)
                 ElementsAre("Number: wrong kind of number: 12", "Number: wrong kind of number: 201"));
 }
 
-TEST(FailurePath, TheTraceRecordReadsAKindAfresh)
+TEST(FailurePath, TheTraceRecordReadsAKindAgain)
 {
     Number number(5);
     EXPECT_THAT(textsWithChangeBetween([&] { return static_cast<bool>(number); },
@@ -358,7 +362,7 @@ TEST(FailurePath, TheTraceRecordReadsAKindAfresh)
                             "PropertyValue::bool: can't return current value as a bool, kind=3"));
 }
 
-TEST(FailurePath, TheTraceRecordReadsAValueAfresh)
+TEST(FailurePath, TheTraceRecordReadsAValueAgain)
 {
     Number real(-1.0);
     EXPECT_THAT(
@@ -387,8 +391,8 @@ TEST(FailurePath, TheTraceRecordReadsAValueAfresh)
                 ElementsAre("Uint8: number out of range: 256", "Uint8: number out of range: 257"));
 }
 
-// A refusal and how many calls of the platform it makes: the buffer's constructor, then for each of the two
-// records the literal, perhaps a value, str and the logging call.
+// A refusal and its number of platform calls: the buffer's constructor, then for each of the two records the literal,
+// the value if there is one, str, and the logging call.
 const struct {
     const char* name;
     int calls;
@@ -414,7 +418,7 @@ const struct {
     {"Node: a code", 9, refuseNode},
 };
 
-TEST(FailurePath, WhatThePlatformThrowsReplacesTheExceptionAndNoBufferIsLeft)
+TEST(FailurePath, APlatformExceptionReplacesTheRefusalAndLeaksNothing)
 {
     for (const auto& row : refusals) {
         for (int nth = 1; nth <= row.calls; ++nth) {
@@ -426,13 +430,13 @@ TEST(FailurePath, WhatThePlatformThrowsReplacesTheExceptionAndNoBufferIsLeft)
             EXPECT_EQ(observe::buffersAlive(), 0);
             EXPECT_EQ(observe::dateTimesAlive(), 0);
             EXPECT_EQ(observe::locksHeld(), 0);
-            // The log record is complete after the call in the middle; the trace record is the last call.
+            // The call in the middle writes the log record, the last call the trace record.
             EXPECT_EQ(observe::records().size(), nth <= (row.calls + 1) / 2 ? 0u : 1u);
         }
     }
 }
 
-TEST(FailurePath, MakesNoOtherCallOfThePlatform)
+TEST(FailurePath, MakesNoOtherPlatformCall)
 {
     for (const auto& row : refusals) {
         SCOPED_TRACE(row.name);
@@ -475,7 +479,7 @@ TEST(FailurePath, EachStepOfThePlatformMayThrow)
     }
 }
 
-TEST(FailurePath, WhatALoggerThrowsReachesTheCaller)
+TEST(FailurePath, AnExceptionOfTheLoggerPropagates)
 {
     observe::onRecord([](const observe::Record&) { throw 42; });
     EXPECT_THROW(Number(kindCode(11)), int);
@@ -483,7 +487,22 @@ TEST(FailurePath, WhatALoggerThrowsReachesTheCaller)
     EXPECT_EQ(observe::buffersAlive(), 0);
 }
 
-TEST(FailurePath, WhereMemoryRunsOutBadAllocReplacesTheException)
+// Runs the operation, which is refused, with memory for `allowed` allocations. Returns false when it threw
+// std::bad_alloc instead of its own exception.
+template <class Operation>
+bool refusesWith(long allowed, Operation operation)
+{
+    return allocation::completesWith(allowed, [&] {
+        try {
+            operation();
+        } catch (const std::bad_alloc&) {
+            throw;
+        } catch (...) {
+        }
+    });
+}
+
+TEST(FailurePath, BadAllocReplacesTheRefusalWhenMemoryRunsOut)
 {
     for (const auto& row : refusals) {
         SCOPED_TRACE(row.name);
@@ -491,15 +510,7 @@ TEST(FailurePath, WhereMemoryRunsOutBadAllocReplacesTheException)
         for (long allowed = 0;; ++allowed) {
             ASSERT_LT(allowed, 1000);
             observe::reset();
-            const bool completed = allocation::completesWith(allowed, [&] {
-                try {
-                    row.operation();
-                } catch (const std::bad_alloc&) {
-                    throw;
-                } catch (...) {
-                    // The refusal itself: there was enough memory for all of it.
-                }
-            });
+            const bool completed = refusesWith(allowed, row.operation);
             EXPECT_EQ(observe::buffersAlive(), 0);
             EXPECT_EQ(observe::dateTimesAlive(), 0);
             if (completed)
@@ -540,26 +551,21 @@ TEST(FailurePath, AnyThreadMayRefuseAtAnyTime)
 
 TEST(FailurePath, TheExceptionIsBuiltAfterBothRecords)
 {
-    const std::pair<const char*, std::function<void()>> refusing[] = {
+    const struct {
+        const char* name;
+        void (*operation)();
+    } rows[] = {
         {"Number", [] { static_cast<void>(Number(Number::KIND_INT)); }},
-        {"PropertyValue", [] { static_cast<void>(PropertyValue(static_cast<unsigned char>(7))); }},
-        {"Node", [] { const Node node(74); }},
+        {"PropertyValue", refuseProperty},
+        {"Node", refuseNode},
     };
-    for (const auto& [name, refuse] : refusing) {
-        SCOPED_TRACE(name);
-        std::size_t records = 0;  // written when the last allocation failed
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.name);
+        std::size_t records = 0;  // those written before the last allocation failed
         for (long allowed = 0;; ++allowed) {
             ASSERT_LT(allowed, 1000);
             observe::reset();
-            const bool completed = allocation::completesWith(allowed, [&operation = refuse] {
-                try {
-                    operation();
-                } catch (const std::bad_alloc&) {
-                    throw;
-                } catch (...) {
-                }
-            });
-            if (completed)
+            if (refusesWith(allowed, row.operation))
                 break;
             records = observe::records().size();
         }
@@ -567,20 +573,11 @@ TEST(FailurePath, TheExceptionIsBuiltAfterBothRecords)
     }
 }
 
-// It is too long for a string's own buffer, so composing it needs memory.
-TEST(FailurePath, TheTextOfARefusedSensorIsNotComposedBeforeTheRecords)
+// The text does not fit into a string's internal buffer, so composing it allocates memory.
+TEST(FailurePath, ComposesTheTextOfARefusedSensorAfterTheRecords)
 {
     observe::throwAt(observe::Call::bufferConstructor, 1);
     EXPECT_EQ(allocation::countOf([] { EXPECT_THROW(refuseNode(), observe::Thrown); }), 0);
-}
-
-TEST(ExceptionClasses, WhatStandsAfterTheTwoDestructors)
-{
-    std::ptrdiff_t parts[2];
-    std::string (ICException::*what)() const = &ICException::what;
-    static_assert(sizeof parts == sizeof what);
-    std::memcpy(parts, &what, sizeof parts);
-    EXPECT_EQ(parts[0] / static_cast<std::ptrdiff_t>(sizeof(void*)), 2);
 }
 
 }  // namespace
