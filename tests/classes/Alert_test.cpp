@@ -9,11 +9,14 @@
 
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
-#include "support/GroupingLocale.h"
 #include "IC/Alert.h"
 #include "ZQ/DateTime.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
+#include "support/Byte.h"
+#include "support/DateTimes.h"
+#include "support/GroupingLocale.h"
+#include "support/Hexadecimal.h"
 
 namespace {
 
@@ -36,7 +39,7 @@ static_assert(std::is_convertible_v<const Alert&, Alert::ClassType>);
 static_assert(std::is_convertible_v<const Alert&, IC::Node::StatusType>);
 static_assert(std::is_convertible_v<const Alert&, std::string>);
 
-// An alert is checked once, when it is built.
+// Only the constructors check and set the codes.
 template <class T, class = void>
 constexpr bool offersInit = false;
 template <class T>
@@ -46,19 +49,13 @@ constexpr bool offersInit<T,
                               std::declval<unsigned char>(), Paths(), 0u, std::string()))>> = true;
 static_assert(!offersInit<Alert>);
 
-constexpr unsigned char byte(unsigned int code)
-{
-    return static_cast<unsigned char>(code);
-}
+constexpr DateTimeParts someTimeParts {1234567890, 250, 2};
 
 ZQ::DateTime someTime()
 {
-    ZQ::DateTime time(1234567890L, 2);
-    time.setMillisecond(250);
-    return time;
+    return dateTime(someTimeParts.seconds, someTimeParts.milliseconds, someTimeParts.scope);
 }
 
-// The text of someTime, and of what the observer's clock says when it is set to the same.
 const std::string someTimeText = "<1234567890.250/2>";
 
 Alert alertOf(unsigned int severity, unsigned int alertClass, unsigned int status,
@@ -68,7 +65,7 @@ Alert alertOf(unsigned int severity, unsigned int alertClass, unsigned int statu
     return Alert(time, byte(severity), byte(alertClass), paths, status, message);
 }
 
-// Both constructors refuse alike, and neither leaves a date-time behind.
+// Expects the same refusal of both constructors, and that no date-time outlives it.
 void expectRefused(unsigned int severity, unsigned int alertClass, unsigned int status,
                    const std::string& logged, const std::string& sentence)
 {
@@ -143,12 +140,12 @@ TEST(AlertStatus, IsRefusedAboveEightyFive)
 {
     for (unsigned int code = 86; code <= 256; ++code)
         expectRefused(0, 0, code, "init: Invalid status type " + std::to_string(code), "Invalid status type");
-    // None of these may be cut to a valid byte first.
+    // The low eight bits of the first three are valid codes.
     for (const unsigned int code : {341u, 65536u, 2147483648u, 4294967295u})
         expectRefused(0, 0, code, "init: Invalid status type " + std::to_string(code), "Invalid status type");
 }
 
-TEST(Alert, TakesTheLargestCodesTogether)
+TEST(Alert, AcceptsTheLargestCodesTogether)
 {
     const Alert alert = alertOf(3, 5, 85);
     EXPECT_EQ(alert.getSeverity(), 3);
@@ -156,7 +153,7 @@ TEST(Alert, TakesTheLargestCodesTogether)
     EXPECT_EQ(alert.getStatus(), 85u);
 }
 
-TEST(Alert, ReportsOnlyTheFirstOfSeveralBadCodes)
+TEST(Alert, ReportsOnlyTheFirstOfSeveralInvalidCodes)
 {
     expectRefused(9, 9, 99, "init: Invalid severity type 9", "Invalid severity type");
     expectRefused(9, 9, 0, "init: Invalid severity type 9", "Invalid severity type");
@@ -165,7 +162,7 @@ TEST(Alert, ReportsOnlyTheFirstOfSeveralBadCodes)
     expectRefused(3, 5, 99, "init: Invalid status type 99", "Invalid status type");
 }
 
-TEST(Alert, KeepsWhatItWasGiven)
+TEST(Alert, CopiesItsArguments)
 {
     ZQ::DateTime time = someTime();
     Paths paths = {"/b", "/a", "", "/b"};
@@ -174,9 +171,7 @@ TEST(Alert, KeepsWhatItWasGiven)
     time.setMillisecond(999);
     paths.clear();
     message.clear();
-    EXPECT_EQ(alert.getTimeStamp().operator long(), 1234567890L);
-    EXPECT_EQ(alert.getTimeStamp().getMillisecond(), 250u);
-    EXPECT_EQ(alert.getTimeStamp().getScope(), 2u);
+    EXPECT_EQ(partsOf(alert.getTimeStamp()), someTimeParts);
     EXPECT_EQ(alert.getSeverity(), 2);
     EXPECT_EQ(alert.getClass(), 1);
     EXPECT_EQ(alert.getStatus(), 5u);
@@ -193,16 +188,14 @@ TEST(Alert, KeepsEveryByteOfMessageAndPaths)
     EXPECT_EQ(alert.getNodePaths(), paths);
 }
 
-TEST(Alert, LeavesTheCallersTimeStampAlone)
+TEST(Alert, DoesNotChangeTheCallersTimeStamp)
 {
     ZQ::DateTime time = someTime();
     const Alert alert(time, 0, 0, {}, 0, "");
-    EXPECT_EQ(time.operator long(), 1234567890L);
-    EXPECT_EQ(time.getMillisecond(), 250u);
-    EXPECT_EQ(time.getScope(), 2u);
+    EXPECT_EQ(partsOf(time), someTimeParts);
 }
 
-TEST(Alert, HandsOutCopies)
+TEST(Alert, ReturnsCopies)
 {
     const Alert alert = alertOf(0, 0, 0, "a message", {"/a"});
     alert.getTimeStamp().setMillisecond(999);
@@ -231,7 +224,7 @@ TEST(Alert, IsCopiedDeeply)
     EXPECT_EQ(observe::dateTimesAlive(), alive);
 }
 
-TEST(Alert, AssignedWhereMemoryRunsOutWasAMixtureOfTwoAlerts)
+TEST(Alert, AssignmentKeepsTheOldAlertWhenMemoryRunsOut)
 {
     const Alert source = alertOf(3, 5, 85, "a message that needs memory of its own",
                                  {"/a/path/that/needs/memory/of/its/own", "/b"});
@@ -249,7 +242,25 @@ TEST(Alert, AssignedWhereMemoryRunsOutWasAMixtureOfTwoAlerts)
     }
 }
 
-TEST(AlertClock, IsNotReadForACallersTimeStamp)
+TEST(Alert, GivesBackAllMemoryWhenItRunsOut)
+{
+    const Paths paths = {"/a/path/that/needs/memory/of/its/own", "/b"};
+    const std::string message = "a message that needs memory of its own";
+    ZQ::DateTime time = someTime();
+    const int alive = observe::dateTimesAlive();
+    for (const bool stamped : {false, true}) {
+        SCOPED_TRACE(stamped ? "with the caller's time stamp" : "with the clock's");
+        allocation::expectAllMemoryGivenBack([&] {
+            if (stamped)
+                Alert(time, 2, 1, paths, 5, message);
+            else
+                Alert(2, 1, paths, 5, message);
+        });
+        EXPECT_EQ(observe::dateTimesAlive(), alive);
+    }
+}
+
+TEST(AlertClock, IsNotReadWhenTheCallerGivesATimeStamp)
 {
     alertOf(0, 0, 0);
     EXPECT_EQ(observe::clockReadings(), 0);
@@ -260,9 +271,7 @@ TEST(AlertClock, GivesTheTimeStampUnchanged)
     observe::setClock(1234567890L, 123);
     const Alert alert(2, 1, {"/a"}, 5, "Fan failed");
     EXPECT_EQ(observe::clockReadings(), 1);
-    EXPECT_EQ(alert.getTimeStamp().operator long(), 1234567890L);
-    EXPECT_EQ(alert.getTimeStamp().getMillisecond(), 123u);
-    EXPECT_EQ(alert.getTimeStamp().getScope(), 3u);
+    EXPECT_EQ(partsOf(alert.getTimeStamp()), (DateTimeParts {1234567890, 123, 3}));
     EXPECT_EQ(alert.operator std::string(), "Alert 2; 1; 5; Fan failed; <1234567890.123/3>; { 2f61 }");
     EXPECT_EQ(observe::clockReadings(), 1);
 }
@@ -288,14 +297,14 @@ TEST(AlertClock, IsReadBeforeTheCodesAreChecked)
     EXPECT_EQ(readings, (std::vector<int> {1, 1, 2, 2, 3, 3}));
 }
 
-TEST(AlertClock, FailurePassesThroughBeforeAnyCheck)
+TEST(AlertClock, ExceptionPropagatesBeforeAnyCheck)
 {
     observe::throwAt(observe::Call::now, 1);
     EXPECT_THROW(Alert(9, 9, {}, 99, ""), observe::Thrown);
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(AlertText, HasEveryPart)
+TEST(AlertText, ListsEveryPart)
 {
     const struct {
         Alert alert;
@@ -323,7 +332,7 @@ TEST(AlertText, HasEveryPart)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(AlertText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
+TEST(AlertText, FollowsTheGlobalLocaleLikeANewStream)
 {
     const Alert alert = alertOf(3, 5, 85, "1234567", {"1234"});
     {
@@ -334,7 +343,7 @@ TEST(AlertText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
     EXPECT_EQ(alert.operator std::string(), "Alert 3; 5; 85; 1234567; " + someTimeText + "; { 31323334 }");
 }
 
-TEST(AlertText, PassesAFailureOfTheTimeStampOn)
+TEST(AlertText, PropagatesAnExceptionOfTheTimeStamp)
 {
     const Alert alert = alertOf(0, 0, 0);
     observe::throwAt(observe::Call::dateTimeText, 1);
@@ -342,14 +351,14 @@ TEST(AlertText, PassesAFailureOfTheTimeStampOn)
     EXPECT_TRUE(observe::thrown());
 }
 
-TEST(AlertText, IsWholeOrNotAtAllWhenMemoryRunsOut)
+TEST(AlertText, IsCompleteOrThrowsWhenMemoryRunsOut)
 {
     const Alert alert = alertOf(3, 5, 85, "a message that needs memory of its own", {"/a/longer/path", "/b"});
     const std::string paths = "; { 2f612f6c6f6e6765722f70617468 2f62 }";
-    allocation::expectTextWholeOrNotAtAll(
+    allocation::expectTextCompleteOrThrows(
         alert, "Alert 3; 5; 85; a message that needs memory of its own; " + someTimeText + paths);
     const GlobalGroupingLocale grouping(1);
-    allocation::expectTextWholeOrNotAtAll(
+    allocation::expectTextCompleteOrThrows(
         alert,
         "Alert 3; 5; 8,5; a message that needs memory of its own; <1,2,3,4,5,6,7,8,9,0.2,5,0/2>" + paths);
 }
@@ -370,38 +379,16 @@ TEST(AlertStream, InsertsTheAlertAsOneText)
 TEST(AlertHexstring, HasTwoLowerCaseDigitsForEachByte)
 {
     const Alert alert = alertOf(0, 0, 0);
-    const struct {
-        std::string text;
-        const char* digits;
-    } rows[] = {{"", ""},
-                {"/a", "2f61"},
-                {"\xff", "ff"},
-                {"\x80\x7f", "807f"},
-                {std::string("a\0b", 3), "610062"},
-                {std::string("\0", 1), "00"},
-                {"\x09\x0a\x90\xa0", "090a90a0"},
-                {";{} ", "3b7b7d20"}};
-    for (const auto& row : rows)
-        EXPECT_EQ(alert.hexstring(row.text), row.digits);
-    const GlobalGroupingLocale grouping(1);
-    for (const auto& row : rows)
-        EXPECT_EQ(alert.hexstring(row.text), row.digits);
+    expectTwoLowerCaseDigitsForEachByte([&](const std::string& bytes) { return alert.hexstring(bytes); });
 }
 
-TEST(AlertHexstring, NamesEveryByte)
+TEST(AlertHexstring, ConvertsAllBytes)
 {
-    const std::string digits = "0123456789abcdef";
-    std::string all;
-    std::string expected;
-    for (unsigned int code = 0; code < 256; ++code) {
-        all += static_cast<char>(code);
-        expected += digits[code / 16];
-        expected += digits[code % 16];
-    }
-    EXPECT_EQ(alertOf(0, 0, 0).hexstring(all), expected);
+    const Alert alert = alertOf(0, 0, 0);
+    expectTwoLowerCaseDigitsForAllBytes([&](const std::string& bytes) { return alert.hexstring(bytes); });
 }
 
-TEST(AlertHexstring, MayBeCalledBySeveralThreads)
+TEST(AlertHexstring, CanBeCalledBySeveralThreads)
 {
     const Alert alert = alertOf(0, 0, 0);
     std::string texts[4];
@@ -412,31 +399,6 @@ TEST(AlertHexstring, MayBeCalledBySeveralThreads)
         thread.join();
     for (const std::string& text : texts)
         EXPECT_EQ(text, "01ef");
-}
-
-TEST(Alert, GivesBackAllMemoryWhenItRunsOut)
-{
-    const Paths paths = {"/a/path/that/needs/memory/of/its/own", "/b"};
-    const std::string message = "a message that needs memory of its own";
-    ZQ::DateTime time = someTime();
-    const int alive = observe::dateTimesAlive();
-    for (const bool stamped : {false, true}) {
-        SCOPED_TRACE(stamped);
-        const auto construct = [&] {
-            if (stamped)
-                Alert(time, 2, 1, paths, 5, message);
-            else
-                Alert(2, 1, paths, 5, message);
-        };
-        const long before = allocation::aliveNow;
-        long allowed = 0;
-        while (!allocation::completesWith(allowed, construct) && allowed < 100)
-            ++allowed;
-        EXPECT_EQ(allocation::aliveNow, before);
-        EXPECT_GT(allowed, 0);
-        EXPECT_LT(allowed, 100);
-        EXPECT_EQ(observe::dateTimesAlive(), alive);
-    }
 }
 
 }  // namespace

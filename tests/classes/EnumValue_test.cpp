@@ -9,9 +9,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "support/GroupingLocale.h"
 #include "IC/EnumValue.h"
 #include "observe/Refusal.h"
+#include "support/GroupingLocale.h"
 
 namespace {
 
@@ -56,7 +56,7 @@ TEST(EnumValueConstruction, TheDefaultIsZeroAtEveryWidth)
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-TEST(EnumValueConstruction, EveryByteIsWidenedWithoutItsSign)
+TEST(EnumValueConstruction, EveryByteIsUnsigned)
 {
     for (unsigned int number = 0; number <= 0xFF; ++number) {
         SCOPED_TRACE(number);
@@ -66,7 +66,7 @@ TEST(EnumValueConstruction, EveryByteIsWidenedWithoutItsSign)
     }
 }
 
-TEST(EnumValueConstruction, SixteenBitsAreWidenedWithoutTheirSign)
+TEST(EnumValueConstruction, SixteenBitsAreUnsigned)
 {
     for (const unsigned int number : {0u, 255u, 256u, 32767u, 32768u, 65535u}) {
         SCOPED_TRACE(number);
@@ -92,7 +92,7 @@ TEST(EnumValueConstruction, ACopyHasTheValue)
     EXPECT_EQ(to<unsigned int>(assigned), 7u);
 }
 
-TEST(EnumValueConversion, TakesWhatTheWidthHolds)
+TEST(EnumValueConversion, AcceptsValuesThatFit)
 {
     for (unsigned int number = 0; number <= 0xFFFF; ++number) {
         const EnumValue value(number);
@@ -104,7 +104,7 @@ TEST(EnumValueConversion, TakesWhatTheWidthHolds)
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-TEST(EnumValueConversion, RefusesMoreThanSixteenBits)
+TEST(EnumValueConversion, To16BitsRefusesLargerValues)
 {
     const struct {
         unsigned int number;
@@ -122,7 +122,7 @@ TEST(EnumValueConversion, RefusesMoreThanSixteenBits)
     }
 }
 
-TEST(EnumValueConversion, RefusesMoreThanEightBits)
+TEST(EnumValueConversion, To8BitsRefusesLargerValues)
 {
     const struct {
         unsigned int number;
@@ -141,7 +141,7 @@ TEST(EnumValueConversion, RefusesMoreThanEightBits)
     }
 }
 
-TEST(EnumValueComparison, IsThatOfUnsignedNumbers)
+TEST(EnumValueComparison, ComparesUnsignedNumbers)
 {
     const unsigned int rising[] = {0, 1, 255, 256, 65535, 65536, 2147483647, 2147483648, largest};
     for (const unsigned int left : rising) {
@@ -162,7 +162,7 @@ TEST(EnumValueComparison, IsThatOfUnsignedNumbers)
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-TEST(EnumValueComparison, DoesNotKnowTheWidthThatAValueWasMadeOf)
+TEST(EnumValueComparison, IgnoresTheWidthOfTheConstructorsArgument)
 {
     EXPECT_TRUE(EnumValue(static_cast<unsigned char>(255)) == EnumValue(255u));
     EXPECT_TRUE(EnumValue(static_cast<unsigned short>(255)) == EnumValue(static_cast<unsigned char>(255)));
@@ -186,7 +186,7 @@ TEST(EnumValueText, IsTheDecimalDigits)
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-TEST(EnumValueText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
+TEST(EnumValueText, FollowsTheGlobalLocaleLikeANewStream)
 {
     for (const auto& row : textRows) {
         for (const char digitsPerGroup : {char {1}, char {3}}) {

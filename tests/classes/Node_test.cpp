@@ -866,7 +866,7 @@ TEST(NodeText, IsWholeOrNotAtAllWhenMemoryRunsOut)
     Probe node(20, "/a/longer/path");
     node.status = static_cast<Node::StatusType>(1234567);
     makeRoomForLockCalls(node);
-    allocation::expectTextWholeOrNotAtAll(node, "Node 2f612f6c6f6e6765722f70617468 : 20, status = 1234567");
+    allocation::expectTextCompleteOrThrows(node, "Node 2f612f6c6f6e6765722f70617468 : 20, status = 1234567");
 }
 
 TEST(NodeText, IsMadeWithoutTheLock)

@@ -1670,11 +1670,11 @@ TEST(NumberText, OfANodeReferenceHasTheNameOfItsType)
 
 TEST(NumberText, IsWholeOrNotAtAllWhereMemoryRunsOut)
 {
-    allocation::expectTextWholeOrNotAtAll(Number(18446744073709551615ull), "18446744073709551615");
-    allocation::expectTextWholeOrNotAtAll(Number(sNodeRef {25, 4294967295}), "Power Supply:4294967295");
-    allocation::expectTextWholeOrNotAtAll(Number(longLargest, 0),
+    allocation::expectTextCompleteOrThrows(Number(18446744073709551615ull), "18446744073709551615");
+    allocation::expectTextCompleteOrThrows(Number(sNodeRef {25, 4294967295}), "Power Supply:4294967295");
+    allocation::expectTextCompleteOrThrows(Number(longLargest, 0),
                                           longHas64Bits ? "9223372036854775807/3" : "2147483647/3");
-    allocation::expectTextWholeOrNotAtAll(Number(longLargest, 1),
+    allocation::expectTextCompleteOrThrows(Number(longLargest, 1),
                                           longHas64Bits
                                               ? "9223372036854775807/3.Conversion failed remainder>0"
                                               : "2147483647/3.Conversion failed remainder>0");
@@ -1744,8 +1744,8 @@ TEST(NumberText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
 TEST(NumberText, IsWholeOrNotAtAllWhereMemoryRunsOutAlsoUnderAnotherLocale)
 {
     const GlobalLocale locale(decimalComma());
-    allocation::expectTextWholeOrNotAtAll(Number(18446744073709551615ull), "18.446.744.073.709.551.615");
-    allocation::expectTextWholeOrNotAtAll(Number(sNodeRef {25, 4294967295}), "Power Supply:4.294.967.295");
+    allocation::expectTextCompleteOrThrows(Number(18446744073709551615ull), "18.446.744.073.709.551.615");
+    allocation::expectTextCompleteOrThrows(Number(sNodeRef {25, 4294967295}), "Power Supply:4.294.967.295");
 }
 
 TEST(NumberText, IsThatOfAFreshStreamUnderEveryLocale)

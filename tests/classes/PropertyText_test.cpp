@@ -487,7 +487,7 @@ TEST(PropertyText, IsWholeOrNotAtAllWhenMemoryRunsOut)
               numbers(NumberArray(40, Number(123456u))), number(Number(IC::sNodeRef {29, 4294967295u}))}) {
             const std::string whole = value;
             SCOPED_TRACE(whole);
-            allocation::expectTextWholeOrNotAtAll(value, whole);
+            allocation::expectTextCompleteOrThrows(value, whole);
         }
     };
     check();

@@ -83,7 +83,7 @@ long expectAllMemoryGivenBack(Operation operation)
 // Expects, for every amount of memory, that the text form is complete or throws std::bad_alloc, and that a stream
 // receives the complete text or becomes bad.
 template <class Value>
-void expectTextWholeOrNotAtAll(const Value& value, const std::string& whole)
+void expectTextCompleteOrThrows(const Value& value, const std::string& whole)
 {
     long allowed = 0;
     std::string text;
