@@ -11,13 +11,14 @@
 
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
 #include "IC/EnumValue.h"
 #include "IC/ICException.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "support/PropertySamples.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
+#include "support/DateTimes.h"
+#include "support/PropertySamples.h"
 
 namespace {
 
@@ -44,25 +45,18 @@ Number readAs(Number::KindType kind, Number number)
     return number;
 }
 
-// A kind that a refused initKind left behind.
+// The number after a refused initKind, which stores the kind all the same.
 Number ofRefusedKind(unsigned int kind, Number number)
 {
     EXPECT_THROW(number.initKind(static_cast<Number::KindType>(kind)), std::invalid_argument);
     return number;
 }
 
-// A kind whose object a refused setKind has cost.
+// The value after a refused setKind, which destroys the value's object.
 PropertyValue withoutObject(PropertyValue value)
 {
     EXPECT_THROW(value.setKind(7), IC::PropertyValueInvalidKind);
     return value;
-}
-
-Number dateTime(long seconds, unsigned int milliseconds, unsigned int scope)
-{
-    ZQ::DateTime time(seconds, scope);
-    time.setMillisecond(milliseconds);
-    return time;
 }
 
 IC::Buffer bytesOf(const std::string& text)
@@ -76,7 +70,7 @@ IC::Buffer bytesOf(const std::string& text)
 constexpr unsigned int largestUint32 = std::numeric_limits<unsigned int>::max();
 constexpr unsigned long long largestUint64 = std::numeric_limits<unsigned long long>::max();
 
-// Every kind at its limits and with every oddity. Bytes that a kind does not use differ among equal numbers.
+// Numbers of every kind: limits and special values, and equal numbers that differ in bytes that their kind ignores.
 std::vector<Number> manyNumbers()
 {
     using Limits = std::numeric_limits<double>;
@@ -110,7 +104,7 @@ std::vector<Number> manyNumbers()
         for (const unsigned short milliseconds : std::vector<unsigned short> {0, 1, 999, 65535})
             numbers.emplace_back(seconds, milliseconds);
     for (const unsigned int scope : {0u, 1u, 2u, 3u, 255u})
-        numbers.push_back(dateTime(1234567890, 999, scope));
+        numbers.emplace_back(dateTime(1234567890, 999, scope));
     for (const IC::sNodeRef nodeRef :
          std::vector<IC::sNodeRef> {{0, 0}, {4, 7}, {7, 4}, {largestUint32, largestUint32}})
         numbers.emplace_back(nodeRef);
@@ -128,7 +122,7 @@ std::vector<EnumValue> manyEnumValues()
     return values;
 }
 
-// Of every kind, each with both marks.
+// Values of every kind, writable and read-only, with and without their object.
 std::vector<PropertyValue> manyValues()
 {
     std::vector<PropertyValue> values;
@@ -165,7 +159,7 @@ std::vector<PropertyValue> manyValues()
     return values;
 }
 
-// How many pairs of two places are equal; each of these must have one hash.
+// Counts the pairs of equal values and expects that the two have the same hash.
 template <class Value>
 std::size_t equalPairs(const std::vector<Value>& values)
 {
@@ -185,7 +179,7 @@ std::size_t equalPairs(const std::vector<Value>& values)
     return count;
 }
 
-// How many hashes these values have, of which no two are equal.
+// The number of different hashes among values of which no two are equal.
 template <class Value>
 std::size_t hashesOf(const std::vector<Value>& values)
 {
@@ -195,7 +189,7 @@ std::size_t hashesOf(const std::vector<Value>& values)
     return hashes.size();
 }
 
-// All but one in a hundred have a hash of their own, as a number and as a value.
+// Expects that at least 99 % of the hashes are different, for the numbers and for properties that hold them.
 void expectSpread(const std::vector<Number>& numbers)
 {
     const std::vector<PropertyValue> values(numbers.begin(), numbers.end());
@@ -209,37 +203,36 @@ void expectSpread(const std::vector<PropertyValue>& values)
 
 }  // namespace
 
-TEST(Hash, OfEqualNumbersIsEqual)
+TEST(Hash, IsEqualForEqualNumbers)
 {
     EXPECT_GE(equalPairs(manyNumbers()), 100u);
 }
 
-TEST(Hash, OfEqualEnumValuesIsEqual)
+TEST(Hash, IsEqualForEqualEnumValues)
 {
     EXPECT_GE(equalPairs(manyEnumValues()), 8u);
 }
 
-TEST(Hash, OfEqualValuesIsEqual)
+TEST(Hash, IsEqualForEqualProperties)
 {
     const std::vector<PropertyValue> values = manyValues();
     EXPECT_GE(values.size(), 500u);
     EXPECT_GE(equalPairs(values), 400u);
 }
 
-// What == does not look at.
-TEST(Hash, LeavesOutWhatEqualityLeavesOut)
+TEST(Hash, IgnoresWhatEqualityIgnores)
 {
     EXPECT_EQ(hashOf(Number(1)), hashOf(Number(2)));
     EXPECT_EQ(hashOf(Number(IC::sNodeRef {4, 7})), hashOf(Number(IC::sNodeRef {5, 8})));
     EXPECT_EQ(hashOf(Number(0.0)), hashOf(Number(-0.0)));
-    EXPECT_EQ(hashOf(dateTime(1234567890, 250, 1)), hashOf(dateTime(1234567890, 250, 2)));
+    EXPECT_EQ(hashOf(Number(dateTime(1234567890, 250, 1))), hashOf(Number(dateTime(1234567890, 250, 2))));
     EXPECT_EQ(hashOf(PropertyValue("text", true)), hashOf(PropertyValue("text", false)));
     EXPECT_EQ(hashOf(PropertyValue(IC::NumberArray {1, 0.0})),
               hashOf(PropertyValue(IC::NumberArray {2, -0.0})));
 }
 
-// A NaN is equal to nothing, itself included: it can be kept, and not be found again.
-TEST(Hash, OfANanIsThatOfItsBytes)
+// A NaN equals nothing, not even itself: a set stores it, but does not find it again.
+TEST(Hash, OfANaNDependsOnItsBytes)
 {
     const Number nan(std::numeric_limits<double>::quiet_NaN());
     EXPECT_EQ(hashOf(nan), hashOf(Number(nan)));
@@ -249,7 +242,7 @@ TEST(Hash, OfANanIsThatOfItsBytes)
     EXPECT_EQ(set.size(), 2u);
 }
 
-TEST(Hash, OfAMovedFromValueIsThatOfNothing)
+TEST(Hash, OfAMovedFromPropertyIsThatOfKindUnknown)
 {
     PropertyValue value("a text that needs memory of its own");
     const PropertyValue taken(std::move(value));
@@ -257,7 +250,7 @@ TEST(Hash, OfAMovedFromValueIsThatOfNothing)
     EXPECT_NE(hashOf(value), hashOf(taken));
 }
 
-TEST(Hash, NeedsNoMemoryAndWritesNoRecord)
+TEST(Hash, AllocatesNothingAndWritesNoRecord)
 {
     const std::vector<PropertyValue> values = manyValues();
     const std::size_t records = observe::records().size();
@@ -271,7 +264,7 @@ TEST(Hash, NeedsNoMemoryAndWritesNoRecord)
     EXPECT_EQ(observe::records().size(), records);
 }
 
-TEST(Hash, TellsKindsApart)
+TEST(Hash, DiffersBetweenKinds)
 {
     const std::vector<Number> numbers = {Number::KIND_UNKNOWN,
                                          false,
@@ -329,7 +322,7 @@ TEST(Hash, SpreadsNumbersOfOneKind)
     expectSpread(dateTimes);
 }
 
-TEST(Hash, SpreadsValuesOfOneKind)
+TEST(Hash, SpreadsPropertiesOfOneKind)
 {
     std::vector<PropertyValue> texts;
     std::vector<PropertyValue> buffers;
@@ -348,7 +341,7 @@ TEST(Hash, SpreadsValuesOfOneKind)
         expectSpread(values);
 }
 
-// So many elements of one value alone.
+// Arrays of equal elements differ in their length only.
 TEST(Hash, SpreadsArraysByTheirLength)
 {
     std::vector<PropertyValue> arrays;
@@ -366,7 +359,7 @@ TEST(Hash, OfAnEnumValueIsThatOfItsNumber)
     EXPECT_EQ(hashOf(EnumValue(static_cast<unsigned char>(7))), hashOf(EnumValue(7u)));
 }
 
-TEST(Hash, MakesKeysOfNumbers)
+TEST(Hash, AllowsNumbersAsKeys)
 {
     std::unordered_map<Number, std::string> names = {
         {0.0, "zero"}, {7, "signed"}, {IC::Version2 {2, 15}, "version"}};
@@ -379,7 +372,7 @@ TEST(Hash, MakesKeysOfNumbers)
     EXPECT_EQ(names.size(), 4u);
 }
 
-TEST(Hash, MakesKeysOfEnumValues)
+TEST(Hash, AllowsEnumValuesAsKeys)
 {
     std::unordered_set<EnumValue> states;
     for (unsigned int i = 0; i < 1000; ++i)
@@ -389,7 +382,7 @@ TEST(Hash, MakesKeysOfEnumValues)
     EXPECT_EQ(states.count(EnumValue(10u)), 0u);
 }
 
-TEST(Hash, MakesKeysOfValues)
+TEST(Hash, AllowsPropertiesAsKeys)
 {
     std::unordered_map<PropertyValue, std::size_t> places;
     const std::vector<PropertyValue> values = samples();
