@@ -1,4 +1,4 @@
-// The stand-ins for the agent's two platform libraries.
+// Tests of the stand-ins for the agent's two platform libraries.
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -17,14 +17,15 @@
 #include <type_traits>
 #include <vector>
 
-#include "support/AllocationFailure.h"
-#include "support/GroupingLocale.h"
 #include "VXLog/RecordSink.h"
 #include "VXLog/VXLogger.h"
 #include "VXLog/VXMessageBuffer.h"
 #include "ZQ/DateTime.h"
 #include "ZQ/Mutex.h"
 #include "ZQ/Types.h"
+#include "support/AllocationFailure.h"
+#include "support/DateTimes.h"
+#include "support/GroupingLocale.h"
 
 namespace {
 
@@ -34,9 +35,9 @@ static_assert(std::is_same_v<ZQ::Uint32, unsigned int>);
 static_assert(std::is_same_v<ZQ::Uint64, unsigned long long>);
 static_assert(std::is_same_v<ZQ::Real64, double>);
 
-static_assert(!std::is_copy_constructible_v<VXLog::Record>);  // it refers to texts that soon are gone
+static_assert(!std::is_copy_constructible_v<VXLog::Record>);  // it refers to texts of the caller
 
-// An environment variable, taken away at the end.
+// Sets an environment variable for the lifetime of the object.
 class Environment {
 public:
     Environment(const char* name, const char* value) : name_(name) { setenv(name, value, 1); }
@@ -48,7 +49,7 @@ private:
     const char* name_;
 };
 
-// Whether this machine's date-time holds so many seconds: a long of 32 bits ends in January 2038.
+// Whether a date-time can hold so many seconds: with a 32-bit long, it ends in January 2038.
 constexpr bool isHeld(long long seconds)
 {
     return static_cast<long>(seconds) == seconds;
@@ -56,12 +57,10 @@ constexpr bool isHeld(long long seconds)
 
 std::string textOf(long long seconds, unsigned int milliseconds)
 {
-    ZQ::DateTime time(static_cast<long>(seconds), 3);
-    time.setMillisecond(milliseconds);
-    return time;
+    return dateTime(static_cast<long>(seconds), milliseconds, 3);
 }
 
-TEST(DateTime, CarriesSecondsMillisecondsAndScopeAsTheyAre)
+TEST(DateTime, KeepsSecondsMillisecondsAndScopeUnchanged)
 {
     for (const long seconds : {0L, -1L, 1234567890L, std::numeric_limits<long>::min()}) {
         for (const unsigned int scope : {0u, 1u, 2u, 3u, 4u, 4294967295u}) {
@@ -71,19 +70,14 @@ TEST(DateTime, CarriesSecondsMillisecondsAndScopeAsTheyAre)
             const ZQ::DateTime copy(time);
             ZQ::DateTime assigned;
             assigned = copy;
-            EXPECT_EQ(static_cast<long>(assigned), seconds);
-            EXPECT_EQ(assigned.getScope(), scope);
-            EXPECT_EQ(assigned.getMillisecond(), 65535u);
+            EXPECT_EQ(partsOf(assigned), (DateTimeParts {seconds, 65535, scope}));
         }
     }
 }
 
-TEST(DateTime, IsTheEpochOfScope3WithoutArguments)
+TEST(DateTime, DefaultsToTheEpochWithScope3)
 {
-    const ZQ::DateTime time;
-    EXPECT_EQ(static_cast<long>(time), 0);
-    EXPECT_EQ(time.getMillisecond(), 0u);
-    EXPECT_EQ(time.getScope(), 3u);
+    EXPECT_EQ(partsOf(ZQ::DateTime()), (DateTimeParts {0, 0, 3}));
 }
 
 TEST(DateTime, NowIsTheSystemClockInMillisecondsWithScope3)
@@ -145,8 +139,8 @@ TEST(DateTimeText, IsIso8601InUtc)
     }
 }
 
-// A long of 32 bits holds none of them.
-TEST(DateTimeText, IsTheSecondsWhereNoYearOfFourDigitsHoldsThem)
+// A 32-bit long can hold none of these rows.
+TEST(DateTimeText, IsTheSecondsOutsideTheYears0To9999)
 {
     const struct {
         long long seconds;
@@ -163,6 +157,14 @@ TEST(DateTimeText, IsTheSecondsWhereNoYearOfFourDigitsHoldsThem)
         if (isHeld(row.seconds)) {
             EXPECT_EQ(textOf(row.seconds, row.milliseconds), row.text);
         }
+    }
+}
+
+TEST(DateTimeText, HasEveryMillisecond)
+{
+    for (unsigned int millisecond = 1; millisecond <= 999; ++millisecond) {
+        const std::string digits = std::to_string(1000 + millisecond).substr(1);
+        ASSERT_EQ(textOf(0, millisecond), "1970-01-01T00:00:00." + digits + "Z");
     }
 }
 
@@ -201,7 +203,7 @@ TEST(DateTimeText, IsInsertedIntoAStreamAsOneText)
     EXPECT_EQ(out.str(), "**2009-02-13T23:31:30Z");
 }
 
-TEST(Mutex, IsReEntrantAndHeldUntilUnlockedAsOften)
+TEST(Mutex, IsRecursiveAndHeldUntilTheLastUnlock)
 {
     ZQ::Mutex mutex;
     const auto freeForAnother = [&mutex] {
@@ -225,7 +227,7 @@ TEST(Mutex, GivesUpAfterTheTimeOut)
 {
     ZQ::Mutex mutex;
     ASSERT_TRUE(mutex.lock(0xFFFFFFFF));
-#ifndef __SANITIZE_THREAD__  // ThreadSanitizer does not see a lock with a time-out, only its unlock
+#ifndef __SANITIZE_THREAD__  // ThreadSanitizer sees the unlock, but not the lock with a time-out
     ASSERT_TRUE(mutex.lock(10));
     mutex.unlock();
 #endif
@@ -253,7 +255,7 @@ TEST(Mutex, WaitsForEverWith0xFFFFFFFF)
     waiting.join();
 }
 
-TEST(MessageBuffer, GivesEachStrTheTextSinceTheOneBefore)
+TEST(MessageBuffer, StrReturnsTheTextSinceTheLastStr)
 {
     VXLog::VXMessageBuffer buffer;
     EXPECT_EQ(buffer.str(buffer << "only a literal"), "only a literal");
@@ -263,14 +265,14 @@ TEST(MessageBuffer, GivesEachStrTheTextSinceTheOneBefore)
     EXPECT_EQ(buffer.str(buffer), "");
 }
 
-TEST(MessageBuffer, WritesNumbersPlainWhateverTheLocale)
+TEST(MessageBuffer, IgnoresTheGlobalLocale)
 {
     const GlobalGroupingLocale grouping;
     VXLog::VXMessageBuffer buffer;
     EXPECT_EQ(buffer.str(buffer << "" << 1234567u << " " << 1.5), "1234567 1.5");
 }
 
-TEST(MessageBuffer, BeginsAnewWhateverWasDoneToTheStreamOfTheOneBefore)
+TEST(MessageBuffer, StartsWithDefaultSettingsAfterABufferThatChangedThem)
 {
     {
         VXLog::VXMessageBuffer buffer;
@@ -284,7 +286,7 @@ TEST(MessageBuffer, BeginsAnewWhateverWasDoneToTheStreamOfTheOneBefore)
               "1234567 1234567 0.123456");
 }
 
-TEST(MessageBuffer, MayBeComposedWhileAnotherIs)
+TEST(MessageBuffer, MayBeUsedWhileAnotherIsInUse)
 {
     VXLog::VXMessageBuffer outer;
     std::ostream& last = outer << "outer " << 1u;
@@ -295,7 +297,7 @@ TEST(MessageBuffer, MayBeComposedWhileAnotherIs)
     EXPECT_EQ(outer.str(last << " still"), "outer 1 still");
 }
 
-TEST(MessageBuffer, MayEndOnAnotherThread)
+TEST(MessageBuffer, MayBeDestroyedOrConstructedOnAnotherThread)
 {
     auto buffer = std::make_unique<VXLog::VXMessageBuffer>();
     EXPECT_EQ(buffer->str(*buffer << "made here"), "made here");
@@ -304,31 +306,50 @@ TEST(MessageBuffer, MayEndOnAnotherThread)
     EXPECT_EQ(buffer->str(*buffer << "made there"), "made there");
 }
 
-// One that is used before and after the thread's own composer is gone.
+// std::exit destroys it after the thread-local objects of the main thread.
 VXLog::VXMessageBuffer& globalBuffer()
 {
     static VXLog::VXMessageBuffer buffer;
     return buffer;
 }
 
-TEST(MessageBuffer, MayOutliveItsThread)
+TEST(MessageBuffer, AStaticBufferMayBeDestroyedAtExit)
 {
     EXPECT_EXIT(
         {
-            globalBuffer() << "used before the end";
+            globalBuffer() << "used before the exit";
             std::exit(0);
         },
         testing::ExitedWithCode(0), "");
 }
 
-TEST(MessageBuffer, HoldsTextsWithNulBytes)
+TEST(MessageBuffer, KeepsNulBytes)
 {
     VXLog::VXMessageBuffer buffer;
     const std::string text("a\0b", 3);
     EXPECT_EQ(buffer.str(buffer << text), text);
 }
 
-// Takes the records of one test.
+TEST(MessageBuffer, IsCompleteOrThrowsWhenMemoryRunsOut)
+{
+    const std::string piece(1000, 'x');
+    const std::string whole = "literal " + piece + "4294967295";
+    for (long allowed = 0;; ++allowed) {
+        ASSERT_LT(allowed, 100);
+        std::string text;
+        const bool completed = allocation::completesWith(allowed, [&] {
+            VXLog::VXMessageBuffer buffer;
+            text = buffer.str(buffer << "literal " << piece << 4294967295u);
+        });
+        if (completed) {
+            EXPECT_EQ(text, whole) << "with memory for " << allowed << " allocations";
+            EXPECT_GT(allowed, 0);
+            break;
+        }
+    }
+}
+
+// Restores the sink after each test.
 class Sink : public testing::Test {
 protected:
     void SetUp() override { before_ = VXLog::setRecordSink(nullptr); }
@@ -345,7 +366,7 @@ protected:
                                            message);
     }
 
-    // What `write` leaves on standard error.
+    // What `write` writes to standard error.
     template <class Write>
     static std::string standardError(Write write)
     {
@@ -394,21 +415,21 @@ TEST_F(Sink, IsReplacedByTheNextAndReturned)
     EXPECT_EQ(texts, "first 1;second 2;first 3;");
 }
 
-TEST_F(Sink, IsTheDefaultAgainAfterAnEmptyOne)
+TEST_F(Sink, AnEmptySinkRestoresTheDefault)
 {
     VXLog::setRecordSink([](const VXLog::Record&) { FAIL(); });
     VXLog::setRecordSink(nullptr);
     EXPECT_THAT(standardError([] { log("back"); }), testing::EndsWith(": back\n"));
 }
 
-TEST_F(Sink, ReturnsADefaultThatCanBePassedOnTo)
+TEST_F(Sink, TheReturnedDefaultCanBeCalled)
 {
     VXLog::RecordSink standard;
     standard = VXLog::setRecordSink([&](const VXLog::Record& record) { standard(record); });
     EXPECT_THAT(standardError([] { log("passed on"); }), testing::EndsWith(": passed on\n"));
 }
 
-TEST_F(Sink, PassesWhatItThrowsToTheCallerOfTheLogger)
+TEST_F(Sink, ExceptionsPropagateToTheCallerOfTheLogger)
 {
     VXLog::setRecordSink([](const VXLog::Record&) { throw std::length_error("full"); });
     EXPECT_THROW(log("x"), std::length_error);
@@ -494,15 +515,15 @@ TEST_F(Sink, EscapesWhatCouldForgeALineOrDriveATerminal)
          "\\xc2\\x9b31m"},         // the same in UTF-8
         {"\xc2\xa0", "\xc2\xa0"},  // the first character after the controls
         {"\xe2\x80\xa8\xe2\x80\xa9", "\\xe2\\x80\\xa8\\xe2\\x80\\xa9"},  // line and paragraph separator
-        {"\xc3", "\\xc3"},                                               // cut short
+        {"\xc3", "\\xc3"},                                               // incomplete
         {"\xe2\x82", "\\xe2\\x82"},
-        {"\xc3\x28", "\\xc3("},      // not continued
-        {"\xc0\x8a", "\\xc0\\x8a"},  // a newline, written too long
+        {"\xc3\x28", "\\xc3("},      // without a continuation byte
+        {"\xc0\x8a", "\\xc0\\x8a"},  // an overlong newline
         {"\xe0\x80\x8a", "\\xe0\\x80\\x8a"},
         {"\xf0\x80\x80\x8a", "\\xf0\\x80\\x80\\x8a"},
         {"\xed\xa0\x80", "\\xed\\xa0\\x80"},           // a surrogate
         {"\xf4\x90\x80\x80", "\\xf4\\x90\\x80\\x80"},  // beyond U+10FFFF
-        {"\xf4\x8f\xbf\xbd", "\xf4\x8f\xbf\xbd"},      // below it
+        {"\xf4\x8f\xbf\xbd", "\xf4\x8f\xbf\xbd"},      // U+10FFFD
         {"\xff\xfe\x80", "\\xff\\xfe\\x80"},
     };
     for (const auto& row : rows) {
@@ -510,6 +531,26 @@ TEST_F(Sink, EscapesWhatCouldForgeALineOrDriveATerminal)
         EXPECT_THAT(standardError([&] { log(row.text); }),
                     testing::EndsWith(std::string(" work: ") + row.written + "\n"));
     }
+}
+
+TEST_F(Sink, EscapesOnlyWhatIsNotPrintable)
+{
+    const struct {
+        std::string text;
+        const char* written;
+    } rows[] = {
+        {"\xc2\x9f", "\\xc2\\x9f"},                    // the last control character
+        {"\xf0\x8f\xbf\xbf", "\\xf0\\x8f\\xbf\\xbf"},  // U+FFFF, overlong
+        {"\xf0\x90\x80\x80", "\xf0\x90\x80\x80"},      // U+10000
+        {"\xe0\x9f\xbf", "\\xe0\\x9f\\xbf"},           // U+07FF, overlong
+        {"\xe0\xa0\x80", "\xe0\xa0\x80"},              // U+0800
+        {"\xed\x9f\xbf", "\xed\x9f\xbf"},              // before the surrogates
+        {"\xed\xbf\xbf", "\\xed\\xbf\\xbf"},           // the last surrogate
+        {"\xee\x80\x80", "\xee\x80\x80"},              // after the surrogates
+    };
+    for (const auto& row : rows)
+        EXPECT_THAT(standardError([&] { log(row.text); }),
+                    testing::EndsWith(std::string(" work: ") + row.written + "\n"));
 }
 
 TEST_F(Sink, WritesOneLineForEveryByte)
@@ -521,66 +562,14 @@ TEST_F(Sink, WritesOneLineForEveryByte)
     }
 }
 
-TEST_F(Sink, EscapesTheCategoryToo)
+TEST_F(Sink, EscapesCategoryFileAndFunction)
 {
     EXPECT_THAT(standardError(
                     [] { VXLog::VXLogger::logLevelMessage("f\n", "F\n", 1, "C\n", 1, nullptr, 0, 0, "m"); }),
                 testing::EndsWith(" 1 C\\n F\\n:1 f\\n: m\n"));
 }
 
-TEST(DateTimeText, HasEveryMillisecond)
-{
-    for (unsigned int millisecond = 1; millisecond <= 999; ++millisecond) {
-        ZQ::DateTime time(0, 3);
-        time.setMillisecond(millisecond);
-        const std::string digits = std::to_string(1000 + millisecond).substr(1);
-        ASSERT_EQ(std::string(time), "1970-01-01T00:00:00." + digits + "Z");
-    }
-}
-TEST(MessageBuffer, IsWholeOrThrowsWhereMemoryRunsOut)
-{
-    const std::string piece(1000, 'x');
-    const std::string whole = "literal " + piece + "4294967295";
-    for (long allowed = 0;; ++allowed) {
-        ASSERT_LT(allowed, 100);
-        std::string text;
-        const bool completed = allocation::completesWith(allowed, [&] {
-            VXLog::VXMessageBuffer buffer;
-            text = buffer.str(buffer << "literal " << piece << 4294967295u);
-        });
-        if (!completed)
-            continue;
-        EXPECT_EQ(text, whole) << "with memory for " << allowed << " allocations";
-        if (text == whole) {
-            EXPECT_GT(allowed, 0);
-        }
-        break;
-    }
-}
-std::string line(const std::string& message)
-{
-    testing::internal::CaptureStderr();
-    VXLog::VXLogger::logLevelMessage("f", "F", 1, "C", 1, nullptr, 0, 0, message);
-    return testing::internal::GetCapturedStderr();
-}
-TEST_F(Sink, EscapesTheEdgesOfWhatIsPrintable)
-{
-    const struct {
-        std::string text;
-        const char* written;
-    } rows[] = {
-        {"\xc2\x9f", "\\xc2\\x9f"},                    // the last control character
-        {"\xf0\x8f\xbf\xbf", "\\xf0\\x8f\\xbf\\xbf"},  // U+FFFF, written too long
-        {"\xf0\x90\x80\x80", "\xf0\x90\x80\x80"},      // U+10000
-        {"\xe0\x9f\xbf", "\\xe0\\x9f\\xbf"},           // U+07FF, written too long
-        {"\xe0\xa0\x80", "\xe0\xa0\x80"},              // U+0800
-        {"\xed\x9f\xbf", "\xed\x9f\xbf"},              // before the surrogates
-        {"\xed\xbf\xbf", "\\xed\\xbf\\xbf"},           // the last surrogate
-        {"\xee\x80\x80", "\xee\x80\x80"},              // after them
-    };
-    for (const auto& row : rows)
-        EXPECT_THAT(line(row.text), testing::EndsWith(std::string(" f: ") + row.written + "\n"));
-}
+// A sink whose copy constructor throws while `fail` is set.
 struct ThrowingCopy {
     static bool fail;
     ThrowingCopy() = default;
@@ -594,13 +583,14 @@ struct ThrowingCopy {
 };
 bool ThrowingCopy::fail = false;
 int ThrowingCopy::calls = 0;
-TEST_F(Sink, StaysWhereTheOneBeforeCannotBeReturned)
+
+TEST_F(Sink, StaysWhenItCannotBeCopied)
 {
     VXLog::setRecordSink(ThrowingCopy());
     ThrowingCopy::fail = true;
     EXPECT_THROW(VXLog::setRecordSink([](const VXLog::Record&) {}), std::length_error);
     ThrowingCopy::fail = false;
-    line("x");
+    log("x");
     EXPECT_EQ(ThrowingCopy::calls, 1);
     VXLog::setRecordSink(nullptr);
 }
