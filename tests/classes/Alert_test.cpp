@@ -388,7 +388,7 @@ TEST(AlertHexstring, ConvertsAllBytes)
     expectTwoLowerCaseDigitsForAllBytes([&](const std::string& bytes) { return alert.hexstring(bytes); });
 }
 
-TEST(AlertHexstring, CanBeCalledBySeveralThreads)
+TEST(AlertHexstring, MayBeCalledBySeveralThreads)
 {
     const Alert alert = alertOf(0, 0, 0);
     std::string texts[4];

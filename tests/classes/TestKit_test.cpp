@@ -1,6 +1,6 @@
-// What IC::Testing adds to GoogleTest.
+// Tests of what IC::Testing adds to GoogleTest.
 
-// Names that a user's test may have itself, so that the kit must not.
+// A user's test may declare these names, so the test kit must not use them.
 struct Message { };
 void report();
 
@@ -44,7 +44,7 @@ TEST(Printing, ANumberOfARefusedKindShowsTheCode)
     EXPECT_EQ(PrintToString(number), "kind 11");
 }
 
-TEST(Printing, AnEnumeratedValueSaysThatItIsOne)
+TEST(Printing, AnEnumValueShowsItsType)
 {
     EXPECT_EQ(PrintToString(IC::EnumValue(7u)), "EnumValue 7");
 }
@@ -74,26 +74,26 @@ public:
     Fan() { properties.insert({1, PropertyValue(Number(5u))}); }
 };
 
-TEST(ExpectRecords, AcceptsWhatWasWritten)
+TEST(ExpectRecords, AcceptsTheRecordsThatWereWritten)
 {
     expectRecords({});
     Fan().setProperty(1, PropertyValue(Number(6u)));
     expectRecords({{"setProperty", "Vexilon.IC.Node", 3000, "setProperty: 1 6"}});
 }
 
-TEST(ExpectRecords, FailsWhereARecordIsMissing)
+TEST(ExpectRecords, FailsWhenARecordIsMissing)
 {
     EXPECT_NONFATAL_FAILURE(expectRecords({{"setProperty", "Vexilon.IC.Node", 3000, "setProperty: 1 6"}}),
                             "log   setProperty Vexilon.IC.Node 3000: setProperty: 1 6");
 }
 
-TEST(ExpectRecords, FailsWhereOneIsTooMany)
+TEST(ExpectRecords, FailsWhenThereIsOneRecordTooMany)
 {
     Fan().setProperty(1, PropertyValue(Number(6u)));
     EXPECT_NONFATAL_FAILURE(expectRecords({}), "trace setProperty Vexilon.IC.Node 3000: setProperty: 1 6");
 }
 
-TEST(ExpectRecords, FailsWhereAFieldDiffers)
+TEST(ExpectRecords, FailsWhenAFieldDiffers)
 {
     Fan().setProperty(1, PropertyValue(Number(6u)));
     EXPECT_NONFATAL_FAILURE(expectRecords({{"setProperty", "Vexilon.IC.Node", 6000, "setProperty: 1 6"}}),
