@@ -8,14 +8,15 @@
 
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
 #include "IC/EnumValue.h"
 #include "IC/ICException.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
-#include "support/PropertySamples.h"
 #include "ZQ/DateTime.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
+#include "support/DateTimes.h"
+#include "support/PropertySamples.h"
 
 namespace {
 
@@ -24,7 +25,7 @@ using IC::Number;
 using IC::PropertyValue;
 using IC::PropertyValueInvalidKind;
 
-// All that a property is read as.
+// A property converts to these types.
 static_assert(std::is_convertible_v<const PropertyValue&, double>);
 static_assert(std::is_convertible_v<const PropertyValue&, unsigned long long>);
 static_assert(std::is_convertible_v<const PropertyValue&, unsigned int>);
@@ -38,7 +39,7 @@ static_assert(std::is_convertible_v<const PropertyValue&, IC::StringArray>);
 static_assert(std::is_convertible_v<const PropertyValue&, std::string>);
 static_assert(std::is_convertible_v<const PropertyValue&, PropertyValue::KindType>);
 
-// An int would silently be a flag.
+// A conversion to int would silently go through bool.
 static_assert(!std::is_convertible_v<const PropertyValue&, int>);
 static_assert(!std::is_constructible_v<int, const PropertyValue&>);
 static_assert(!std::is_constructible_v<int, PropertyValue>);
@@ -51,11 +52,11 @@ static_assert(!std::is_convertible_v<const PropertyValue&, ZQ::DateTime>);
 struct Conversion {
     std::set<unsigned int> accepted;
     const char* function;
-    const char* logged;  // the kind follows
+    const char* logged;  // followed by the kind
     const char* sentence;
 };
 
-// Every kind that is not accepted, with either mark.
+// Expects a refusal of every other kind, writable or read-only.
 template <class Target>
 void expectOtherKindsRefused(const Conversion& conversion)
 {
@@ -174,7 +175,7 @@ TEST(PropertyConversion, ToEnumValueRefusesOtherKindsWithoutARecord)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(PropertyConversion, OfANumberIsTheNumbersOwn)
+TEST(PropertyConversion, OfANumberIsThatOfTheNumber)
 {
     const double real = PropertyValue(Number(2.75), true);
     EXPECT_EQ(real, 2.75);
@@ -210,7 +211,7 @@ TEST(PropertyConversion, OfANumberIsTheNumbersOwn)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(PropertyConversion, OfANumberPassesTheNumbersRefusalsOnUntouched)
+TEST(PropertyConversion, OfANumberIsRefusedByTheNumber)
 {
     const auto refused = [](auto operation, const char* function, const char* logged, const char* sentence) {
         SCOPED_TRACE(logged);
@@ -251,17 +252,12 @@ TEST(PropertyConversion, OfANumberPassesTheNumbersRefusalsOnUntouched)
     EXPECT_EQ(seen(large), "1 writable: 4294967296");
 }
 
-TEST(PropertyConversion, ToNumberGivesTheWholeNumber)
+TEST(PropertyConversion, ToNumberKeepsAllParts)
 {
-    ZQ::DateTime time(1234567890L, 2);
-    time.setMillisecond(250);
-    const PropertyValue value {Number(time)};
+    const PropertyValue value {Number(dateTime(1234567890, 250, 2))};
     const Number number = value;
     EXPECT_EQ(number.getKind(), Number::KIND_DATETIME);
-    const ZQ::DateTime back = number.operator ZQ::DateTime();
-    EXPECT_EQ(back.operator long(), 1234567890L);
-    EXPECT_EQ(back.getMillisecond(), 250u);
-    EXPECT_EQ(back.getScope(), 2u);
+    EXPECT_EQ(partsOf(number.operator ZQ::DateTime()), (DateTimeParts {1234567890, 250, 2}));
 
     const Number reference = PropertyValue(Number(IC::sNodeRef {4, 7}));
     EXPECT_EQ(reference.operator IC::sNodeRef().type, 4u);
@@ -287,7 +283,7 @@ TEST(PropertyConversion, OfAnEnumValueIsItsUnsignedValue)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(PropertyConversion, GivesACopyOfAContainer)
+TEST(PropertyConversion, ToAContainerReturnsACopy)
 {
     const PropertyValue bytes(IC::Buffer {0, 0x80, 0xff});
     IC::Buffer buffer = bytes;
@@ -310,7 +306,7 @@ TEST(PropertyConversion, GivesACopyOfAContainer)
     EXPECT_EQ(texts.operator IC::StringArray(), (IC::StringArray {"a", std::string("b\0c", 3)}));
 }
 
-TEST(PropertyConversion, GivesEmptyContainers)
+TEST(PropertyConversion, ToAContainerReturnsEmptyContainers)
 {
     EXPECT_TRUE(PropertyValue(IC::Buffer()).operator IC::Buffer().empty());
     EXPECT_TRUE(PropertyValue(PropertyValue::KIND_BUFFER).operator IC::Buffer().empty());
@@ -319,7 +315,7 @@ TEST(PropertyConversion, GivesEmptyContainers)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(PropertyConversion, DoesNotReadANumberFromAText)
+TEST(PropertyConversion, ToUint32DoesNotParseTexts)
 {
     const PropertyValue value("12");
     expectRefusal<PropertyValueInvalidKind>(
@@ -364,7 +360,7 @@ TEST(PropertyConversion, ToANativeTypeAllocatesNothing)
     EXPECT_EQ(sum, 64u);
 }
 
-TEST(PropertyConversion, AfterARefusedSetKindIsRefusedAsOfAnotherKind)
+TEST(PropertyConversion, AfterARefusedSetKindIsRefusedAsForAnotherKind)
 {
     auto values = samples();
     for (PropertyValue& value : values)
