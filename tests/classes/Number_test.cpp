@@ -18,11 +18,14 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
 #include "IC/Number.h"
-#include "support/SensorNames.h"
 #include "ZQ/DateTime.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
+#include "support/Byte.h"
+#include "support/DateTimes.h"
+#include "support/GroupingLocale.h"
+#include "support/SensorNames.h"
 
 namespace {
 
@@ -50,7 +53,7 @@ static_assert(std::is_trivially_copyable_v<Number>);
 static_assert(std::is_trivially_destructible_v<Number>);
 static_assert(std::is_copy_assignable_v<Number>);
 
-// A pointer would silently become a flag.
+// A pointer would silently be converted to a flag.
 static_assert(!std::is_constructible_v<Number, const char*>);
 static_assert(!std::is_constructible_v<Number, char*>);
 static_assert(!std::is_constructible_v<Number, int*>);
@@ -72,7 +75,7 @@ static_assert(std::is_same_v<IC::NodeRef, sNodeRef>);
 
 static_assert(std::is_same_v<decltype(IC::pst), const std::string[75]>);
 
-// setKind keeps the bytes as they lie in storage, so what a value reads as depends on their order.
+// setKind keeps the bytes in storage, so the value that they mean in the new kind depends on the byte order.
 constexpr bool littleEndian = __BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__;
 static_assert(littleEndian || __BYTE_ORDER__ == __ORDER_BIG_ENDIAN__);
 
@@ -95,11 +98,6 @@ double below(double value)
 double above(double value)
 {
     return std::nextafter(value, infinity);
-}
-
-constexpr ZQ::Uint8 byte(unsigned int value)
-{
-    return static_cast<ZQ::Uint8>(value);
 }
 
 constexpr Number::KindType kind(ZQ::Uint32 code)
@@ -133,62 +131,34 @@ std::pair<unsigned int, unsigned int> version(unsigned int major, unsigned int m
     return {major, minor};
 }
 
-struct DateTimeParts {
-    long seconds;
-    unsigned int milliseconds;
-    unsigned int scope;
-};
-
-bool operator==(const DateTimeParts& a, const DateTimeParts& b)
-{
-    return a.seconds == b.seconds && a.milliseconds == b.milliseconds && a.scope == b.scope;
-}
-
-std::ostream& operator<<(std::ostream& out, const DateTimeParts& parts)
-{
-    return out << parts.seconds << " s, " << parts.milliseconds << " ms, scope " << parts.scope;
-}
-
-DateTimeParts parts(const ZQ::DateTime& time)
-{
-    return {time.operator long(), time.getMillisecond(), time.getScope()};
-}
-
-ZQ::DateTime dateTime(long seconds, unsigned int milliseconds, unsigned int scope)
-{
-    ZQ::DateTime time(seconds, scope);
-    time.setMillisecond(milliseconds);
-    return time;
-}
-
-// The number with its kind code replaced.
+// The number with another kind code.
 Number withKind(Number number, unsigned int code)
 {
     number.setKind(byte(code));
     return number;
 }
 
-// The number after a refused initKind, which leaves the kind code behind.
+// The number after a refused initKind, which stores the kind code all the same.
 Number withRefusedKind(Number number, ZQ::Uint32 code)
 {
     EXPECT_THROW(number.initKind(kind(code)), std::invalid_argument);
     return number;
 }
 
-// Valid and invalid kind codes; the invalid ones can be left behind by a refused initKind.
+// Valid and invalid kind codes. A refused initKind can store the invalid ones.
 constexpr ZQ::Uint32 kindCodes[] = {0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 255, 256, 4294967295};
 
-// A number of any kind code, whose content every conversion that takes the kind accepts.
+// A number of any kind code. Its content is in the range of every conversion that accepts the kind.
 Number ofKind(ZQ::Uint32 code)
 {
-    // A date-time of 32-bit seconds is too large an integer of 64 bits: its milliseconds lie in the upper half.
+    // Not a date-time for KIND_UINT64: with a 32-bit long, its milliseconds make the 64-bit integer too large.
     const Number number = code == Number::KIND_UINT64 ? Number(5ull) : Number(5L, 250);
     return code <= 10 ? withKind(number, code) : withRefusedKind(number, code);
 }
 
 using Bytes = std::array<unsigned char, sizeof(Number)>;
 
-// But for the padding between the kind and the content, which has no value.
+// The bytes of the number; the padding between kind and content is undefined and given as 0.
 Bytes bytesOf(const Number& number)
 {
     Bytes bytes;
@@ -241,14 +211,14 @@ TEST(NumberConstruction, NarrowerTypesWidenToIntAndDouble)
     EXPECT_EQ(Number(0.5f).getKind(), Number::KIND_REAL);
 }
 
-TEST(NumberConstruction, SpecialRealsAreOfTheRealKind)
+TEST(NumberConstruction, NaNAndInfinityAreReals)
 {
     EXPECT_EQ(Number(notANumber).getKind(), Number::KIND_REAL);
     EXPECT_EQ(Number(infinity).getKind(), Number::KIND_REAL);
     EXPECT_EQ(Number(-infinity).getKind(), Number::KIND_REAL);
 }
 
-TEST(NumberConstruction, TheKindHasTwoNames)
+TEST(NumberConstruction, TheKindConversionEqualsGetKind)
 {
     for (const ZQ::Uint32 code : kindCodes) {
         SCOPED_TRACE(code);
@@ -259,9 +229,9 @@ TEST(NumberConstruction, TheKindHasTwoNames)
     }
 }
 
-TEST(NumberConstruction, SecondsAndMillisecondsAreKeptWithScopeThree)
+TEST(NumberConstruction, SecondsAndMillisecondsGetScopeThree)
 {
-    // The one past 32 bits is only that where a long has more.
+    // Only with a 64-bit long is this past 32 bits.
     constexpr auto past32Bits = static_cast<long>(2147483648);
     const DateTimeParts rows[] = {{1234567890, 250, 3},   {0, 0, 3},          {-1, 999, 3},
                                   {2147483647, 1, 3},     {past32Bits, 1, 3}, {longLargest, 65535, 3},
@@ -269,11 +239,11 @@ TEST(NumberConstruction, SecondsAndMillisecondsAreKeptWithScopeThree)
     for (const DateTimeParts& row : rows) {
         SCOPED_TRACE(row.seconds);
         const Number number(row.seconds, static_cast<unsigned short>(row.milliseconds));
-        EXPECT_EQ(parts(to<ZQ::DateTime>(number)), row);
+        EXPECT_EQ(partsOf(to<ZQ::DateTime>(number)), row);
     }
 }
 
-TEST(NumberConstruction, ADateTimeIsCutToEightBitsOfScopeAndSixteenOfMilliseconds)
+TEST(NumberConstruction, ADateTimeKeepsEightBitsOfScopeAndSixteenOfMilliseconds)
 {
     const struct {
         DateTimeParts given;
@@ -291,14 +261,14 @@ TEST(NumberConstruction, ADateTimeIsCutToEightBitsOfScopeAndSixteenOfMillisecond
         name << row.given;
         SCOPED_TRACE(name.str());
         const Number number(dateTime(row.given.seconds, row.given.milliseconds, row.given.scope));
-        EXPECT_EQ(parts(to<ZQ::DateTime>(number)), row.kept);
+        EXPECT_EQ(partsOf(to<ZQ::DateTime>(number)), row.kept);
     }
     EXPECT_EQ(text(Number(dateTime(5, 0, 256))), "5/0");
     EXPECT_EQ(text(Number(dateTime(5, 0, 511))), "5/255");
 }
 
-// What initKind gives to the kinds that it takes, DATETIME apart.
-void expectFirstContent(const Number& number)
+// Expects what initKind stores for the kinds that it accepts, except KIND_DATETIME.
+void expectInitialContent(const Number& number)
 {
     switch (number.getKind()) {
     case Number::KIND_UNKNOWN:
@@ -327,22 +297,22 @@ void expectFirstContent(const Number& number)
         EXPECT_EQ(parts(to<Version2>(number)), version(0, 0));
         break;
     default:
-        ADD_FAILURE() << "kind " << number.getKind() << " has no first content";
+        ADD_FAILURE() << "kind " << number.getKind() << " has no initial content";
     }
 }
 
 constexpr unsigned int kindsWithZeroContent[] = {0, 1, 3, 4, 5, 6, 7, 8};
 
-TEST(NumberConstruction, AKindCodeGivesTheFirstContentOfTheKind)
+TEST(NumberConstruction, AKindCodeGivesTheInitialContentOfTheKind)
 {
     for (const unsigned int code : kindsWithZeroContent) {
         SCOPED_TRACE(code);
         const Number fromCode(byte(code));
         EXPECT_EQ(fromCode.getKind(), code);
-        expectFirstContent(fromCode);
+        expectInitialContent(fromCode);
         const Number fromKind(kind(code));
         EXPECT_EQ(fromKind.getKind(), code);
-        expectFirstContent(fromKind);
+        expectInitialContent(fromKind);
     }
     EXPECT_THAT(observe::records(), IsEmpty());
 }
@@ -350,14 +320,14 @@ TEST(NumberConstruction, AKindCodeGivesTheFirstContentOfTheKind)
 void expectNow(const Number& number, std::time_t before)
 {
     EXPECT_EQ(number.getKind(), Number::KIND_DATETIME);
-    const DateTimeParts now = parts(to<ZQ::DateTime>(number));
+    const DateTimeParts now = partsOf(to<ZQ::DateTime>(number));
     EXPECT_GE(now.seconds, before);
     EXPECT_LE(now.seconds, std::time(nullptr));
     EXPECT_EQ(now.milliseconds, 0u);
     EXPECT_EQ(now.scope, 3u);
 }
 
-TEST(NumberConstruction, TheFirstDateTimeIsTheSystemsTimeInWholeSeconds)
+TEST(NumberConstruction, TheInitialDateTimeIsTheSystemTimeInWholeSeconds)
 {
     const std::time_t before = std::time(nullptr);
     expectNow(Number(byte(9)), before);
@@ -399,7 +369,7 @@ const struct {
                               {259, "initkind: invalid kind of number 259"},
                               {4294967295, "initkind: invalid kind of number 4294967295"}};
 
-TEST(NumberConstruction, AKindIsRefusedByInitKind)
+TEST(NumberConstruction, InvalidKindsAreRefusedByInitKind)
 {
     for (const auto& row : kindsRefusedByInitKind) {
         SCOPED_TRACE(row.code);
@@ -408,7 +378,7 @@ TEST(NumberConstruction, AKindIsRefusedByInitKind)
     }
 }
 
-TEST(NumberConstruction, TheNodeReferenceStartsAtZero)
+TEST(NumberConstruction, TheNodeReferenceIsZeroForOtherKinds)
 {
     const std::pair<const char*, Number> rows[] = {
         {"flag", Number(true)},          {"int", Number(-1)},
@@ -422,7 +392,7 @@ TEST(NumberConstruction, TheNodeReferenceStartsAtZero)
     }
 }
 
-// Every way to build a number, over storage that was filled beforehand.
+// One number from each constructor, constructed in storage that was filled before.
 std::vector<Number> builtOver(unsigned char filling)
 {
     alignas(Number) unsigned char storage[sizeof(Number)];
@@ -466,7 +436,7 @@ TEST(NumberConstruction, EveryByteOfTheValueIsDefined)
     }
 }
 
-TEST(NumberConstruction, ACopyHasEveryMember)
+TEST(NumberConstruction, ACopyKeepsContentAndNodeReference)
 {
     const Number source(sNodeRef {4, 7});
     const Number copy = source;
@@ -476,13 +446,13 @@ TEST(NumberConstruction, ACopyHasEveryMember)
     EXPECT_EQ(assigned.getKind(), Number::KIND_NODEREF);
     EXPECT_EQ(parts(to<sNodeRef>(assigned)), parts(sNodeRef {4, 7}));
     assigned = Number(dateTime(5, 250, 2));
-    EXPECT_EQ(parts(to<ZQ::DateTime>(assigned)), (DateTimeParts {5, 250, 2}));
+    EXPECT_EQ(partsOf(to<ZQ::DateTime>(assigned)), (DateTimeParts {5, 250, 2}));
     EXPECT_EQ(parts(to<sNodeRef>(withKind(assigned, 10))), parts(sNodeRef {0, 0}));
 }
 
 // ---- initKind
 
-TEST(NumberInitKind, GivesTheFirstContentWhateverWasThere)
+TEST(NumberInitKind, GivesTheInitialContentWhateverTheOldOne)
 {
     for (const unsigned int code : kindsWithZeroContent) {
         for (const Number& old : {Number(18446744073709551615ull), Number(-1L, 999), Number(-0.1)}) {
@@ -490,13 +460,13 @@ TEST(NumberInitKind, GivesTheFirstContentWhateverWasThere)
             Number number = old;
             number.initKind(kind(code));
             EXPECT_EQ(number.getKind(), code);
-            expectFirstContent(number);
+            expectInitialContent(number);
         }
     }
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-TEST(NumberInitKind, KindsWithoutAnIntegerClearTheFlagByteAlone)
+TEST(NumberInitKind, UnknownBoolNaNAndInfinityClearOnlyTheFlagByte)
 {
     for (const unsigned int code : {0u, 1u, 6u, 7u}) {
         SCOPED_TRACE(code);
@@ -508,7 +478,7 @@ TEST(NumberInitKind, KindsWithoutAnIntegerClearTheFlagByteAlone)
         number = Number(dateTime(5, 250, 2));
         number.initKind(kind(code));
         number.setKind(Number::KIND_DATETIME);
-        EXPECT_EQ(parts(to<ZQ::DateTime>(number)), (DateTimeParts {littleEndian ? 0 : 5, 250, 2}));
+        EXPECT_EQ(partsOf(to<ZQ::DateTime>(number)), (DateTimeParts {littleEndian ? 0 : 5, 250, 2}));
     }
 }
 
@@ -522,7 +492,7 @@ TEST(NumberInitKind, KeepsTheNodeReference)
     }
 }
 
-TEST(NumberInitKind, ARefusedKindStaysStoredAndTheValueIsKept)
+TEST(NumberInitKind, StoresARefusedKindAndKeepsTheContent)
 {
     for (const auto& row : kindsRefusedByInitKind) {
         SCOPED_TRACE(row.code);
@@ -540,7 +510,7 @@ TEST(NumberInitKind, ARefusedKindStaysStoredAndTheValueIsKept)
               parts(sNodeRef {4, 7}));
 }
 
-TEST(NumberInitKind, ARefusedKindStaysStoredAlsoWhereThePlatformThrows)
+TEST(NumberInitKind, StoresARefusedKindEvenIfThePlatformThrows)
 {
     Number number(7u);
     observe::throwAt(observe::Call::log, 1);
@@ -550,14 +520,14 @@ TEST(NumberInitKind, ARefusedKindStaysStoredAlsoWhereThePlatformThrows)
 
 // ---- setKind
 
-TEST(NumberSetKind, TakesEveryKindAndKeepsTheBytes)
+TEST(NumberSetKind, AcceptsEveryKindAndKeepsTheBytes)
 {
     for (unsigned int from = 0; from <= 10; ++from) {
         for (unsigned int code = 0; code <= 10; ++code) {
             SCOPED_TRACE("from kind " + std::to_string(from) + " to " + std::to_string(code));
             const Number before = ofKind(from);
             Number number = before;
-            const Bytes bytes = bytesOf(number);  // of this object: a copy need not bring padding along
+            const Bytes bytes = bytesOf(number);  // not of `before`: a copy need not copy padding
             number.setKind(byte(code));
             EXPECT_EQ(number.getKind(), code);
             number.setKind(byte(from));
@@ -578,7 +548,7 @@ TEST(NumberSetKind, RefusesCodesOfElevenOrMoreAndChangesNothing)
                                                    "Invalid kind");
         EXPECT_EQ(bytesOf(number), before);
         EXPECT_EQ(number.getKind(), Number::KIND_DATETIME);
-        EXPECT_EQ(parts(to<ZQ::DateTime>(number)), (DateTimeParts {5, 250, 2}));
+        EXPECT_EQ(partsOf(to<ZQ::DateTime>(number)), (DateTimeParts {5, 250, 2}));
     }
 }
 
@@ -642,7 +612,7 @@ TEST(NumberSetKind, ReadsARealAsItsBits)
     EXPECT_EQ(to<double>(withKind(Number(0xFFF0000000000000ull), 5)), -infinity);
 }
 
-TEST(NumberSetKind, ReadsTheFirstHalfOfSixtyFourBits)
+TEST(NumberSetKind, ReadsTheFirstFourBytesOfStorageAsA32BitInteger)
 {
     const Number number(0x0000000100000002ull);
     EXPECT_EQ(to<unsigned int>(withKind(number, 3)), littleEndian ? 2u : 1u);
@@ -659,7 +629,7 @@ TEST(NumberSetKind, ReadsTheSecondsOfADateTimeAsAnInteger)
         EXPECT_EQ(as64Bits(earlier), 0xFFFFFFFFFFFFFFFFu);
         EXPECT_EQ(to<unsigned int>(withKind(later, 3)), littleEndian ? 0x12345678u : 0u);
     } else {
-        // The milliseconds (00FA) and the scope (03) lie behind the four bytes of the seconds.
+        // The milliseconds (00FA) and the scope (03) follow the four bytes of the seconds.
         EXPECT_EQ(as64Bits(later), littleEndian ? 0x000300FA12345678u : 0x1234567800FA0300u);
         EXPECT_EQ(as64Bits(earlier), littleEndian ? 0x000300FAFFFFFFFFu : 0xFFFFFFFF00FA0300u);
         EXPECT_EQ(to<unsigned int>(withKind(later, 3)), 0x12345678u);
@@ -667,7 +637,7 @@ TEST(NumberSetKind, ReadsTheSecondsOfADateTimeAsAnInteger)
     EXPECT_EQ(to<unsigned int>(withKind(earlier, 3)), 0xFFFFFFFFu);
 }
 
-TEST(NumberSetKind, AFlagByteAboveOneIsTrueAndOne)
+TEST(NumberSetKind, EveryNonZeroFlagByteIsTrueAndOne)
 {
     for (unsigned int flag = 0; flag <= 255; ++flag) {
         SCOPED_TRACE(flag);
@@ -704,7 +674,7 @@ Conversion conversion(const char* function, const char* logged, const char* sent
         }};
 }
 
-TEST(NumberConversion, TakesItsKindsAndRefusesTheOthers)
+TEST(NumberConversion, AcceptsItsKindsAndRefusesTheOthers)
 {
     const Conversion conversions[] = {
         conversion<bool>("operator bool", "bool: Can't return current value as a Boolean, kind=",
@@ -745,7 +715,7 @@ TEST(NumberConversion, TakesItsKindsAndRefusesTheOthers)
     }
 }
 
-TEST(NumberConversion, ASignedNumberIsAnIntAndNothingElse)
+TEST(NumberConversion, ASignedNumberConvertsToIntOnly)
 {
     const Number number(-5);
     EXPECT_EQ(to<int>(number), -5);
@@ -763,7 +733,7 @@ TEST(NumberConversion, ASignedNumberIsAnIntAndNothingElse)
                                   "Can't return current value as a Boolean");
 }
 
-TEST(NumberToBool, IsWhetherTheValueIsNotZero)
+TEST(NumberToBool, IsFalseOnlyForZero)
 {
     const struct {
         const char* name;
@@ -796,7 +766,7 @@ TEST(NumberToBool, IsWhetherTheValueIsNotZero)
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-// What the signed and the unsigned 32-bit conversion share, as the unsigned one gives it.
+// Numbers that both 32-bit conversions accept, with the result of the unsigned one.
 const struct {
     const char* name;
     Number number;
@@ -879,7 +849,7 @@ TEST(NumberToUint32, RefusesWhatIsTooLargeOrNegative)
     }
 }
 
-TEST(NumberToInt, IsTheSignedValueAsItStands)
+TEST(NumberToInt, ReturnsASignedValueUnchanged)
 {
     for (const int value : {0, 7, -5, -1, intSmallest, intLargest}) {
         SCOPED_TRACE(value);
@@ -888,7 +858,7 @@ TEST(NumberToInt, IsTheSignedValueAsItStands)
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-TEST(NumberToInt, TakesThe32BitsOfAnUnsignedValueOrRealAsSigned)
+TEST(NumberToInt, ReadsThe32BitsOfAnUnsignedValueOrRealAsSigned)
 {
     EXPECT_EQ(to<int>(Number(2147483647u)), 2147483647);
     EXPECT_EQ(to<int>(Number(2147483648u)), intSmallest);
@@ -906,7 +876,7 @@ TEST(NumberToInt, TakesThe32BitsOfAnUnsignedValueOrRealAsSigned)
     EXPECT_THAT(observe::records(), IsEmpty());
 }
 
-TEST(NumberToInt, RefusesAsTheUnsignedConversionDoesAlsoNegativeReals)
+TEST(NumberToInt, RefusesWhatTheUnsignedConversionRefuses)
 {
     for (const auto& row : numbersBeyond32Bits) {
         SCOPED_TRACE(row.name);
@@ -1024,7 +994,7 @@ TEST(NumberToReal, NotANumberIsAQuietNaN)
     EXPECT_NE(bits & 0x0008000000000000u, 0u);  // set in every quiet NaN, clear in a signalling one
 }
 
-TEST(NumberToReal, AVersionIsItsMajorNumberAndTheMinorOneAsDecimals)
+TEST(NumberToReal, AVersionIsItsMajorNumberWithTheMinorOneAsDecimals)
 {
     const struct {
         Version2 version;
@@ -1037,7 +1007,7 @@ TEST(NumberToReal, AVersionIsItsMajorNumberAndTheMinorOneAsDecimals)
         SCOPED_TRACE(row.expected);
         EXPECT_DOUBLE_EQ(to<double>(Number(row.version)), row.expected);
     }
-    // Through memory, since some processors calculate in more digits than a double has.
+    // volatile rounds each step to a double: the x87 calculates with more digits.
     for (unsigned int major = 0; major <= 255; ++major) {
         for (unsigned int minor = 0; minor <= 255; ++minor) {
             const double divisor = minor <= 9 ? 10.0 : minor <= 99 ? 100.0 : 1000.0;
@@ -1050,16 +1020,16 @@ TEST(NumberToReal, AVersionIsItsMajorNumberAndTheMinorOneAsDecimals)
     }
 }
 
-// Where the processor calculates in more digits than a double has, the quotient was not rounded before the sum, nor
-// the sum before the program calculated with it.
-TEST(NumberToReal, AVersionHadOtherDigitsOnTheX87)
+// The x87 calculates with more digits than a double has. These results come from a quotient and a sum that are each
+// rounded to a double.
+TEST(NumberToReal, AVersionIsRoundedToADoubleAtEachStep)
 {
     EXPECT_EQ(to<double>(Number(Version2 {1, 14})), 0x1.23d70a3d70a3ep+0);
     EXPECT_EQ(to<double>(Number(Version2 {1, 36})), 0x1.5c28f5c28f5c2p+0);
     EXPECT_EQ(to<double>(Number(Version2 {2, 15})) - 2.0, 0x1.333333333333p-3);
 }
 
-TEST(NumberToReal, AnIntegerIsRoundedBeforeTheProgramCalculatesWithIt)
+TEST(NumberToReal, AnIntegerIsRoundedToADoubleBeforeFurtherUse)
 {
     EXPECT_EQ(static_cast<ZQ::Uint64>(to<double>(Number(9007199254740993ull))), 9007199254740992ull);
     EXPECT_EQ(static_cast<ZQ::Uint64>(to<double>(Number(9223372036854776833ull))), 9223372036854777856ull);
@@ -1075,7 +1045,7 @@ TEST(NumberToVersion, GivesBackEveryVersion)
     }
 }
 
-TEST(NumberToVersion, TakesIntegersUpTo255AsTheMajorNumber)
+TEST(NumberToVersion, AcceptsIntegersUpTo255AsTheMajorNumber)
 {
     for (unsigned int value = 0; value <= 255; ++value) {
         SCOPED_TRACE(value);
@@ -1103,13 +1073,13 @@ TEST(NumberToVersion, RefusesLargerIntegers)
     }
 }
 
-TEST(NumberToDateTime, TakesTheScopesOneToThree)
+TEST(NumberToDateTime, AcceptsTheScopesOneToThree)
 {
     for (unsigned int scope = 0; scope <= 255; ++scope) {
         SCOPED_TRACE(scope);
         const Number number(dateTime(1234567890, 250, scope));
         if (scope >= 1 && scope <= 3)
-            EXPECT_EQ(parts(to<ZQ::DateTime>(number)), (DateTimeParts {1234567890, 250, scope}));
+            EXPECT_EQ(partsOf(to<ZQ::DateTime>(number)), (DateTimeParts {1234567890, 250, scope}));
         else
             expectConversionRefused<ZQ::DateTime>(
                 number, "operator ZQ::DateTime", "DateTime: Can't return current value as a DateTime, kind=9",
@@ -1123,7 +1093,7 @@ TEST(NumberToDateTime, GivesBackEveryMillisecondValue)
     for (unsigned int milliseconds = 0; milliseconds <= 65535; ++milliseconds) {
         const Number number(-1L, static_cast<unsigned short>(milliseconds));
         const ZQ::DateTime time = number;
-        ASSERT_EQ(parts(time), (DateTimeParts {-1, milliseconds, 3}));
+        ASSERT_EQ(partsOf(time), (DateTimeParts {-1, milliseconds, 3}));
         ASSERT_TRUE(Number(time) == number) << milliseconds;
     }
 }
@@ -1193,7 +1163,7 @@ void expectUnordered(const Number& a, const Number& b)
     EXPECT_FALSE(a >= b);
 }
 
-// Rising rows of numbers of one kind: each is less than all that follow.
+// Expects each number to be less than all that follow it.
 void expectRising(const std::vector<Number>& numbers)
 {
     for (std::size_t i = 0; i < numbers.size(); ++i) {
@@ -1271,7 +1241,7 @@ TEST(NumberComparison, DateTimesIgnoreTheScope)
     expectLess(Number(dateTime(5, 250, 3)), Number(dateTime(5, 251, 1)));
 }
 
-TEST(NumberComparison, SomeKindsAreAlwaysEqualAndNeverOrdered)
+TEST(NumberComparison, IntsNodeReferencesUnknownAndInfinityAreAlwaysEqual)
 {
     expectEqual(Number(3), Number(9));
     expectEqual(Number(9), Number(3));
@@ -1353,7 +1323,7 @@ TEST(NumberComparison, EqualityOfDifferentKindsIsFalse)
     }
 }
 
-// One ordering of two numbers of equal content that may differ in kind.
+// Expects the result or the refusal of a < b or a > b, where a and b differ at most in their kind.
 template <class Operation>
 void expectOrderingByKind(const Number& a, const Number& b, char sign, Operation operation)
 {
@@ -1397,7 +1367,7 @@ TEST(NumberComparison, OrderingRefusesNotANumberAndDifferentKinds)
     }
 }
 
-TEST(NumberComparison, OrEqualAsksForEqualityFirstAndThenRefusesLikeTheOrdering)
+TEST(NumberComparison, OrEqualTestsEqualityBeforeTheOrdering)
 {
     for (const ZQ::Uint32 left : kindCodes) {
         for (const ZQ::Uint32 right : kindCodes) {
@@ -1484,7 +1454,7 @@ const struct TextRow {
                 {Number(sNodeRef {75, 1}), "invalid:1"},
                 {Number(sNodeRef {4294967295, 1}), "invalid:1"}};
 
-TEST(NumberText, IsThatOfTheKind)
+TEST(NumberText, HasTheFormOfTheKind)
 {
     for (const TextRow& row : textRows) {
         SCOPED_TRACE(row.expected);
@@ -1515,7 +1485,7 @@ TEST(NumberText, OfEveryVersionIsMajorPointMinor)
     }
 }
 
-TEST(NumberText, OfADateTimeTakesAnyScope)
+TEST(NumberText, OfADateTimeShowsAnyScope)
 {
     for (unsigned int scope = 0; scope <= 255; ++scope) {
         SCOPED_TRACE(scope);
@@ -1548,7 +1518,7 @@ TEST(NumberText, OfAnIntegerHasEveryDigitAtEveryLength)
     }
 }
 
-TEST(NumberText, OfARealHasSixSignificantDigitsHoweverSmallItIs)
+TEST(NumberText, OfASmallRealHasSixSignificantDigits)
 {
     EXPECT_EQ(std::string(Number(0.000123456)), "0.000123456");
     EXPECT_EQ(std::string(Number(0.0123456)), "0.0123456");
@@ -1578,21 +1548,21 @@ TEST(NumberText, OfARealHasSixSignificantDigitsInEveryDecade)
         EXPECT_EQ(std::string(Number(-among)), std::string("-") + texts[1]);
         EXPECT_EQ(std::string(Number(last)), texts[2]);
     }
-    // What is rounded up to the next decade.
+    // These are rounded up to the next decade.
     EXPECT_EQ(std::string(Number(999999.6)), "1e+06");
     EXPECT_EQ(std::string(Number(99.99996)), "100");
     EXPECT_EQ(std::string(Number(0.00999999996)), "0.01");
     EXPECT_EQ(std::string(Number(0.0000999999996)), "0.0001");
 }
 
-TEST(NumberText, OfAnotherKindReadsTheBytesAsThatKind)
+TEST(NumberText, AfterSetKindReadsTheBytesAsTheNewKind)
 {
     Number number(0x0000000700000009ull);
     number.setKind(Number::KIND_UINT32);
     EXPECT_EQ(std::string(number), littleEndian ? "9" : "7");
 }
 
-TEST(NumberText, OfADateTimeWithTheLastMillisecondDigitNotZeroSaysThatTheConversionFailed)
+TEST(NumberText, OfADateTimeReportsALastMillisecondDigitThatIsNotZero)
 {
     for (unsigned int digit = 1; digit <= 9; ++digit) {
         SCOPED_TRACE(digit);
@@ -1608,7 +1578,7 @@ TEST(NumberText, OfADateTimeWithTheLastMillisecondDigitNotZeroSaysThatTheConvers
     }
 }
 
-TEST(NumberText, OfADateTimeFollowsTheLastDigitOfEveryMillisecondValue)
+TEST(NumberText, OfADateTimeDependsOnTheLastDigitOfEveryMillisecondValue)
 {
     for (unsigned int milliseconds = 0; milliseconds <= 65535; ++milliseconds) {
         observe::reset();
@@ -1628,7 +1598,7 @@ TEST(NumberText, OfADateTimeFollowsTheLastDigitOfEveryMillisecondValue)
     }
 }
 
-TEST(NumberText, OfADateTimeIsRecordedBeforeThePlatformIsAskedForItsText)
+TEST(NumberText, OfADateTimeWritesItsRecordsBeforeItCallsThePlatformsText)
 {
     const Number number(5L, 123);
     std::vector<int> alive;
@@ -1640,11 +1610,11 @@ TEST(NumberText, OfADateTimeIsRecordedBeforeThePlatformIsAskedForItsText)
     EXPECT_EQ(observe::dateTimesAlive(), 0);
 }
 
-TEST(NumberText, OfADateTimeLetsThroughWhatThePlatformThrows)
+TEST(NumberText, OfADateTimePropagatesPlatformExceptions)
 {
     const Number number(5L, 123);
-    // The buffer's constructor, twice literal, digit, str and logging call, and then the date-time's own
-    // text.
+    // The buffer's constructor, then for each of the two records the literal, the digit, str and the logging call, then
+    // the date-time's own text.
     for (int nth = 1; nth <= 10; ++nth) {
         SCOPED_TRACE(nth);
         observe::reset();
@@ -1668,16 +1638,16 @@ TEST(NumberText, OfANodeReferenceHasTheNameOfItsType)
     }
 }
 
-TEST(NumberText, IsWholeOrNotAtAllWhereMemoryRunsOut)
+TEST(NumberText, IsCompleteOrThrowsWhenMemoryRunsOut)
 {
     allocation::expectTextCompleteOrThrows(Number(18446744073709551615ull), "18446744073709551615");
     allocation::expectTextCompleteOrThrows(Number(sNodeRef {25, 4294967295}), "Power Supply:4294967295");
     allocation::expectTextCompleteOrThrows(Number(longLargest, 0),
-                                          longHas64Bits ? "9223372036854775807/3" : "2147483647/3");
+                                           longHas64Bits ? "9223372036854775807/3" : "2147483647/3");
     allocation::expectTextCompleteOrThrows(Number(longLargest, 1),
-                                          longHas64Bits
-                                              ? "9223372036854775807/3.Conversion failed remainder>0"
-                                              : "2147483647/3.Conversion failed remainder>0");
+                                           longHas64Bits
+                                               ? "9223372036854775807/3.Conversion failed remainder>0"
+                                               : "2147483647/3.Conversion failed remainder>0");
     EXPECT_EQ(observe::buffersAlive(), 0);
     EXPECT_EQ(observe::dateTimesAlive(), 0);
 }
@@ -1688,29 +1658,17 @@ struct DecimalComma : std::numpunct<char> {
     std::string do_grouping() const override { return "\3"; }
 };
 
-// The global locale while one object lives.
-class GlobalLocale {
-public:
-    explicit GlobalLocale(const std::locale& locale) : before_(std::locale::global(locale)) { }
-    ~GlobalLocale() { std::locale::global(before_); }
-    GlobalLocale(const GlobalLocale&) = delete;
-    GlobalLocale& operator=(const GlobalLocale&) = delete;
-
-private:
-    std::locale before_;
-};
-
 std::locale decimalComma()
 {
     return std::locale(std::locale::classic(), new DecimalComma);
 }
 
-TEST(NumberText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
+TEST(NumberText, FollowsTheGlobalLocaleLikeANewStream)
 {
     const TextRow rows[] = {{Number(-1234567), "-1.234.567"},
                             {Number(123), "123"},
                             {Number(1234567u), "1.234.567"},
-                            {withKind(Number(0x000004D2000004D2ull), 3), "1.234"},  // four bytes of the eight
+                            {withKind(Number(0x000004D2000004D2ull), 3), "1.234"},  // 4 of the 8 bytes
                             {Number(18446744073709551615ull), "18.446.744.073.709.551.615"},
                             {Number(0.5), "0,5"},
                             {Number(1234.5), "1.234,5"},
@@ -1741,14 +1699,14 @@ TEST(NumberText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
     }
 }
 
-TEST(NumberText, IsWholeOrNotAtAllWhereMemoryRunsOutAlsoUnderAnotherLocale)
+TEST(NumberText, IsCompleteOrThrowsUnderAnotherLocaleWhenMemoryRunsOut)
 {
     const GlobalLocale locale(decimalComma());
     allocation::expectTextCompleteOrThrows(Number(18446744073709551615ull), "18.446.744.073.709.551.615");
     allocation::expectTextCompleteOrThrows(Number(sNodeRef {25, 4294967295}), "Power Supply:4.294.967.295");
 }
 
-TEST(NumberText, IsThatOfAFreshStreamUnderEveryLocale)
+TEST(NumberText, EqualsTheOutputOfANewStream)
 {
     for (const bool comma : {false, true}) {
         SCOPED_TRACE(comma ? "decimal comma" : "classic");
@@ -1773,7 +1731,7 @@ TEST(NumberText, IsThatOfAFreshStreamUnderEveryLocale)
     }
 }
 
-// A program's own way of writing whole numbers and reals.
+// A number facet of a program's own.
 class Bracketed : public std::num_put<char> {
 private:
     iter_type do_put(iter_type out, std::ios_base&, char, long value) const override
@@ -1800,7 +1758,7 @@ private:
     }
 };
 
-TEST(NumberText, IsWrittenAsTheProgramsOwnLocaleWritesNumbers)
+TEST(NumberText, UsesTheNumberFacetOfTheGlobalLocale)
 {
     const TextRow rows[] = {{Number(-7), "<-7>"},
                             {Number(intSmallest), "<-2147483648>"},
@@ -1843,7 +1801,7 @@ TEST(NumberStream, AppliesWidthAndFillToTheWholeText)
     EXPECT_EQ(out.str(), "****2.15|CPU:7***|******-7|*****255|1234567true|");
 }
 
-TEST(NumberStream, LeavesAFailedStreamAsItIs)
+TEST(NumberStream, LeavesAFailedStreamUnchanged)
 {
     std::ostringstream out;
     out.setstate(std::ios_base::failbit);
@@ -1854,17 +1812,17 @@ TEST(NumberStream, LeavesAFailedStreamAsItIs)
 
 // ---- The table of sensor names
 
-// Read during static initialisation, before main: the table has to be ready by then.
+// Read before main: the table must be initialised before the program's own static objects.
 const std::string nameBeforeMain = IC::pst[73];
 const std::string textBeforeMain = text(Number(sNodeRef {52, 1}));
 
-TEST(SensorNames, AreReadyBeforeTheProgramsOwnObjects)
+TEST(SensorNames, AreReadyDuringStaticInitialisation)
 {
     EXPECT_EQ(nameBeforeMain, "LAN End Point");
     EXPECT_EQ(textBeforeMain, "Pellion Alert Config:1");
 }
 
-TEST(SensorNames, AreTheseSeventyFive)
+TEST(SensorNames, EqualTheExpectedNames)
 {
     EXPECT_THAT(IC::pst, testing::ElementsAreArray(sensorNames));
 }

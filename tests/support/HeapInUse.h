@@ -4,8 +4,8 @@
 
 #include <cstddef>
 
-// How many bytes allocated by malloc are in use. Always 0 under a sanitizer that replaces malloc; AddressSanitizer finds
-// leaks itself.
+// How many bytes allocated by malloc are in use. Always 0 under a sanitizer that replaces malloc; AddressSanitizer
+// finds leaks itself.
 inline std::size_t heapInUse()
 {
 #ifdef __has_feature
