@@ -2,7 +2,6 @@
 #include <atomic>
 #include <csignal>
 #include <cstddef>
-#include <cstring>
 #include <functional>
 #include <iomanip>
 #include <map>
@@ -17,12 +16,14 @@
 
 #include <gtest/gtest.h>
 
-#include "support/AllocationFailure.h"
-#include "support/GroupingLocale.h"
 #include "IC/ICException.h"
 #include "IC/Node.h"
-#include "support/PropertySamples.h"
 #include "observe/Refusal.h"
+#include "support/AllocationFailure.h"
+#include "support/GroupingLocale.h"
+#include "support/Hexadecimal.h"
+#include "support/PropertySamples.h"
+#include "support/VirtualTable.h"
 
 namespace {
 
@@ -64,7 +65,7 @@ static_assert(std::is_same_v<decltype(std::declval<const Node&>().getSensor()), 
 static_assert(std::is_same_v<decltype(std::declval<const Node&>().getPath()), std::string>);
 static_assert(std::is_same_v<decltype(std::declval<const Node&>().getParent()), std::string>);
 
-// A class of the agent's, which fills the members of the base class; here everybody may.
+// A node class as an agent derives it, with the protected members made public for the tests.
 class Probe : public Node {
 public:
     Probe() = default;
@@ -101,7 +102,7 @@ public:
 const std::string filledProperties =
     "1: 2 writable: a text that needs memory of its own; 2: 1 read-only: 3600; ";
 
-// Every outcome of a property operation has this shape.
+// Expects an outcome with this status, no value and no message, as every property operation returns.
 void expectOutcome(const Error& outcome, unsigned int status)
 {
     EXPECT_EQ(outcome.getStatus(), status);
@@ -115,7 +116,7 @@ int expectPair(const std::vector<observe::Record>& records, std::size_t first, i
     return expectRecordPair(records, first, "setProperty", "Node", "Vexilon.IC.Node", level, message);
 }
 
-// Expects the calls so far to be of this mutex alone and to leave it held so often, one after the other.
+// Expects all lock calls so far to be on this mutex, and the mutex to be held this often after each of them.
 void expectLockDepths(const ZQ::Mutex& mutex, const std::vector<int>& depths)
 {
     const std::vector<observe::LockCall> calls = observe::lockCalls();
@@ -133,7 +134,7 @@ void expectLockDepths(const ZQ::Mutex& mutex, const std::vector<int>& depths)
     }
 }
 
-// Expects every lock to have been given back, and that another thread obtains it. Forgets what was observed.
+// Expects that every lock was released and that another thread obtains the mutex. Resets the observer.
 void expectFree(const Probe& node)
 {
     EXPECT_EQ(observe::locksHeld(), 0);
@@ -154,7 +155,7 @@ void expectFree(const Probe& node)
     observe::reset();
 }
 
-// Gives the observer's list of lock calls room, so that its growth does not fail in the middle of unlock.
+// Fills the observer's list of lock calls, so that the list does not need memory in unlock.
 void makeRoomForLockCalls(const Node& node)
 {
     for (int i = 0; i < 17; ++i)
@@ -164,10 +165,10 @@ void makeRoomForLockCalls(const Node& node)
 struct Operation {
     const char* name;
     std::function<void(Probe&)> run;
-    std::vector<int> depths;  // how often the lock is held after each call of lock and unlock
+    std::vector<int> depths;  // how often the mutex is held after each call of lock and unlock
 };
 
-// Every operation that takes the lock, on a FilledProbe.
+// Every operation that takes the lock, for a FilledProbe.
 std::vector<Operation> lockingOperations()
 {
     static const PropertyValue value("another text that needs memory of its own");
@@ -209,7 +210,7 @@ std::vector<Operation> lockingOperations()
     };
 }
 
-TEST(NodeConstructor, WithoutASensorGivesAnUnknownNode)
+TEST(NodeConstructor, WithoutASensorMakesAnUnknownNode)
 {
     const Node node;
     EXPECT_EQ(node.getSensor(), 0u);
@@ -223,7 +224,7 @@ TEST(NodeConstructor, WithoutASensorGivesAnUnknownNode)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(NodeConstructor, WithASensorUpTo73GivesANodeWithoutDescription)
+TEST(NodeConstructor, WithASensorUpTo73MakesANodeWithoutDescription)
 {
     for (unsigned int sensor = 0; sensor <= 73; ++sensor) {
         SCOPED_TRACE(sensor);
@@ -251,7 +252,7 @@ TEST(NodeConstructor, RefusesASensorAbove73)
     EXPECT_TRUE(observe::lockCalls().empty());
 }
 
-TEST(NodeConstructor, RefusesASensorInThePlainWordsWhateverTheLocale)
+TEST(NodeConstructor, RefusesASensorInTheSameWordsWhateverTheLocale)
 {
     const GlobalGroupingLocale grouping(1);
     try {
@@ -271,14 +272,8 @@ TEST(NodeConstructor, TakesNoLock)
 
 TEST(NodeConstructor, GivesBackAllMemoryWhenItRunsOut)
 {
-    makeRoomForLockCalls(Node());  // the node that is made locks when it goes
-    const long before = allocation::aliveNow;
-    long allowed = 0;
-    while (!completesWith(allowed, [] { const Node node; }) && allowed < 20)
-        ++allowed;
-    EXPECT_EQ(allocation::aliveNow, before);
-    EXPECT_GT(allowed, 0);  // for the description
-    EXPECT_LT(allowed, 20);
+    makeRoomForLockCalls(Node());  // the destructor of the node locks
+    EXPECT_LT(allocation::expectAllMemoryGivenBack([] { const Node node; }), 20);
 }
 
 TEST(NodeIdentity, IsReadWithoutTheLock)
@@ -293,7 +288,7 @@ TEST(NodeIdentity, IsReadWithoutTheLock)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(NodeIdentity, IsHandedOutAsACopy)
+TEST(NodeIdentity, IsReturnedAsACopy)
 {
     const FilledProbe node;
     node.getPath().clear();
@@ -302,7 +297,7 @@ TEST(NodeIdentity, IsHandedOutAsACopy)
     EXPECT_EQ(node.getParent(), "/");
 }
 
-TEST(NodeComparison, IsThatOfThePathsByUnsignedBytesThenByLength)
+TEST(NodeComparison, ComparesThePathsByUnsignedBytesThenByLength)
 {
     const struct {
         std::string a;
@@ -343,7 +338,16 @@ TEST(NodeComparison, IsThatOfThePathsByUnsignedBytesThenByLength)
     }
 }
 
-TEST(NodeComparison, LooksAtNothingButThePath)
+TEST(NodeComparison, ComparesTheWholePath)
+{
+    const Probe a(20, "/chassis/board/fan1");
+    const Probe b(20, "/chassis/board/fan2");
+    EXPECT_TRUE(a < b);
+    EXPECT_FALSE(a > b);
+    EXPECT_FALSE(a == b);
+}
+
+TEST(NodeComparison, IgnoresAllButThePath)
 {
     Probe fan(20, "same");
     Probe disk(11, "same");
@@ -379,7 +383,7 @@ TEST(NodeDestructor, LocksOnce)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(NodeDestructor, LocksAlsoWithoutProperties)
+TEST(NodeDestructor, LocksWithoutPropertiesToo)
 {
     std::optional<Probe> node(std::in_place, 20u);
     const ZQ::Mutex* const mutex = &node->mutex;
@@ -387,7 +391,7 @@ TEST(NodeDestructor, LocksAlsoWithoutProperties)
     expectLockDepths(*mutex, {1, 0});
 }
 
-TEST(NodeDestructor, LocksWhenReachedThroughTheBase)
+TEST(NodeDestructor, LocksWhenCalledThroughTheBaseClass)
 {
     std::unique_ptr<Node> node = std::make_unique<FilledProbe>();
     node.reset();
@@ -401,7 +405,7 @@ TEST(NodeDestructor, LocksWhenReachedThroughTheBase)
 int releasedUnderTheLock = 0;
 int releasedWithoutTheLock = 0;
 
-TEST(NodeDestructor, EmptiesThePropertiesUnderTheLock)
+TEST(NodeDestructor, DestroysThePropertiesUnderTheLock)
 {
     std::optional<Probe> node(std::in_place, 20u);
     node->properties.insert({1u, PropertyValue("a text that needs memory of its own")});
@@ -415,10 +419,10 @@ TEST(NodeDestructor, EmptiesThePropertiesUnderTheLock)
     node.reset();
     allocation::onRelease = nullptr;
     EXPECT_GE(releasedUnderTheLock, 5);    // two entries, two objects, and the characters of the text
-    EXPECT_EQ(releasedWithoutTheLock, 0);  // no other member needs memory here
+    EXPECT_EQ(releasedWithoutTheLock, 0);  // no other member of this node owns memory
 }
 
-TEST(NodeDestructor, GoesOnWhenTheLockSaysNo)
+TEST(NodeDestructor, ContinuesWhenLockReturnsFalse)
 {
     const long before = allocation::aliveNow;
     {
@@ -442,7 +446,7 @@ TEST(NodeDestructor, EndsTheProgramWhereTheLockThrows)
         testing::KilledBySignal(SIGABRT), "observe::Thrown");
 }
 
-TEST(NodeStatus, IsReadUnderBothNames)
+TEST(NodeStatus, IsReadByGetterAndConversion)
 {
     Probe node(20);
     for (const unsigned int code : {0u, 5u, 85u, 86u, 4294967295u}) {
@@ -452,7 +456,7 @@ TEST(NodeStatus, IsReadUnderBothNames)
     }
 }
 
-TEST(NodeDescription, IsHandedOutAsACopy)
+TEST(NodeDescription, IsReturnedAsACopy)
 {
     const FilledProbe node;
     std::string copy = node.getDescription();
@@ -480,7 +484,7 @@ TEST(NodeGetProperty, CopiesAStoredValueWithItsMark)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(NodeGetProperty, LeavesTheValueAloneWhenThereIsNone)
+TEST(NodeGetProperty, DoesNotChangeTheValueForAMissingKey)
 {
     const FilledProbe node;
     for (const unsigned int key : {0u, 3u, 4294967295u}) {
@@ -497,7 +501,7 @@ TEST(NodeGetProperty, LeavesTheValueAloneWhenThereIsNone)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(NodeGetProperty, GivesAnIndependentCopy)
+TEST(NodeGetProperty, ReturnsAnIndependentCopy)
 {
     const FilledProbe node;
     PropertyValue value(PropertyValue::KIND_UNKNOWN);
@@ -506,7 +510,27 @@ TEST(NodeGetProperty, GivesAnIndependentCopy)
     EXPECT_EQ(seen(node.properties), filledProperties);
 }
 
-TEST(NodeGetProperties, CopiesTheMapWithItsMarks)
+TEST(NodeGetProperty, DoesNotChangeTheValueWhenMemoryRunsOut)
+{
+    const FilledProbe node;
+    for (const PropertyValue& old : otherSamples(true)) {
+        SCOPED_TRACE(seen(old));
+        for (long allowed = 0;; ++allowed) {
+            ASSERT_LT(allowed, 100);
+            PropertyValue value(old);
+            observe::reset();
+            makeRoomForLockCalls(node);
+            if (completesWith(allowed, [&] { static_cast<void>(node.getProperty(1, value)); })) {
+                EXPECT_EQ(seen(value), "2 writable: a text that needs memory of its own");
+                break;
+            }
+            EXPECT_EQ(seen(value), seen(old));
+        }
+        expectFree(node);
+    }
+}
+
+TEST(NodeGetProperties, CopiesTheMapWithTheReadOnlyMarks)
 {
     const FilledProbe node;
     PropertyMap copy = node.getProperties();
@@ -517,9 +541,19 @@ TEST(NodeGetProperties, CopiesTheMapWithItsMarks)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(NodeGetProperties, GivesAnEmptyMapForNoProperties)
+TEST(NodeGetProperties, ReturnsAnEmptyMapForNoProperties)
 {
     EXPECT_TRUE(Node(20).getProperties().empty());
+}
+
+TEST(NodeGetProperties, GivesBackAllMemoryWhenItRunsOut)
+{
+    const FilledProbe node;
+    makeRoomForLockCalls(node);
+    const long allowed =
+        allocation::expectAllMemoryGivenBack([&] { static_cast<void>(node.getProperties()); });
+    EXPECT_EQ(allowed, 5);  // two entries, two objects, and the characters of the text
+    expectFree(node);
 }
 
 TEST(NodeSetProperty, ReplacesAWritableValueBetweenAllKinds)
@@ -566,7 +600,7 @@ TEST(NodeSetProperty, RefusesAReadOnlyValue)
     }
 }
 
-TEST(NodeSetProperty, RefusesAMissingKeyAndAddsNone)
+TEST(NodeSetProperty, RefusesAMissingKeyAndAddsNothing)
 {
     FilledProbe node;
     for (const unsigned int key : {0u, 3u, 7u, 4294967295u}) {
@@ -582,7 +616,7 @@ TEST(NodeSetProperty, RefusesAMissingKeyAndAddsNone)
     }
 }
 
-TEST(NodeSetProperty, RecordsTheValueAsItsTextSaysIt)
+TEST(NodeSetProperty, RecordsTheTextOfTheValue)
 {
     const struct {
         PropertyValue value;
@@ -609,7 +643,7 @@ TEST(NodeSetProperty, RecordsTheValueAsItsTextSaysIt)
     }
 }
 
-TEST(NodeSetProperty, TakesTheMarkOfTheNewValue)
+TEST(NodeSetProperty, TakesTheReadOnlyMarkOfTheNewValue)
 {
     FilledProbe node;
     expectOutcome(node.setProperty(1, PropertyValue("last", true)), 0);
@@ -617,7 +651,7 @@ TEST(NodeSetProperty, TakesTheMarkOfTheNewValue)
     EXPECT_EQ(seen(node.properties), "1: 2 read-only: last; 2: 1 read-only: 3600; ");
 }
 
-TEST(NodeSetProperty, TakesTheStoredValueItself)
+TEST(NodeSetProperty, AcceptsAReferenceToAStoredValue)
 {
     FilledProbe node;
     expectOutcome(node.setProperty(1, node.properties.at(1)), 0);
@@ -625,7 +659,7 @@ TEST(NodeSetProperty, TakesTheStoredValueItself)
     EXPECT_EQ(seen(node.properties), "1: 1 read-only: 3600; 2: 1 read-only: 3600; ");
 }
 
-TEST(NodeSetProperty, WritesTheRequestBeforeTheLockAndTheRefusalUnderIt)
+TEST(NodeSetProperty, RecordsTheRequestBeforeTheLockAndTheRefusalUnderIt)
 {
     const struct {
         unsigned int key;
@@ -646,7 +680,7 @@ TEST(NodeSetProperty, WritesTheRequestBeforeTheLockAndTheRefusalUnderIt)
     }
 }
 
-TEST(NodeSetProperty, LeavesTheOldValueWhenMemoryRunsOut)
+TEST(NodeSetProperty, KeepsTheOldValueWhenMemoryRunsOut)
 {
     const auto values = otherSamples(true);
     for (const PropertyValue& old : samples(false)) {
@@ -672,7 +706,7 @@ TEST(NodeSetProperty, LeavesTheOldValueWhenMemoryRunsOut)
     }
 }
 
-TEST(NodeLock, IsTakenByEachOperationOnItsGuardedState)
+TEST(NodeLock, IsTakenByEachOperationOnGuardedState)
 {
     for (const Operation& operation : lockingOperations()) {
         SCOPED_TRACE(operation.name);
@@ -685,7 +719,7 @@ TEST(NodeLock, IsTakenByEachOperationOnItsGuardedState)
     }
 }
 
-TEST(NodeLock, IsTakenAndGivenBackAlsoWhenItSaysNo)
+TEST(NodeLock, IsReleasedEvenWhenLockReturnsFalse)
 {
     for (const Operation& operation : lockingOperations()) {
         SCOPED_TRACE(operation.name);
@@ -698,7 +732,7 @@ TEST(NodeLock, IsTakenAndGivenBackAlsoWhenItSaysNo)
     }
 }
 
-TEST(NodeLock, MakesNoDifferenceWhenItSaysNo)
+TEST(NodeLock, ThatReturnsFalseChangesNoResult)
 {
     FilledProbe node;
     observe::setLockResult(false);
@@ -720,7 +754,7 @@ TEST(NodeLock, MakesNoDifferenceWhenItSaysNo)
     EXPECT_EQ(seen(node.properties), "1: 2 writable: abc; 2: 1 read-only: 3600; ");
 }
 
-TEST(NodeLock, IsGivenBackWhereverThePlatformThrows)
+TEST(NodeLock, IsReleasedWhereverThePlatformThrows)
 {
     for (const Operation& operation : lockingOperations()) {
         SCOPED_TRACE(operation.name);
@@ -748,7 +782,7 @@ TEST(NodeLock, IsGivenBackWhereverThePlatformThrows)
     }
 }
 
-TEST(NodeLock, IsGivenBackWhereverMemoryRunsOut)
+TEST(NodeLock, IsReleasedWhereverMemoryRunsOut)
 {
     for (const Operation& operation : lockingOperations()) {
         SCOPED_TRACE(operation.name);
@@ -767,9 +801,9 @@ TEST(NodeLock, IsGivenBackWhereverMemoryRunsOut)
     }
 }
 
-TEST(NodeLock, IsGivenBackWhenTheLoggerThrowsUnderIt)
+TEST(NodeLock, IsReleasedWhenTheLoggerThrowsUnderIt)
 {
-    // The first log and trace records are the request; the second ones are written under the lock.
+    // The first log and trace record report the request; the second ones are written under the lock.
     for (const unsigned int key : {2u, 3u}) {
         for (const observe::Call call :
              {observe::Call::bufferConstructor, observe::Call::log, observe::Call::trace}) {
@@ -784,40 +818,70 @@ TEST(NodeLock, IsGivenBackWhenTheLoggerThrowsUnderIt)
     }
 }
 
-TEST(NodeGetProperty, LeavesTheValueAloneWhenMemoryRunsOut)
+// The test changes the node at each lock and unlock; the operation must see what was there in between.
+TEST(NodeLock, IsHeldWhileAValueIsRead)
 {
-    const FilledProbe node;
-    for (const PropertyValue& old : otherSamples(true)) {
-        SCOPED_TRACE(seen(old));
-        for (long allowed = 0;; ++allowed) {
-            ASSERT_LT(allowed, 100);
-            PropertyValue value(old);
-            observe::reset();
-            makeRoomForLockCalls(node);
-            if (completesWith(allowed, [&] { static_cast<void>(node.getProperty(1, value)); })) {
-                EXPECT_EQ(seen(value), "2 writable: a text that needs memory of its own");
-                break;
-            }
-            EXPECT_EQ(seen(value), seen(old));
-        }
-        expectFree(node);
-    }
+    Probe node(20);
+    const auto fill = [&node](unsigned int code, const std::string& text) {
+        node.status = static_cast<Node::StatusType>(code);
+        node.description = text;
+        node.properties.insert_or_assign(1u, PropertyValue(text));
+    };
+    const auto within = [&](auto operation) {
+        fill(1, "before");
+        observe::onLock([&](bool lock) { lock ? fill(2, "within") : fill(3, "after"); });
+        auto result = operation();
+        observe::onLock(nullptr);
+        return result;
+    };
+    EXPECT_EQ(within([&] { return node.getStatus(); }), 2u);
+    EXPECT_EQ(within([&] { return node.operator Node::StatusType(); }), 2u);
+    EXPECT_EQ(within([&] { return node.getDescription(); }), "within");
+    EXPECT_EQ(within([&] { return seen(node.getProperties()); }), "1: 2 writable: within; ");
+    EXPECT_EQ(within([&] {
+                  PropertyValue value("");
+                  static_cast<void>(node.getProperty(1, value));
+                  return seen(value);
+              }),
+              "2 writable: within");
 }
 
-TEST(NodeGetProperties, GivesBackAllMemoryWhenItRunsOut)
+TEST(NodeLock, IsHeldWhileAKeyIsLookedUp)
 {
-    const FilledProbe node;
-    makeRoomForLockCalls(node);
-    const long before = allocation::aliveNow;
-    long allowed = 0;
-    while (!completesWith(allowed, [&] { static_cast<void>(node.getProperties()); }) && allowed < 8)
-        ++allowed;
-    EXPECT_EQ(allocation::aliveNow, before);
-    EXPECT_EQ(allowed, 5);  // two entries, two objects, and the characters of the text
-    expectFree(node);
+    Probe node(20);
+    observe::onLock([&](bool lock) {
+        node.properties.clear();
+        if (lock)
+            node.properties.emplace(1u, PropertyValue("within"));
+    });
+    PropertyValue value("");
+    EXPECT_EQ(node.getProperty(1, value).getStatus(), Error::STATUS_SUCCESS);
+    EXPECT_EQ(node.setProperty(1, PropertyValue("changed")).getStatus(), Error::STATUS_SUCCESS);
+    observe::onLock([&](bool lock) {
+        node.properties.clear();
+        if (!lock)
+            node.properties.emplace(1u, PropertyValue("after"));
+    });
+    EXPECT_EQ(node.getProperty(1, value).getStatus(), Error::STATUS_NO_SUCH_PROPERTY);
+    EXPECT_EQ(node.setProperty(1, value).getStatus(), Error::STATUS_NO_SUCH_PROPERTY);
+    EXPECT_EQ(seen(node.properties), "1: 2 writable: after; ");
 }
 
-TEST(NodeText, HasThePathInHexadecimalTheSensorAndTheStatus)
+TEST(NodeLock, IsHeldWhileAValueIsChanged)
+{
+    Probe node(20);
+    node.properties.emplace(1u, PropertyValue("old"));
+    std::string atUnlock;
+    observe::onLock([&](bool lock) {
+        if (!lock)
+            atUnlock = seen(node.properties);
+    });
+    static_cast<void>(node.setProperty(1, PropertyValue("new")));
+    observe::onLock(nullptr);
+    EXPECT_EQ(atUnlock, "1: 2 writable: new; ");
+}
+
+TEST(NodeText, ListsPathInHexadecimalSensorAndStatus)
 {
     EXPECT_EQ(Node().operator std::string(), "Node  : 0, status = 0");
     const struct {
@@ -846,7 +910,7 @@ TEST(NodeText, HasThePathInHexadecimalTheSensorAndTheStatus)
     EXPECT_TRUE(observe::records().empty());
 }
 
-TEST(NodeText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
+TEST(NodeText, FollowsTheGlobalLocaleLikeANewStream)
 {
     Probe node(20, "1234");
     node.status = static_cast<Node::StatusType>(1234567);
@@ -861,7 +925,7 @@ TEST(NodeText, FollowsTheGlobalLocaleAsAFreshStreamDoes)
     EXPECT_EQ(node.operator std::string(), "Node 31323334 : 20, status = 1234567");
 }
 
-TEST(NodeText, IsWholeOrNotAtAllWhenMemoryRunsOut)
+TEST(NodeText, IsCompleteOrThrowsWhenMemoryRunsOut)
 {
     Probe node(20, "/a/longer/path");
     node.status = static_cast<Node::StatusType>(1234567);
@@ -869,9 +933,9 @@ TEST(NodeText, IsWholeOrNotAtAllWhenMemoryRunsOut)
     allocation::expectTextCompleteOrThrows(node, "Node 2f612f6c6f6e6765722f70617468 : 20, status = 1234567");
 }
 
-TEST(NodeText, IsMadeWithoutTheLock)
+TEST(NodeText, AllocatesItsResultAfterTheUnlock)
 {
-    long atLastUnlock = 0;  // written until the node is gone
+    long atLastUnlock = 0;  // declared before the node, because the node's destructor unlocks
     const Probe node(20, "a path");
     makeRoomForLockCalls(node);
     observe::onLock([&](bool lock) {
@@ -879,7 +943,6 @@ TEST(NodeText, IsMadeWithoutTheLock)
             atLastUnlock = allocation::madeSoFar;
     });
     const std::string text = node.operator std::string();
-    // What needs memory is the text itself, when it is complete.
     EXPECT_GT(allocation::madeSoFar, atLastUnlock);
 }
 
@@ -899,37 +962,16 @@ TEST(NodeStream, InsertsTheNodeAsOneText)
 TEST(NodeHexstring, HasTwoLowerCaseDigitsForEachByte)
 {
     const Node node;
-    const struct {
-        std::string bytes;
-        const char* digits;
-    } rows[] = {{"", ""},
-                {"ab", "6162"},
-                {"/a", "2f61"},
-                {"\xff", "ff"},
-                {std::string("\0\x7f\xff", 3), "007fff"},
-                {std::string("a\0b", 3), "610062"},
-                {"\x09\x0a\x90\xa0", "090a90a0"}};
-    for (const auto& row : rows)
-        EXPECT_EQ(node.hexstring(row.bytes), row.digits);
-    const GlobalGroupingLocale grouping(1);
-    for (const auto& row : rows)
-        EXPECT_EQ(node.hexstring(row.bytes), row.digits);
+    expectTwoLowerCaseDigitsForEachByte([&](const std::string& bytes) { return node.hexstring(bytes); });
 }
 
-TEST(NodeHexstring, NamesEveryByte)
+TEST(NodeHexstring, ConvertsAllBytes)
 {
-    const std::string digits = "0123456789abcdef";
-    std::string all;
-    std::string expected;
-    for (unsigned int code = 0; code < 256; ++code) {
-        all += static_cast<char>(code);
-        expected += digits[code / 16];
-        expected += digits[code % 16];
-    }
-    EXPECT_EQ(Node().hexstring(all), expected);
+    const Node node;
+    expectTwoLowerCaseDigitsForAllBytes([&](const std::string& bytes) { return node.hexstring(bytes); });
 }
 
-// Overrides what an agent's class may override.
+// Overrides each virtual function except the text.
 class Overriding : public Probe {
 public:
     Overriding() : Probe(20, "ab") { }
@@ -956,7 +998,7 @@ public:
     operator std::string() const override { return "a node of another kind"; }
 };
 
-TEST(NodeVirtual, OperationsReachTheDerivedClass)
+TEST(NodeVirtual, CallsReachTheDerivedClass)
 {
     Overriding overriding;
     Node& node = overriding;
@@ -973,10 +1015,10 @@ TEST(NodeVirtual, TextCallsTheOverriddenStatusUnderTheLock)
     const Overriding node;
     EXPECT_EQ(node.operator std::string(), "Node 6162 : 20, status = 42");
     EXPECT_EQ(node.locksHeldInside, 1);
-    expectLockDepths(node.mutex, {1, 0});  // the override takes none
+    expectLockDepths(node.mutex, {1, 0});  // the override does not lock
 }
 
-TEST(NodeVirtual, TextGivesTheLockBackWhenTheOverriddenStatusThrows)
+TEST(NodeVirtual, TextReleasesTheLockWhenTheOverriddenStatusThrows)
 {
     Overriding node;
     node.throws = true;
@@ -985,7 +1027,7 @@ TEST(NodeVirtual, TextGivesTheLockBackWhenTheOverriddenStatusThrows)
     expectFree(node);
 }
 
-TEST(NodeVirtual, StatusOperatorDoesNotReachTheOverriddenStatus)
+TEST(NodeVirtual, StatusConversionDoesNotCallTheOverriddenStatus)
 {
     Overriding node;
     node.status = static_cast<Node::StatusType>(7);
@@ -1004,18 +1046,7 @@ TEST(NodeVirtual, StreamWritesTheOverriddenText)
     EXPECT_TRUE(observe::lockCalls().empty());
 }
 
-// A pointer to a virtual member function holds the distance of its entry from the start of the table (some
-// processors' pointers are one more).
-template <class Member>
-std::ptrdiff_t slotOf(Member member)
-{
-    std::ptrdiff_t parts[2];
-    static_assert(sizeof parts == sizeof member);
-    std::memcpy(parts, &member, sizeof parts);
-    return parts[0] / static_cast<std::ptrdiff_t>(sizeof(void*));
-}
-
-TEST(NodeVirtual, SlotsStandInTheirOrderAfterTheTwoDestructors)
+TEST(NodeVirtual, FunctionsFollowTheTwoDestructorsInTheVirtualTable)
 {
     EXPECT_EQ(slotOf(&Node::getStatus), 2);
     EXPECT_EQ(slotOf(&Node::getDescription), 3);
@@ -1025,7 +1056,7 @@ TEST(NodeVirtual, SlotsStandInTheirOrderAfterTheTwoDestructors)
     EXPECT_EQ(slotOf(&Node::operator std::string), 7);
 }
 
-TEST(NodeThreads, ShareOneNode)
+TEST(NodeThreads, CanShareOneNode)
 {
     constexpr int rounds = 100;
     FilledProbe node;
@@ -1068,80 +1099,7 @@ TEST(NodeThreads, ShareOneNode)
     expectFree(node);
 }
 
-// What each operation reads and writes has to be read and written between lock and unlock: the test changes it
-// at both ends.
-TEST(NodeLock, CoversWhatIsRead)
-{
-    Probe node(20);
-    const auto fill = [&node](unsigned int code, const std::string& text) {
-        node.status = static_cast<Node::StatusType>(code);
-        node.description = text;
-        node.properties.insert_or_assign(1u, PropertyValue(text));
-    };
-    const auto within = [&](auto operation) {
-        fill(1, "before");
-        observe::onLock([&](bool lock) { lock ? fill(2, "within") : fill(3, "after"); });
-        auto result = operation();
-        observe::onLock(nullptr);
-        return result;
-    };
-    EXPECT_EQ(within([&] { return node.getStatus(); }), 2u);
-    EXPECT_EQ(within([&] { return node.operator Node::StatusType(); }), 2u);
-    EXPECT_EQ(within([&] { return node.getDescription(); }), "within");
-    EXPECT_EQ(within([&] { return seen(node.getProperties()); }), "1: 2 writable: within; ");
-    EXPECT_EQ(within([&] {
-                  PropertyValue value("");
-                  static_cast<void>(node.getProperty(1, value));
-                  return seen(value);
-              }),
-              "2 writable: within");
-}
-
-TEST(NodeLock, CoversTheLookUp)
-{
-    Probe node(20);
-    observe::onLock([&](bool lock) {
-        node.properties.clear();
-        if (lock)
-            node.properties.emplace(1u, PropertyValue("within"));
-    });
-    PropertyValue value("");
-    EXPECT_EQ(node.getProperty(1, value).getStatus(), Error::STATUS_SUCCESS);
-    EXPECT_EQ(node.setProperty(1, PropertyValue("changed")).getStatus(), Error::STATUS_SUCCESS);
-    observe::onLock([&](bool lock) {
-        node.properties.clear();
-        if (!lock)
-            node.properties.emplace(1u, PropertyValue("after"));
-    });
-    EXPECT_EQ(node.getProperty(1, value).getStatus(), Error::STATUS_NO_SUCH_PROPERTY);
-    EXPECT_EQ(node.setProperty(1, value).getStatus(), Error::STATUS_NO_SUCH_PROPERTY);
-    EXPECT_EQ(seen(node.properties), "1: 2 writable: after; ");
-}
-
-TEST(NodeLock, CoversTheChange)
-{
-    Probe node(20);
-    node.properties.emplace(1u, PropertyValue("old"));
-    std::string atUnlock;
-    observe::onLock([&](bool lock) {
-        if (!lock)
-            atUnlock = seen(node.properties);
-    });
-    static_cast<void>(node.setProperty(1, PropertyValue("new")));
-    observe::onLock(nullptr);
-    EXPECT_EQ(atUnlock, "1: 2 writable: new; ");
-}
-
-TEST(NodeComparison, LooksAtTheWholePath)
-{
-    const Probe a(20, "/chassis/board/fan1");
-    const Probe b(20, "/chassis/board/fan2");
-    EXPECT_TRUE(a < b);
-    EXPECT_FALSE(a > b);
-    EXPECT_FALSE(a == b);
-}
-
-TEST(NodeSensor, NamesTheCodesAsTheTableDoes)
+TEST(NodeSensor, CodesHaveTheirValues)
 {
     const Node::SensorType codes[] = {Node::SENSOR_UNKNOWN,
                                       Node::SENSOR_CHASSIS,
