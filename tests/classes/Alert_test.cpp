@@ -79,7 +79,7 @@ void expectRefused(unsigned int severity, unsigned int alertClass, unsigned int 
     EXPECT_EQ(observe::dateTimesAlive(), alive);
 }
 
-TEST(AlertCodes, AreNamedAtBothEnds)
+TEST(AlertCodes, SmallestAndLargestHaveTheirValues)
 {
     EXPECT_EQ(Alert::SEVERITY_SMALLEST, 0u);
     EXPECT_EQ(Alert::SEVERITY_LARGEST, 3u);

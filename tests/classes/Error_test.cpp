@@ -95,7 +95,7 @@ TEST(ErrorStatus, IsRefusedAboveSixteen)
     }
 }
 
-TEST(ErrorStatus, HasNamedCodes)
+TEST(ErrorStatus, NamedCodesHaveTheirValues)
 {
     EXPECT_EQ(Error::STATUS_SUCCESS, 0u);
     EXPECT_EQ(Error::STATUS_NO_SUCH_PROPERTY, 5u);
@@ -126,7 +126,7 @@ TEST(ErrorStatus, IsCheckedAfterTheMessageIsCopied)
         [&] { const Error error(message.c_str(), 17); },
     };
     for (const auto& construct : constructions) {
-        // The only allocation, the message's, fails; the status has not been refused before it.
+        // The allocation of the message fails before the status is checked.
         EXPECT_FALSE(allocation::completesWith(0, construct));
         EXPECT_TRUE(observe::records().empty());
         bool refused = false;

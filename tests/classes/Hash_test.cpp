@@ -38,7 +38,7 @@ std::size_t hashOf(const Value& value)
     return std::hash<Value>()(value);
 }
 
-// The same bytes under another kind.
+// The number with another kind and the same bytes.
 Number readAs(Number::KindType kind, Number number)
 {
     number.setKind(static_cast<unsigned char>(kind));

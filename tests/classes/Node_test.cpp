@@ -1182,7 +1182,7 @@ TEST(NodeSensor, CodesHaveTheirValues)
     EXPECT_EQ(Node::SENSOR_LARGEST, 73u);
 }
 
-TEST(NodeStatusCodes, AreNamedAtBothEnds)
+TEST(NodeStatusCodes, InitialAndLargestHaveTheirValues)
 {
     EXPECT_EQ(Node::STATUS_INITIAL, 0u);
     EXPECT_EQ(Node::STATUS_LARGEST, 85u);

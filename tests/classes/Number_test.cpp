@@ -452,7 +452,7 @@ TEST(NumberConstruction, ACopyKeepsContentAndNodeReference)
 
 // ---- initKind
 
-TEST(NumberInitKind, GivesTheInitialContentWhateverTheOldOne)
+TEST(NumberInitKind, GivesTheInitialContentWhateverTheOldContent)
 {
     for (const unsigned int code : kindsWithZeroContent) {
         for (const Number& old : {Number(18446744073709551615ull), Number(-1L, 999), Number(-0.1)}) {

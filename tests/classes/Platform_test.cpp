@@ -160,7 +160,7 @@ TEST(DateTimeText, IsTheSecondsOutsideTheYears0To9999)
     }
 }
 
-TEST(DateTimeText, HasEveryMillisecond)
+TEST(DateTimeText, ShowsEveryMillisecond)
 {
     for (unsigned int millisecond = 1; millisecond <= 999; ++millisecond) {
         const std::string digits = std::to_string(1000 + millisecond).substr(1);
@@ -349,7 +349,7 @@ TEST(MessageBuffer, IsCompleteOrThrowsWhenMemoryRunsOut)
     }
 }
 
-// Restores the sink after each test.
+// Gives each test the default sink, and restores the earlier sink afterwards.
 class Sink : public testing::Test {
 protected:
     void SetUp() override { before_ = VXLog::setRecordSink(nullptr); }

@@ -203,7 +203,8 @@ TEST(PropertyComparison, OfNumberArraysUsesOnlyLessThanForElements)
     const PropertyValue five = numbers({Number(5u)});
     const char* const logged = "<: cannot compare two different kinds of number, kind1=3, kind2=7";
     const char* const sentence = "Cannot compare two different kinds of number";
-    // The array also asks whether five is less than infinity, which is refused: in every order of the operands.
+    // Where a < b is false for two elements, the comparison asks for b < a. So all of these reach five < infinity, which
+    // is refused.
     expectNumbersRefused([&] { return infinity < five; }, "operator<", logged, sentence);
     expectNumbersRefused([&] { return infinity > five; }, "operator<", logged, sentence);
     expectNumbersRefused([&] { return five < infinity; }, "operator<", logged, sentence);
