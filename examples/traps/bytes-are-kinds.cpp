@@ -6,7 +6,7 @@ int main()
 {
     const std::uint8_t byte = 3;
     const std::uint16_t word = 3;
-    const IC::Number fromByte(byte);  // the kind with the code 3, and its first value
+    const IC::Number fromByte(byte);  // kind 3, KIND_UINT32, with the value 0
     const IC::Number fromWord(word);  // a signed number
     const IC::Number wanted(static_cast<unsigned int>(byte));
     std::cout << fromByte << " of kind " << fromByte.getKind() << '\n';

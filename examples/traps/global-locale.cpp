@@ -15,7 +15,7 @@ int main()
     const IC::Number number(1234567u);
     std::ostringstream out;
     out.imbue(std::locale::classic());
-    out << number << '\n';  // the global locale, not the stream's
+    out << number << '\n';  // formatted by the global locale
     const unsigned int native = number;
     out << native << '\n';
     std::cout << out.str();

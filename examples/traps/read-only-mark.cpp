@@ -13,7 +13,7 @@ int main()
     std::cout << std::boolalpha;
 
     IC::PropertyValue model("AFB0812", true);
-    model = IC::PropertyValue("AFB0912");  // not refused, and writable from now on
+    model = IC::PropertyValue("AFB0912");  // not refused, and writable again
     std::cout << model << ' ' << model.readOnly() << '\n';
     model = IC::PropertyValue("AFB0912", true);
     std::cout << model << ' ' << model.readOnly() << '\n';
@@ -21,5 +21,5 @@ int main()
     Fan fan;
     std::cout << fan.setProperty(Fan::SPEED, IC::PropertyValue(IC::Number(4200u), true)) << '\n';
     std::cout << fan.setProperty(Fan::SPEED, IC::PropertyValue(IC::Number(4800u)))
-              << '\n';  // the first one marked it
+              << '\n';  // read-only since the call above
 }
