@@ -8,9 +8,9 @@ void printVersion(const IC::PropertyValue& value)
     try {
         const IC::Version2 version = value;
         std::cout << "version " << +version.major << '.' << +version.minor << '\n';
-    } catch (const IC::PropertyValueInvalidKind& refusal) {  // the property holds something else
+    } catch (const IC::PropertyValueInvalidKind& refusal) {  // the property is not a number
         std::cout << "no number: " << refusal.what() << '\n';
-    } catch (const std::out_of_range& refusal) {  // a number, but none that is a version
+    } catch (const std::out_of_range& refusal) {  // a number that does not fit into a version
         std::cout << "no version: " << refusal.what() << '\n';
     }
 }

@@ -18,7 +18,7 @@ FanProvider::FanProvider(const std::string& model) : Node(SENSOR_FAN)
 
 void FanProvider::measured(unsigned int speed)
 {
-    IC::PropertyValue value {IC::Number(speed)};  // what can fail comes first
+    IC::PropertyValue value {IC::Number(speed)};  // may throw, so it comes before any change
     const Lock lock(mutex);
     properties.at(SPEED) = std::move(value);
     status = speed == 0 ? stopped : STATUS_INITIAL;

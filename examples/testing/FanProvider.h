@@ -3,17 +3,17 @@
 #include "IC/Alert.h"
 #include "IC/Node.h"
 
-// A fan whose speed comes from somewhere else, and the alert that it has stopped.
+// A fan with a measured speed, and the alert that the fan has stopped.
 class FanProvider : public IC::Node {
 public:
     enum { MODEL = 1, SPEED = 2 };
 
     explicit FanProvider(const std::string& model);
 
-    // Takes over a measurement, in revolutions a minute. Under the node's lock, so that nobody sees the speed of one
-    // moment with the status of another.
+    // Stores a measured speed in revolutions per minute. Speed and status change under one lock, so no reader sees
+    // the new speed with the old status.
     void measured(unsigned int speed);
 
-    // What to tell the operator about the present state.
+    // The alert for the operator, with the present status.
     IC::Alert alert() const;
 };

@@ -7,8 +7,8 @@
 
 #include "observe/GoogleTest.h"
 
-// What a provider's test can see with IC::Testing: the records, the locks and the clock, and what becomes of the
-// provider where the platform fails.
+// What a provider's test checks with IC::Testing: the records, the locks and the clock, and the state of the provider
+// when the platform fails.
 
 TEST(FanProvider, ShowsTheSpeedThatWasMeasured)
 {
