@@ -24,7 +24,7 @@ int main()
     std::cout << "changing the model: " << fan.setProperty(Fan::MODEL, value) << '\n';
     try {
         fan.getProperty(Fan::MODEL, value);
-        unsigned int model = value;  // a text is no number
+        unsigned int model = value;  // throws: the model is a text
         std::cout << model << '\n';
     } catch (const IC::PropertyValueInvalidKind& refusal) {
         std::cout << refusal.what() << '\n';
