@@ -14,9 +14,10 @@ namespace IC {
 /// An event that the agent raises: when, how severe, of which class, with which node status, about which nodes, and a
 /// text.
 ///
-/// A plain value, checked once when it is built; one object belongs to one thread at a time. A refusal logs, throws
-/// and changes nothing; docs/refusals.md has the texts. If logging throws, that exception propagates instead. What
-/// copies a text may throw std::bad_alloc; what copies or prints the time stamp throws what ZQ::DateTime throws.
+/// A plain value, checked once when it is built; one object belongs to one thread at a time. A refusal
+/// [logs](docs/refusals.md), throws and changes nothing. If logging throws, that exception propagates instead.
+/// Operations that copy a text may throw std::bad_alloc; those that copy or print the time stamp throw what
+/// ZQ::DateTime throws.
 ///
 ///     IC::Alert alert(2, 1, {"/fan/1"}, 5, "Fan failed");
 ///     std::cout << alert;                        // Alert 2; 1; 5; Fan failed; <time>; { 2f66616e2f31 }
@@ -101,6 +102,7 @@ private:
     std::string message_;
 };
 
+/// @relates Alert
 /// Inserts std::string(alert) as one text: width and fill apply to the whole. If the conversion throws, nothing is
 /// inserted.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const Alert& alert);

@@ -14,8 +14,8 @@ namespace IC {
 /// One member of an enumeration as a plain unsigned number; it does not know which enumeration.
 ///
 /// A trivially copyable value; one object belongs to one thread at a time. `std::hash` agrees with `==`. A refusal
-/// logs, throws and changes nothing; docs/refusals.md has the texts. If logging throws, that exception propagates
-/// instead. Otherwise only text conversion throws (std::bad_alloc).
+/// [logs](docs/refusals.md), throws and changes nothing. If logging throws, that exception propagates instead.
+/// Otherwise only text conversion throws (std::bad_alloc).
 ///
 ///     IC::EnumValue state(7u);
 ///     unsigned char code = state;                // 7
@@ -59,6 +59,7 @@ private:
 };
 
 /// @name Comparison
+/// @relates EnumValue
 /// As unsigned numbers; nothing is refused.
 ///@{
 IC_EXPORT bool operator==(const EnumValue& a, const EnumValue& b);
@@ -69,6 +70,7 @@ IC_EXPORT bool operator>(const EnumValue& a, const EnumValue& b);
 IC_EXPORT bool operator>=(const EnumValue& a, const EnumValue& b);
 ///@}
 
+/// @relates EnumValue
 /// Inserts std::string(value) as one text: width and fill apply to the whole. If the conversion throws, nothing is
 /// inserted.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const EnumValue& value);

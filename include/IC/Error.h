@@ -11,9 +11,9 @@ namespace IC {
 
 /// The outcome of an operation: a status, perhaps a number, perhaps a text.
 ///
-/// A plain value, built once and read; one object belongs to one thread at a time. A refusal logs, throws and changes
-/// nothing; docs/refusals.md has the texts. If logging throws, that exception propagates instead. Messages and text
-/// conversion may throw std::bad_alloc; the text of a date-time throws as in Number.
+/// A plain value, built once and read; one object belongs to one thread at a time. A refusal [logs](docs/refusals.md),
+/// throws and changes nothing. If logging throws, that exception propagates instead. Messages and text conversion may
+/// throw std::bad_alloc; the text of a date-time throws as in Number.
 ///
 ///     IC::Error error("no such property", IC::Error::STATUS_NO_SUCH_PROPERTY);
 ///     std::cout << error;                        // 5 - no such property
@@ -86,6 +86,7 @@ private:
     std::string message_;
 };
 
+/// @relates Error
 /// Inserts std::string(error) as one text: width and fill apply to the whole. If the conversion throws, nothing is
 /// inserted.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const Error& error);

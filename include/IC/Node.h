@@ -22,8 +22,8 @@ namespace IC {
 /// thread destroys the node, after its last use. A child of fork() must not use a node that another thread of its
 /// parent had locked. No operation holds two nodes' locks; an exception or a cancelled thread releases the lock.
 ///
-/// Exceptions from the lock, the logger or an override propagate unchanged, and copies and texts may throw
-/// std::bad_alloc; then nothing has changed. docs/refusals.md has the logged texts.
+/// A refusal [logs](docs/refusals.md). Exceptions from the lock, the logger or an override propagate unchanged, and
+/// copies and texts may throw std::bad_alloc; then nothing has changed.
 ///
 ///     class Fan : public IC::Node {
 ///     public:
@@ -205,6 +205,7 @@ protected:
 };
 
 /// @name Comparison
+/// @relates Node
 /// By path alone, byte by byte as unsigned values: nodes with the same path are equal. Without a lock; nothing is
 /// thrown.
 ///@{
@@ -216,6 +217,7 @@ IC_EXPORT bool operator>(const Node& a, const Node& b);
 IC_EXPORT bool operator>=(const Node& a, const Node& b);
 ///@}
 
+/// @relates Node
 /// Inserts the text of the node's class as one text: width and fill apply to the whole. If the conversion throws,
 /// nothing is inserted.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const Node& node);

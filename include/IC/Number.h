@@ -40,9 +40,8 @@ using NodeRef = sNodeRef;
 /// One number of one of eleven kinds. It converts to the native types that can hold it and to no other.
 ///
 /// A trivially copyable value; one object belongs to one thread at a time. `std::hash` agrees with `==`.
-/// A refusal logs, throws and changes nothing, except in initKind; docs/refusals.md has the texts. If logging
-/// throws, that exception propagates instead. Otherwise only text conversion (std::bad_alloc) and date-time
-/// operations throw.
+/// A refusal [logs](docs/refusals.md), throws and changes nothing, except in initKind. If logging throws, that
+/// exception propagates instead. Otherwise only text conversion (std::bad_alloc) and date-time operations throw.
 ///
 ///     IC::Number speed(3600u);
 ///     unsigned int rpm = speed;                  // 3600
@@ -212,6 +211,7 @@ private:
 };
 
 /// @name Comparison
+/// @relates Number
 /// Equality never throws: numbers of different kinds are unequal; signed integers, node references and kinds without
 /// a value equal all of their kind; date-times compare without their scope; a real NaN equals nothing.
 ///
@@ -228,6 +228,7 @@ IC_EXPORT bool operator>(const Number& a, const Number& b);
 IC_EXPORT bool operator>=(const Number& a, const Number& b);
 ///@}
 
+/// @relates Number
 /// Inserts std::string(number) as one text: width and fill apply to the whole. If the conversion throws, nothing is
 /// inserted.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const Number& number);

@@ -25,9 +25,9 @@ using StringArray = std::vector<std::string>;
 /// or nothing; and a read-only mark, which only Node::setProperty heeds. Assignment replaces the mark.
 ///
 /// A value type: a copy is independent of its source. One object belongs to one thread at a time. `std::hash` agrees
-/// with `==`. A refusal logs, throws and changes nothing, except in setKind; docs/refusals.md has the texts. If
-/// logging throws, that exception propagates instead. Construction, copies, setKind and text may throw
-/// std::bad_alloc, and leave the old value; moves, swap and comparison allocate nothing.
+/// with `==`. A refusal [logs](docs/refusals.md), throws and changes nothing, except in setKind. If logging throws,
+/// that exception propagates instead. Construction, copies, setKind and text may throw std::bad_alloc and then change
+/// nothing; moves, swap and comparison allocate nothing.
 ///
 ///     IC::PropertyValue model("DCS8000Z", true); // a read-only text
 ///     std::string text = model;                  // DCS8000Z
@@ -214,6 +214,7 @@ private:
 };
 
 /// @name Comparison
+/// @relates PropertyValue
 /// Numbers and enumerated values compare as Number and EnumValue do, refusals included, everything else by bytes or
 /// elements. The mark is not compared. Equality never throws: values of different kinds are unequal.
 ///
@@ -229,17 +230,21 @@ IC_EXPORT bool operator>(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator>=(const PropertyValue& a, const PropertyValue& b);
 ///@}
 
+/// @relates PropertyValue
 /// The byte as two lower-case hexadecimal digits.
 IC_EXPORT std::string pB(unsigned char byte);
 
+/// @relates PropertyValue
 /// Inserts std::string(value) as one text: width and fill apply to the whole. If the conversion throws, nothing is
 /// inserted.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const PropertyValue& value);
 
+/// @relates PropertyValue
 /// Inserts "7 = " and the value, piece by piece; the number follows the stream's settings. If a piece throws, the
 /// pieces before it stay, here and for a map.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, PropertyValue>& property);
 
+/// @relates PropertyValue
 /// Inserts "[1 = abc], [7 = {1, 2}]" in the order of the numbers, piece by piece; nothing for an empty map.
 IC_EXPORT std::ostream& operator<<(std::ostream& out,
                                    const std::map<unsigned int, PropertyValue>& properties);
