@@ -41,6 +41,7 @@ public:
     Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
           unsigned int status, std::string message);
 
+    /// Copies and moves.
     Alert(const Alert&) = default;
     Alert(Alert&&) = default;
 

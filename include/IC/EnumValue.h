@@ -39,8 +39,8 @@ public:
 
     /// The value. Throws std::out_of_range if the type cannot hold it; nothing is cut off.
     operator unsigned int() const noexcept { return value_; }
-    operator unsigned short() const;
-    operator unsigned char() const;
+    inline operator unsigned short() const;
+    inline operator unsigned char() const;
 
     ///@}
     /// @name Text
@@ -60,14 +60,16 @@ private:
 
 /// @name Comparison
 /// @relates EnumValue
-/// As unsigned numbers; nothing is refused.
 ///@{
+
+/// As unsigned numbers; nothing is refused.
 IC_EXPORT bool operator==(const EnumValue& a, const EnumValue& b);
 IC_EXPORT bool operator!=(const EnumValue& a, const EnumValue& b);
 IC_EXPORT bool operator<(const EnumValue& a, const EnumValue& b);
 IC_EXPORT bool operator<=(const EnumValue& a, const EnumValue& b);
 IC_EXPORT bool operator>(const EnumValue& a, const EnumValue& b);
 IC_EXPORT bool operator>=(const EnumValue& a, const EnumValue& b);
+
 ///@}
 
 /// @relates EnumValue

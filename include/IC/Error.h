@@ -35,11 +35,12 @@ public:
 
     /// Without a number, the value is of kind Number::KIND_UNKNOWN; without a text, the message is empty. Throws
     /// std::invalid_argument for a status above 16, std::logic_error for a null `message`.
-    Error(const Number& value, unsigned char status);
+    inline Error(const Number& value, unsigned char status);
     Error(unsigned char status, const Number& value, const std::string& message);
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
 
+    /// Copies and moves.
     Error(const Error&) = default;
     Error(Error&&) noexcept = default;
 
@@ -78,7 +79,7 @@ public:
     ///@}
 
 private:
-    void initStatus(unsigned char status);
+    inline void initStatus(unsigned char status);
     [[noreturn, gnu::cold]] static void refuse(unsigned char status);
 
     StatusType status_ = STATUS_SUCCESS;

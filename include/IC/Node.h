@@ -136,6 +136,7 @@ public:
     /// @name Status and description
     ///@{
 
+    /// A copy, made under the lock.
     virtual StatusType getStatus() const;
     virtual std::string getDescription() const;
 
@@ -163,8 +164,11 @@ public:
     /// Fixed after construction, and read without the lock.
     ///@{
 
+    /// The sensor type, under two names.
     SensorType getSensor() const noexcept { return sensor_; }
     operator SensorType() const noexcept { return sensor_; }
+
+    /// The node's own path, and its parent's.
     std::string getPath() const { return path; }
     std::string getParent() const { return parent; }
 
@@ -206,15 +210,17 @@ protected:
 
 /// @name Comparison
 /// @relates Node
+///@{
+
 /// By path alone, byte by byte as unsigned values: nodes with the same path are equal. Without a lock; nothing is
 /// thrown.
-///@{
 IC_EXPORT bool operator==(const Node& a, const Node& b);
 IC_EXPORT bool operator!=(const Node& a, const Node& b);
 IC_EXPORT bool operator<(const Node& a, const Node& b);
 IC_EXPORT bool operator<=(const Node& a, const Node& b);
 IC_EXPORT bool operator>(const Node& a, const Node& b);
 IC_EXPORT bool operator>=(const Node& a, const Node& b);
+
 ///@}
 
 /// @relates Node

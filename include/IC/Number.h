@@ -74,16 +74,16 @@ public:
     ///@{
 
     /// The kind follows from the type; a double is KIND_REAL, also NaN and infinities.
-    Number(const bool& value) noexcept;
-    Number(const int& value) noexcept;
-    Number(const unsigned int& value) noexcept;
-    Number(const unsigned long long& value) noexcept;
-    Number(const double& value) noexcept;
-    Number(const Version2& value) noexcept;
-    Number(const sNodeRef& value) noexcept;
+    inline Number(const bool& value) noexcept;
+    inline Number(const int& value) noexcept;
+    inline Number(const unsigned int& value) noexcept;
+    inline Number(const unsigned long long& value) noexcept;
+    inline Number(const double& value) noexcept;
+    inline Number(const Version2& value) noexcept;
+    inline Number(const sNodeRef& value) noexcept;
 
     /// A date-time of scope 3. Seconds since the epoch.
-    Number(long seconds, unsigned short milliseconds) noexcept;
+    inline Number(long seconds, unsigned short milliseconds) noexcept;
 
     /// A date-time; the scope is cut to 8 bits and the milliseconds to 16.
     Number(const ZQ::DateTime& value);
@@ -91,7 +91,7 @@ public:
     /// A number of the kind with this code and the content that initKind gives it. Throws std::invalid_argument
     /// for 2, 10, and 11 and above.
     Number(const unsigned char& code);
-    Number(const KindType& kind);
+    inline Number(const KindType& kind);
 
     /// Deleted: a pointer would become a flag, and an enumeration of one byte (such as Error::StatusType) a kind
     /// code. Write Number(static_cast<unsigned int>(value)).
@@ -106,8 +106,8 @@ public:
     ///@{
 
     /// The kind, under two names.
-    KindType getKind() const noexcept;
-    operator KindType() const noexcept;
+    inline KindType getKind() const noexcept;
+    inline operator KindType() const noexcept;
 
     /// Stores the kind and its first content: 0, 0.0, version 0.0, or the current time in whole seconds with
     /// scope 3. The kinds 0, 1, 6 and 7 clear the flag byte and keep the rest. Throws std::invalid_argument for 2,
@@ -126,28 +126,28 @@ public:
     ///@{
 
     /// From a flag; from an unsigned integer or a real, whether it is not 0 (a NaN is true).
-    operator bool() const;
+    inline operator bool() const;
 
     /// From a signed integer; from what unsigned int takes, with the 32 bits taken as signed.
-    operator int() const;
+    inline operator int() const;
 
     /// From a flag, an unsigned integer below 2^32, a real above -1 and below 2^32.
-    operator unsigned int() const;
+    inline operator unsigned int() const;
 
     /// From a flag, an unsigned integer, a real above -1 and below 2^64.
-    operator unsigned long long() const;
+    inline operator unsigned long long() const;
 
     /// From a flag, an unsigned integer, a real, NaN, infinity; from a version as major.minor (2.15).
-    operator double() const;
+    inline operator double() const;
 
     /// From a version; from an unsigned integer up to 255, as the major number.
-    operator Version2() const;
+    inline operator Version2() const;
 
     /// From a date-time of scope 1 to 3.
     operator ZQ::DateTime() const;
 
     /// From a node reference.
-    operator sNodeRef() const;
+    inline operator sNodeRef() const;
 
     ///@}
     /// @name Text
@@ -177,24 +177,24 @@ private:
     };
     static constexpr ZQ::Uint8 defaultScope = 3;
 
-    Number(Tag, KindType kind) noexcept;
+    inline Number(Tag, KindType kind) noexcept;
 
     template <class T>
-    T load() const noexcept;
+    inline T load() const noexcept;
     template <class T>
-    void store(const T& content) noexcept;
-    void storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept;
+    inline void store(const T& content) noexcept;
+    inline void storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept;
 
     // What the conversions do for any kind but the commonest.
     bool toBool() const;
-    int toInt() const;
+    inline int toInt() const;
     ZQ::Uint32 toUint32(const char* function) const;
     ZQ::Uint64 toUint64() const;
     ZQ::Real64 toReal() const;
     Version2 toVersion() const;
     [[noreturn, gnu::cold]] sNodeRef refuseNodeRef() const;
 
-    static bool both(KindType kind, const Number& a, const Number& b) noexcept;
+    static inline bool both(KindType kind, const Number& a, const Number& b) noexcept;
     static bool equal(const Number& a, const Number& b);
     static bool less(const Number& a, const Number& b);
     static bool greater(const Number& a, const Number& b);
@@ -212,20 +212,22 @@ private:
 
 /// @name Comparison
 /// @relates Number
-/// Equality never throws: numbers of different kinds are unequal; signed integers, node references and kinds without
-/// a value equal all of their kind; date-times compare without their scope; a real NaN equals nothing.
-///
-/// Order holds within one kind. Throws std::invalid_argument for different kinds and for KIND_NAN. Signed integers,
-/// node references and kinds without a value are never less or greater. KIND_INFINITY on the left is never less, and
-/// greater than every kind but itself and KIND_NAN; on the right of another kind it is refused. `<=` and `>=` ask
-/// `==` first, so equal numbers are never refused.
 ///@{
+
+/// Never throw. Numbers of different kinds are unequal; signed integers, node references and kinds without a value
+/// equal all of their kind; date-times compare without their scope; a real NaN equals nothing.
 IC_EXPORT bool operator==(const Number& a, const Number& b);
 IC_EXPORT bool operator!=(const Number& a, const Number& b);
+
+/// Within one kind. Throw std::invalid_argument for different kinds and for KIND_NAN. Signed integers, node references
+/// and kinds without a value are never less or greater. KIND_INFINITY on the left is never less, and greater than
+/// every kind but itself and KIND_NAN; on the right of another kind it is refused. `<=` and `>=` ask `==` first, so
+/// equal numbers are never refused.
 IC_EXPORT bool operator<(const Number& a, const Number& b);
 IC_EXPORT bool operator<=(const Number& a, const Number& b);
 IC_EXPORT bool operator>(const Number& a, const Number& b);
 IC_EXPORT bool operator>=(const Number& a, const Number& b);
+
 ///@}
 
 /// @relates Number

@@ -16,7 +16,7 @@
 
 namespace IC {
 
-// What a value holds when it holds several elements.
+/// What a value holds when it holds several elements.
 using Buffer = std::vector<unsigned char>;
 using NumberArray = std::vector<Number>;
 using StringArray = std::vector<std::string>;
@@ -63,16 +63,16 @@ public:
     ///@{
 
     /// The kind follows from the type; `readOnly` is the mark.
-    PropertyValue(const std::string& value, const bool& readOnly = false);
-    PropertyValue(std::string&& value, const bool& readOnly = false);
-    PropertyValue(const Number& value, const bool& readOnly = false);
-    PropertyValue(const EnumValue& value, const bool& readOnly = false);
-    PropertyValue(const Buffer& value, const bool& readOnly = false);
-    PropertyValue(Buffer&& value, const bool& readOnly = false);
-    PropertyValue(const NumberArray& value, const bool& readOnly = false);
-    PropertyValue(NumberArray&& value, const bool& readOnly = false);
-    PropertyValue(const StringArray& value, const bool& readOnly = false);
-    PropertyValue(StringArray&& value, const bool& readOnly = false);
+    inline PropertyValue(const std::string& value, const bool& readOnly = false);
+    inline PropertyValue(std::string&& value, const bool& readOnly = false);
+    inline PropertyValue(const Number& value, const bool& readOnly = false);
+    inline PropertyValue(const EnumValue& value, const bool& readOnly = false);
+    inline PropertyValue(const Buffer& value, const bool& readOnly = false);
+    inline PropertyValue(Buffer&& value, const bool& readOnly = false);
+    inline PropertyValue(const NumberArray& value, const bool& readOnly = false);
+    inline PropertyValue(NumberArray&& value, const bool& readOnly = false);
+    inline PropertyValue(const StringArray& value, const bool& readOnly = false);
+    inline PropertyValue(StringArray&& value, const bool& readOnly = false);
 
     /// The text up to its terminating NUL. Throws std::logic_error for a null pointer.
     PropertyValue(const char* value, const bool& readOnly = false);
@@ -89,21 +89,20 @@ public:
     PropertyValue(T, const bool& = false) = delete;
 
     /// A copy has the source's mark. A moved-from value has the kind KIND_UNKNOWN and keeps its mark.
-    PropertyValue(const PropertyValue& source);
-    PropertyValue(PropertyValue&& source) noexcept;
-
-    ~PropertyValue();
+    inline PropertyValue(const PropertyValue& source);
+    inline PropertyValue(PropertyValue&& source) noexcept;
+    inline ~PropertyValue();
 
     ///@}
     /// @name Assignment
     ///@{
 
     /// Takes the source's mark, whatever its own was. If copying throws, the old value stays.
-    PropertyValue& operator=(const PropertyValue& source);
-    PropertyValue& operator=(PropertyValue&& source) noexcept;
+    inline PropertyValue& operator=(const PropertyValue& source);
+    inline PropertyValue& operator=(PropertyValue&& source) noexcept;
 
     /// Exchanges the values and the marks.
-    void swap(PropertyValue& other) noexcept;
+    inline void swap(PropertyValue& other) noexcept;
     friend void swap(PropertyValue& a, PropertyValue& b) noexcept { a.swap(b); }
 
     ///@}
@@ -111,11 +110,11 @@ public:
     ///@{
 
     /// The kind, under two names.
-    KindType getKind() const noexcept;
-    operator KindType() const noexcept;
+    inline KindType getKind() const noexcept;
+    inline operator KindType() const noexcept;
 
     /// Whether Node::setProperty refuses to replace the value.
-    bool readOnly() const noexcept;
+    inline bool readOnly() const noexcept;
 
     /// Changes the kind and takes its first value; the mark stays, and the same kind keeps the value. Throws
     /// PropertyValueInvalidKind for 7 and above; the kind then stays without a value (deliberate): conversions
@@ -129,22 +128,22 @@ public:
     ///@{
 
     /// From a number or an enumerated value.
-    operator double() const;
-    operator unsigned long long() const;
-    operator unsigned int() const;
+    inline operator double() const;
+    inline operator unsigned long long() const;
+    inline operator unsigned int() const;
 
     /// From a number.
-    operator bool() const;
-    operator Number() const;
-    operator Version2() const;
+    inline operator bool() const;
+    inline operator Number() const;
+    inline operator Version2() const;
 
     /// From an enumerated value. A refusal is not logged (deliberate).
-    operator EnumValue() const;
+    inline operator EnumValue() const;
 
     /// From bytes, from an array of numbers, from an array of texts.
-    operator Buffer() const;
-    operator NumberArray() const;
-    operator StringArray() const;
+    inline operator Buffer() const;
+    inline operator NumberArray() const;
+    inline operator StringArray() const;
 
     /// Deleted: `int x = value;` would be a flag. Write `int x = value.operator IC::Number();`.
     operator int() const = delete;
@@ -156,7 +155,7 @@ public:
     /// As a fresh std::ostringstream writes it under the global locale: nothing is "unknown", a text is itself,
     /// bytes are two hexadecimal digits each with a blank after every fourth, arrays are `{1, 2}` and
     /// `{"a\"b", ""}`, where only double quotes are escaped. Nothing is refused.
-    operator std::string() const;
+    inline operator std::string() const;
 
     ///@}
 
@@ -167,25 +166,25 @@ private:
     friend struct std::hash<PropertyValue>;
 
     // Owns the object.
-    PropertyValue(void* object, KindType kind, const bool& readOnly) noexcept;
+    inline PropertyValue(void* object, KindType kind, const bool& readOnly) noexcept;
 
     // Marks a kind that has no object, left by a refused setKind. No kind of an object has this bit, so one
     // comparison tells what is held.
     static constexpr ZQ::Uint32 without = 8;
 
-    bool holds(KindType kind) const noexcept;
-    static bool bothHold(KindType kind, const PropertyValue& a, const PropertyValue& b) noexcept;
+    inline bool holds(KindType kind) const noexcept;
+    static inline bool bothHold(KindType kind, const PropertyValue& a, const PropertyValue& b) noexcept;
 
     // The object, which must be of this type.
     template <class T>
-    T& object() noexcept;
+    inline T& object() noexcept;
     template <class T>
-    const T& object() const noexcept;
+    inline const T& object() const noexcept;
 
     template <class Visitor>
     static decltype(auto) visit(KindType kind, const Visitor& visitor);
 
-    void release() noexcept;
+    inline void release() noexcept;
     void copyObject(const PropertyValue& source);
     void assign(const PropertyValue& source);
     void initKind(const unsigned char& kind);
@@ -214,20 +213,23 @@ private:
 };
 
 /// @name Comparison
-/// @relates PropertyValue
 /// Numbers and enumerated values compare as Number and EnumValue do, refusals included, everything else by bytes or
-/// elements. The mark is not compared. Equality never throws: values of different kinds are unequal.
-///
-/// Order holds within one kind and is lexicographic for texts, bytes (unsigned) and arrays; nothing is neither less
-/// nor greater than nothing. Throws PropertyValueInvalidKind for different kinds. `<=` and `>=` ask `==` first, so
-/// equal values are never refused.
+/// elements. The mark is not compared.
+/// @relates PropertyValue
 ///@{
+
+/// Never throw. Values of different kinds are unequal.
 IC_EXPORT bool operator==(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator!=(const PropertyValue& a, const PropertyValue& b);
+
+/// Within one kind, lexicographic for texts, bytes (unsigned) and arrays; nothing is neither less nor greater than
+/// nothing. Throw PropertyValueInvalidKind for different kinds. `<=` and `>=` ask `==` first, so equal values are never
+/// refused.
 IC_EXPORT bool operator<(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator<=(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator>(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator>=(const PropertyValue& a, const PropertyValue& b);
+
 ///@}
 
 /// @relates PropertyValue

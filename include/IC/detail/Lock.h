@@ -7,7 +7,7 @@ namespace IC {
 class IC_ANNOTATION(scoped_lockable) Node::Lock {
 public:
     // Does not ask whether the lock was obtained: with this time-out lock() waits for ever.
-    explicit Lock(ZQ::Mutex& mutex) IC_ANNOTATION(acquire_capability(mutex)) : mutex_(mutex)
+    explicit Lock(ZQ::Mutex& nodeMutex) IC_ANNOTATION(acquire_capability(nodeMutex)) : mutex_(nodeMutex)
     {
         mutex_.lock(0xFFFFFFFF);
     }
