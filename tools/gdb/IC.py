@@ -1,9 +1,9 @@
-"""Shows the library's values in GDB as what they hold.
+"""Pretty-printers for GDB: they show the content of the library's values.
 
-GDB loads this with an installed libIC.so. For a static library, and for one that is not installed, say
-`source tools/gdb/IC.py`. Texts and containers are left to the printers that come with the C++ standard library.
+GDB loads this script with an installed libIC.so. With a static library, or a library that is not installed, use the
+command `source tools/gdb/IC.py`. The C++ standard library's own printers show strings and containers.
 
-A value may be damaged, or not initialised yet: what it shows then says so, and nothing is raised.
+A value may be damaged or not initialised yet. Its printer then shows that and raises nothing.
 """
 
 import datetime
@@ -14,12 +14,12 @@ import gdb
 import gdb.printing
 import gdb.types
 
-# What reading a damaged value raises, here or in the printers of the standard library.
+# Reading a damaged value raises one of these, here or in the printers of the standard library.
 UNREADABLE = (gdb.error, OverflowError, ValueError)
 
 
 class Printer:
-    """Shows what `text` makes of a value, and the names and values of its `parts`."""
+    """Shows `text(value)`, and `parts(value)`, pairs of a name and a value, as children."""
 
     def __init__(self, value, text=lambda value: None, parts=lambda value: (), hint=None):
         self.value, self.text, self.parts, self.hint = value, text, parts, hint
@@ -45,7 +45,7 @@ def unreadable(error):
 
 
 def enumerator(type_, code):
-    """The name of a code, such as KIND_UINT32; None where it has none."""
+    """The name of a code, such as KIND_UINT32, or None."""
     for field in type_.unqualified().strip_typedefs().fields():
         if field.enumval == code:
             return field.name.rpartition("::")[2]
@@ -53,7 +53,7 @@ def enumerator(type_, code):
 
 
 def elements(container):
-    """The elements of a vector; keys and values of a map by turns."""
+    """The elements of a vector; of a map, its keys and values alternately."""
     printer = gdb.default_visualizer(container)
     for _, element in printer.children() if printer else [("", container)]:
         element.fetch_lazy()
@@ -61,7 +61,7 @@ def elements(container):
 
 
 def quoted(string):
-    """A std::string in quotes. Only what its printer can read is handed to it."""
+    """A std::string in quotes. Reads one byte first, so that unreadable memory raises an error here."""
     try:
         string.fetch_lazy()
         printer = gdb.default_visualizer(string)
@@ -80,7 +80,7 @@ def version(value):
 def node_reference(value):
     try:
         sensor = enumerator(gdb.lookup_type("IC::Node::SensorType"), int(value["type"]))
-    except gdb.error:  # a program without nodes does not know it
+    except gdb.error:  # a program without nodes lacks this type
         sensor = None
     return f"{sensor or int(value['type'])}:{int(value['id'])}"
 
@@ -99,7 +99,7 @@ def number(value):
     kind = enumerator(value["kind_"].type, code)
     if kind is None:
         return f"invalid kind {code}"
-    content = value["value_"]  # bytes; they may be in registers and have no address
+    content = value["value_"]  # bytes, which may be in registers and then have no address
 
     def read(name, offset=0):
         type_ = gdb.lookup_type(name)
@@ -134,11 +134,11 @@ HELD = {
     "KIND_STRINGARRAY": "IC::StringArray",
 }
 ARRAYS = ("KIND_NUMBERARRAY", "KIND_STRINGARRAY")
-WITHOUT = 8  # is added to the kind where a refused setKind left no object
+WITHOUT = 8  # a refused setKind deletes the object and adds this to the kind
 
 
 def kind_and_object(value):
-    """Of a PropertyValue; each is None where there is none."""
+    """The kind and the object of a PropertyValue; each may be None."""
     code, pointer = int(value["kind_"]), value["value_"]
     kind = enumerator(value["kind_"].type, code & ~WITHOUT)
     if kind not in HELD or code & WITHOUT or int(pointer) == 0:
@@ -215,7 +215,7 @@ def exception_parts(value):
 
 
 def date_time_printer(value):
-    """None where the agent's own platform has another class of this name."""
+    """None for the DateTime of the agent's own platform, which is another class."""
     if not gdb.types.has_field(value.type, "seconds_"):
         return None
     return Printer(value, lambda value: instant(value["seconds_"], value["millisecond_"], value["scope_"]))

@@ -46,7 +46,7 @@ IC::Alert alertOf(const Change& change)
     const IC::Node& node = *change.node;
     const Trouble* trouble = change.subject == Change::STATUS ? troubleOf(node) : nullptr;
     const bool isLoss = change.subject == Change::NODE && change.from;
-    // A node that came, a status that is fine again and a new reading are good to know, no more.
+    // A new node, a status that is 0 again and a new reading are only information.
     const bool isNews = change.subject != Change::PROPERTY || change.key == KEY_READING;
     const int severity = trouble != nullptr ? trouble->severity : isLoss ? 2 : isNews ? 0 : 1;
     return {static_cast<unsigned char>(severity),

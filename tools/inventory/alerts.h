@@ -1,4 +1,4 @@
-// What a status above 0 and what a change mean: alerts.
+// Alerts about nodes with a status above 0, and about changes.
 #pragma once
 
 #include "IC/Alert.h"
@@ -8,19 +8,20 @@ namespace inventory {
 
 enum AlertClass : unsigned char { CLASS_CONFIGURATION = 1, CLASS_ENVIRONMENT = 2 };
 
-// What a status above 0 means.
+// The meaning of a status above 0.
 struct Trouble {
     Status status;
     unsigned char severity;
     AlertClass alertClass;
     const char* words;
 };
-const Trouble* troubleOf(const IC::Node& node);  // null: none
+const Trouble* troubleOf(const IC::Node& node);  // null for status 0
 
-// One for each node with a status above 0; what lies inside a node that may not be used is not told again.
+// One for each node with a status above 0. A node that the system may not use gets none if the same holds for its
+// parent.
 std::vector<IC::Alert> alertsOf(const Nodes& nodes);
 
-// One for each change.
+// One alert for each change.
 std::vector<IC::Alert> alertsOf(const std::vector<Change>& changes);
 
 }  // namespace inventory

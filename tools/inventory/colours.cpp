@@ -1,4 +1,4 @@
-// The table of colours: what belongs together has one on a terminal, and like ones in a drawing.
+// The table of colours: related sensor types share a colour on a terminal and have similar ones in a drawing.
 #include "colours.h"
 
 namespace inventory {

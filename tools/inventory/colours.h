@@ -7,8 +7,8 @@ namespace inventory {
 
 struct Colour {
     IC::Node::SensorType sensor;
-    const char* onTerminal;  // the parameters of the sequence that selects it
-    const char* fill;        // light: what is written on it is black
+    const char* onTerminal;  // the parameters of the escape sequence that selects it
+    const char* fill;        // light, because the text on it is black
 };
 
 const Colour& colourOf(IC::Node::SensorType sensor);

@@ -12,7 +12,7 @@ namespace inventory {
 
 namespace {
 
-// Nodes as the library orders them: by their paths, and by nothing else.
+// The library's order of nodes, which compares only their paths.
 struct ByPath {
     bool operator()(const IC::Node* a, const IC::Node* b) const { return *a < *b; }
 };
@@ -30,15 +30,14 @@ public:
         }
     }
 
-    // The same node here. To the operators nodes of one path are equal, of whatever type they are; what has become
-    // something else is not the same.
+    // The node with the same path and the same sensor type, or null. The library's operators compare only the path.
     const IC::Node* find(const IC::Node& node) const
     {
         const auto found = nodes_.find(&node);
         return found == nodes_.end() || (*found)->getSensor() != node.getSensor() ? nullptr : *found;
     }
 
-    // The path of the node that a reference leads to; the reference itself where there is none.
+    // The path of the node that a reference leads to; the reference's own text if there is no such node.
     std::string target(const IC::Number& reference) const
     {
         const auto found = paths_.find(std::string(reference));
@@ -76,7 +75,7 @@ public:
 private:
     void add(Change change) { changes_.push_back(std::move(change)); }
 
-    // Descriptions are made from the properties, so they are not compared.
+    // Descriptions are not compared, because they are made from the properties.
     void compare(const IC::Node& then, const IC::Node& now)
     {
         const unsigned int statusThen = then.getStatus();
@@ -99,12 +98,11 @@ private:
                 add({Change::PROPERTY, &now, key, {}, after_.textOf(value)});
     }
 
-    // The operators of the library come first, and what they tell apart differs, but for a real that is not a
-    // number: it equals nothing, not even the same one of yesterday. What they call equal is looked at again:
-    // - Signed numbers are all equal to them: their texts tell.
-    // - Node references are all equal to them too, and their texts tell nothing: each reading numbers the nodes
-    //   anew, so that CPU:1 may be another CPU today, and the same CPU have another number. What counts is the
-    //   node that a reference leads to.
+    // Numbers that the library's operators call unequal differ, except that a real NaN equals no number, not even
+    // itself. Some numbers that the operators call equal differ too:
+    // - All signed numbers compare equal: compare their texts.
+    // - All node references compare equal, and each reading numbers the nodes anew, so CPU:1 may be another CPU
+    //   today. Two references are the same if they lead to the same node.
     bool same(const IC::Number& a, const IC::Number& b) const
     {
         const auto isNan = [](const IC::Number& number) {
@@ -117,7 +115,7 @@ private:
         return exactText(a) == exactText(b);
     }
 
-    // Texts, bytes and codes are equal to the operators just where they are the same.
+    // Texts, bytes and codes compare equal only if they are the same.
     bool same(const IC::PropertyValue& a, const IC::PropertyValue& b) const
     {
         const auto kind = a.getKind();
@@ -138,7 +136,7 @@ private:
     {
         std::string from = before_.textOf(then);
         std::string to = after_.textOf(now);
-        if (from == to) {  // then it is the kind that tells them apart
+        if (from == to) {  // then only the kinds differ
             from += std::string(" (") + kindName(then) + ')';
             to += std::string(" (") + kindName(now) + ')';
         }

@@ -1,4 +1,4 @@
-// What differs between two machines, or between two days of one.
+// The differences between two machines, or between two readings of one machine.
 #pragma once
 
 #include <optional>
@@ -12,13 +12,13 @@ namespace inventory {
 struct Change {
     enum Subject : unsigned char { NODE, STATUS, PROPERTY };
     Subject subject;
-    const IC::Node* node;             // as it is, or as it was where it is gone
+    const IC::Node* node;             // the later one; the earlier one if it is gone
     unsigned int key;                 // of the property
-    std::optional<std::string> from;  // nothing: it came
-    std::optional<std::string> to;    // nothing: it went
+    std::optional<std::string> from;  // nothing if it is new
+    std::optional<std::string> to;    // nothing if it is gone
 };
 
-// Node by node, in the order of the nodes before, then what came. The time of reading is no difference.
+// In the order of the earlier nodes; new nodes come last. The time of reading is not compared.
 std::vector<Change> changesBetween(const Nodes& before, const Nodes& after);
 
 }  // namespace inventory

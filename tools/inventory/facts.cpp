@@ -1,4 +1,4 @@
-// The table of the facts that are properties.
+// The table of the facts that become properties.
 #include "mapping.h"
 
 #include <algorithm>
@@ -10,7 +10,7 @@ namespace inventory {
 
 namespace {
 
-// The names of facts begin with what they are about, and go on alike.
+// The name of a fact begins with its subject; the rest, such as "Vendor", is the same for all subjects.
 const struct Prefix {
     std::string_view text;
     IC::Node::SensorType part = IC::Node::SENSOR_COMPUTER;
@@ -28,7 +28,7 @@ const struct Prefix {
                 {"OpenCL"},
                 {""}};
 
-// A read-only value made from what `parse` finds in the text, or one of no kind.
+// A read-only value of what `parse` finds in the text, or a value of KIND_UNKNOWN.
 template <class T, auto parse>
 IC::PropertyValue as(const std::string& text)
 {

@@ -12,8 +12,8 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-// A text is a string of JSON as long as it is UTF-8. What is not becomes {"hex": "fffe"}, in which no byte is
-// lost; U+FFFD in its place would make different texts the same.
+// A JSON string if the text is UTF-8; otherwise {"hex": "fffe"}, which keeps every byte. U+FFFD in place of invalid
+// bytes would make different texts equal.
 Json jsonOf(const std::string& text)
 {
     try {
@@ -28,7 +28,7 @@ Json jsonOf(const std::string& text)
     }
 }
 
-// Numbers that JSON has none for are their texts, or null where the kind says all.
+// Numbers that JSON cannot express become their texts, or null if the kind says everything.
 Json jsonOf(const IC::Number& number)
 {
     switch (number.getKind()) {

@@ -1,10 +1,10 @@
-// The command line: describes this machine, or one whose hwloc export is given, as nodes.
+// The command line: describes this machine, or the machine of an hwloc export, as nodes.
 #include <CLI/CLI.hpp>
 #include <spdlog/cfg/env.h>
 #include <spdlog/sinks/stdout_color_sinks.h>
 #include <spdlog/spdlog.h>
 
-#include <cerrno>  // program_invocation_short_name: the package installs it under another name
+#include <cerrno>  // program_invocation_short_name: the installed program has another name
 #include <csignal>
 #include <cstdlib>
 #include <fstream>
@@ -25,7 +25,7 @@ using namespace inventory;
 
 enum ExitStatus { EXIT_DONE = 0, EXIT_REFUSED = 1, EXIT_DIFFERENT = 1, EXIT_BAD_INPUT = 2 };
 
-// The library's records go where the program's own go: to spdlog, and so to standard error.
+// Sends the library's records to spdlog, which writes to standard error.
 void connectLog()
 {
     spdlog::set_default_logger(spdlog::stderr_color_mt(program_invocation_short_name));
@@ -40,14 +40,14 @@ void connectLog()
     });
 }
 
-// The text as a value of the stored one's kind. What may be changed here is texts and real numbers.
+// The text as a value of the stored value's kind. Writable properties hold texts or real numbers.
 IC::PropertyValue valueLike(const IC::PropertyValue& stored, const std::string& text)
 {
     if (stored.readOnly() || stored.getKind() != IC::PropertyValue::KIND_NUMBER)
         return text;
     const auto number = realNumber(text);
     if (!number)
-        throw BadInput("'" + text + "' is no number");
+        throw BadInput("'" + text + "' is not a number");
     return IC::Number(*number);
 }
 
@@ -56,12 +56,12 @@ ExitStatus change(const Nodes& nodes, const std::string& path, const std::string
 {
     const auto key = count(keyText);
     if (!key)
-        throw BadInput("'" + keyText + "' is no property number");
+        throw BadInput("'" + keyText + "' is not a property number");
     for (const auto& node : nodes) {
         if (node->getPath() != path)
             continue;
         IC::PropertyValue value(text);
-        node->getProperty(*key, value);  // stays the text where there is no such property
+        node->getProperty(*key, value);  // leaves `value` as it is if there is no such property
         const IC::Error outcome = node->setProperty(*key, valueLike(value, text));
         const bool isDone = outcome.getStatus() == IC::Error::STATUS_SUCCESS;
         const bool isReadOnly = outcome.getStatus() == IC::Error::STATUS_READ_ONLY;
@@ -75,7 +75,7 @@ ExitStatus change(const Nodes& nodes, const std::string& path, const std::string
     throw BadInput("no node has the path '" + path + "'");
 }
 
-// The options, and what remains of the command line.
+// The parsed command line.
 struct Request {
     std::string file;
     TreeForm form;
@@ -142,11 +142,11 @@ double secondsIn(const std::string& text)
     constexpr double most = 1e9;
     const auto seconds = realNumber(text);
     if (!seconds || !(*seconds >= fewest && *seconds <= most))
-        throw BadInput("--watch: '" + text + "' is no number of seconds from 0.001 to 1000000000");
+        throw BadInput("--watch: '" + text + "' is not a number of seconds from 0.001 to 1000000000");
     return *seconds;
 }
 
-// Of these options there may be one.
+// Throws BadInput if more than one of these options is given.
 void allowOne(const std::vector<const CLI::Option*>& options)
 {
     const CLI::Option* given = nullptr;
@@ -159,7 +159,8 @@ void allowOne(const std::vector<const CLI::Option*>& options)
     }
 }
 
-// What fails to be written is trouble, but for --diff, where status 1 says that something differs.
+// The exit status: `failure` if the output cannot be written. With --diff, status 1 means that something differs, so
+// its `failure` is another status.
 int flushed(int status, ExitStatus failure)
 {
     if (std::cout.flush())
@@ -175,9 +176,9 @@ int run(int argc, char** argv)
     app.footer(
         "Examples:\n"
         "  inventory                            this machine as a tree\n"
-        "  lstopo day1.xml                      keeps it, to be read or compared later\n"
-        "  inventory --properties day1.xml      all that is known of the machine of that file\n"
-        "  inventory --diff day1.xml day2.xml   what has changed since\n"
+        "  lstopo day1.xml                      exports it, to read or compare it later\n"
+        "  inventory --properties day1.xml      all properties of the machine of that file\n"
+        "  inventory --diff day1.xml day2.xml   what has changed in between\n"
         "  inventory --watch 10                 alerts, as changes happen\n"
         "  inventory --json | jq '.nodes[].path'\n"
         "  inventory --svg machine.svg && xdg-open machine.svg\n\n"
@@ -206,7 +207,7 @@ int run(int argc, char** argv)
     const auto* watching = app.add_option("--watch", request.period,
                                           "Read again every SECONDS and write what changed, as alerts")
                                ->type_name("SECONDS");
-    const auto* diff = app.add_option("--diff", request.sides, "Write what differs between two machines")
+    const auto* diff = app.add_option("--diff", request.sides, "Write the differences between two machines")
                            ->type_name("BEFORE AFTER");
     try {
         app.parse(argc, argv);
@@ -245,9 +246,9 @@ int run(int argc, char** argv)
 
 int main(int argc, char** argv)
 {
-    // hwloc tells what went wrong by what it returns; lines of its own would be one too many.
+    // Failures of hwloc are reported by their return values; hwloc must not write lines of its own.
     setenv("HWLOC_HIDE_ERRORS", "2", 0);
-    std::signal(SIGPIPE, SIG_IGN);  // a closed pipe is an output that cannot be written
+    std::signal(SIGPIPE, SIG_IGN);  // writing to a closed pipe then fails and is reported
     try {
         connectLog();
         return run(argc, argv);

@@ -1,4 +1,4 @@
-// The table of the objects that are nodes.
+// The table of the hwloc objects that nodes describe.
 #include "mapping.h"
 
 #include <cstring>
@@ -17,8 +17,8 @@ std::unique_ptr<Node> make(const Site& site)
     return std::make_unique<NodeClass>(site);
 }
 
-// The first row that fits counts. What has no row is no node: hardware threads belong to their core; bridges
-// and DMA channels have no sensor type.
+// The first row that fits is used. No node describes an object without a row: hardware threads belong to their
+// core, and no sensor type fits bridges and DMA channels.
 // clang-format off
 const Row rows[] = {
     {HWLOC_OBJ_MACHINE, any, nullptr, Node::SENSOR_COMPUTER, "machine", make<Machine>},

@@ -1,4 +1,4 @@
-// What becomes of an object of hwloc (mapping.cpp) and of a fact about it (facts.cpp).
+// Which node class describes an hwloc object (mapping.cpp), and which property holds a fact about it (facts.cpp).
 #pragma once
 
 #include <memory>
@@ -7,23 +7,23 @@
 
 namespace inventory {
 
-// Which sensor type, name in paths and node class an object has.
+// The sensor type, the name in paths and the node class for one sort of object.
 struct Row {
     hwloc_obj_type_t type;
-    int detail;           // a PCI class or its upper half, or a kind of device of the operating system
+    int detail;           // a PCI class or its upper byte, or hwloc's type of an operating system device
     const char* subtype;  // null: any
     IC::Node::SensorType sensor;
     const char* word;  // begins the name in paths
     std::unique_ptr<IC::Node> (*make)(const Site&);
 };
 
-// The row that fits the object, a part of the machine where one is asked for; null for what is no node.
+// The row for the object or, if `part` is given, for that part of the machine; null if no node describes it.
 const Row* findRow(hwloc_obj_t object, IC::Node::SensorType part = IC::Node::SENSOR_UNKNOWN);
 
 struct Fact {
-    Key key;  // KEY_OTHER_FACTS for a fact without a property of its own, or not written as expected
+    Key key;  // KEY_OTHER_FACTS if the fact has no property of its own or cannot be parsed
     IC::PropertyValue value;
-    IC::Node::SensorType part;  // what a fact of the machine is about
+    IC::Node::SensorType part;  // the part of the machine that the fact is about
 };
 Fact factOf(const hwloc_info_s& info);
 

@@ -1,4 +1,4 @@
-// Stands in for json.cpp where the library that writes JSON was missing.
+// Replaces json.cpp if nlohmann-json is missing.
 #include "reading.h"
 #include "writing.h"
 

@@ -1,4 +1,4 @@
-// What each node class takes from its object, and the names of the properties.
+// Fills each node class from its hwloc object, and names the properties.
 #include "nodes.h"
 
 #include <algorithm>
@@ -29,7 +29,7 @@ const char* const keyNames[] = {
 // clang-format on
 static_assert(std::size(keyNames) == KEY_LAST);
 
-// The library takes unsigned long long, which hwloc's 64-bit type is not on every machine.
+// IC::Number takes unsigned long long; on some machines hwloc's 64-bit type is another type.
 IC::Number number64(hwloc_uint64_t number)
 {
     return ZQ::Uint64 {number};
@@ -42,7 +42,7 @@ IC::Number number32(int number)
 
 IC::Number now()
 {
-    // Whole seconds: the text of a date-time is made for those.
+    // In whole seconds, for a short text.
     return {static_cast<long>(ZQ::DateTime::now()), 0};
 }
 
@@ -87,7 +87,7 @@ Component::Component(const Site& site) : Node(site.sensor)
     }
     const int weight = object->cpuset == nullptr ? -1 : hwloc_bitmap_weight(object->cpuset);
     if (weight < 0)
-        return;  // also a set without end, which no machine has
+        return;  // no set, or a set without end, which no machine has
     IC::NumberArray threads;
     for (int thread = -1; (thread = hwloc_bitmap_next(object->cpuset, thread)) != -1;)
         threads.push_back(number32(thread));
@@ -104,8 +104,9 @@ void Component::addFacts(const hwloc_info_s* facts, unsigned int number, bool of
         const Fact fact = factOf(facts[i]);
         if (ofMachine && fact.part != getSensor())
             continue;
+        // A fact that occurs again is one of the others.
         if (fact.key == KEY_OTHER_FACTS || !properties.insert({fact.key, fact.value}).second)
-            others.push_back(std::string(facts[i].name) + '=' + facts[i].value);  // or told twice
+            others.push_back(std::string(facts[i].name) + '=' + facts[i].value);
     }
     if (!others.empty())
         put(KEY_OTHER_FACTS, others);
@@ -165,7 +166,7 @@ Processor::Processor(const Site& site) : Component(site)
 
 Core::Core(const Site& site) : Component(site)
 {
-    // Facts of all the cores of its kind.
+    // The facts that all cores of this kind share.
     hwloc_info_s* facts = nullptr;
     unsigned int number = 0;
     const int kind = hwloc_cpukinds_get_by_cpuset(site.topology, site.object->cpuset, 0);
@@ -248,7 +249,7 @@ Slot::Slot(const Site& site, const std::string& name) : Component(site)
 
 Device::Device(const Site& site) : Component(site)
 {
-    // As it was told: with colons it reads better than the property's text.
+    // As in the export, because with colons it is easier to read than the property's text.
     const char* address = hwloc_obj_get_info_by_name(site.object, "Address");
     describe({product(), size(), address == nullptr ? "" : told(address)});
 }

@@ -29,7 +29,7 @@ enum Key : unsigned int {
     KEY_CHIP, KEY_LAST = KEY_CHIP
 };
 
-// What a node's status says; above 0 something is not right.
+// The status of a node; above 0 something is wrong.
 enum Status : unsigned int {
     STATUS_FINE, STATUS_NOT_USABLE, STATUS_PARTLY_USABLE, STATUS_SIZE_UNKNOWN, STATUS_OUTSIDE_LIMITS,
     STATUS_ALARM, STATUS_FAULT
@@ -38,18 +38,18 @@ enum Status : unsigned int {
 
 const char* nameOf(unsigned int key);
 
-// What a node is made from.
+// The data from which a node is built.
 struct Site {
     IC::Node::SensorType sensor = IC::Node::SENSOR_UNKNOWN;
     std::string path;
     std::string parent;
-    IC::NodeRef self {};  // how other nodes refer to this one, and to its parent
+    IC::NodeRef self {};  // the references to this node and to its parent
     IC::NodeRef above {};
     hwloc_topology_t topology = nullptr;
-    hwloc_obj_t object = nullptr;  // null for what hwloc does not know
+    hwloc_obj_t object = nullptr;  // null if hwloc has none for the node
 };
 
-// What all nodes here have in common, and what hwloc tells about any object: name, number, threads, whether
+// The properties that all nodes have, and those that hwloc gives for any object: name, number, threads, whether
 // the system may use it, facts.
 class Component : public IC::Node {
 public:
@@ -59,13 +59,13 @@ protected:
     template <class T>
     void put(Key key, const T& value, bool readOnly = true)
     {
-        // PropertyValue takes a bare number for the code of a kind.
+        // PropertyValue would take a bare number as the code of a kind.
         static_assert(!std::is_arithmetic_v<T> && !std::is_enum_v<T>, "write IC::Number or IC::EnumValue");
         properties.insert_or_assign(key, IC::PropertyValue(value, readOnly));
     }
     void become(Status newStatus) { status = static_cast<StatusType>(newStatus); }
     void addFacts(const hwloc_info_s* facts, unsigned int number, bool ofMachine);
-    // Sets the description; pieces that say nothing are left out.
+    // Sets the description: the pieces, without empty ones, separated by commas.
     void describe(const std::vector<std::string>& pieces);
 
     std::string words(Key key) const;  // the property's text, "" if there is none
@@ -83,13 +83,13 @@ struct MemoryArray : Component { explicit MemoryArray(const Site& site); };
 struct MemoryModule : Component { explicit MemoryModule(const Site& site); };
 struct PciDevice : Component { explicit PciDevice(const Site& site); };
 struct Slot : Component { Slot(const Site& site, const std::string& name); };
-struct Device : Component { explicit Device(const Site& site); };  // as the operating system names it
+struct Device : Component { explicit Device(const Site& site); };  // a device of the operating system
 // clang-format on
 
 std::string pciAddress(hwloc_obj_t object);  // "0000:02:00.0"
 
-// The code in one of hwloc's enumerations. hwloc stores what an export says, also what the enumeration cannot
-// hold; read as what it is, such a value would be undefined behaviour.
+// The code of an hwloc enumerator. hwloc stores any number that an export holds; to read a number outside the
+// enumeration's range as the enumeration is undefined behaviour.
 template <class Enumeration>
 unsigned int codeOf(const Enumeration& value)
 {

@@ -1,4 +1,4 @@
-// Loads a machine with hwloc and walks through its objects.
+// Loads a machine with hwloc and makes nodes of its objects.
 #include "reading.h"
 
 #include <fcntl.h>
@@ -26,7 +26,7 @@ BadInput unreadable()
 
 using Topology = std::unique_ptr<hwloc_topology, decltype(&hwloc_topology_destroy)>;
 
-// With everything that hwloc knows of the export, or of this machine where there is none.
+// Loads all that hwloc knows of the export or, if `xml` is null, of this machine.
 Topology load(const std::string* xml)
 {
     hwloc_topology_t made = nullptr;
@@ -42,14 +42,14 @@ Topology load(const std::string* xml)
     return topology;
 }
 
-// hwloc trusts what it reads: some damaged exports crash it or keep it busy for ever. So a child process loads
-// an export first, and what the child does not survive is not loaded here.
+// Some damaged exports crash hwloc or make it loop for ever. So a child process loads each export first; if the child
+// fails, this process does not load the export.
 bool survives(const std::string& xml)
 {
     constexpr unsigned int secondsAtMost = 60;
     const pid_t child = fork();
     if (child < 0)
-        return true;  // it was not tried
+        return true;  // not tested: no process is available
     if (child == 0) {
         const rlimit noCore {0, 0};
         setrlimit(RLIMIT_CORE, &noCore);
@@ -97,7 +97,8 @@ private:
         return site;
     }
 
-    // One that stays, where there is one: of a device, or of a memory module's place. Others are numbered.
+    // A name that is the same in each reading if there is one: of a device or of a memory module's location. Other
+    // objects are numbered.
     std::string nameOf(hwloc_obj_t object, const Row& row, const Site& parent)
     {
         if (object->type == HWLOC_OBJ_MACHINE)
@@ -112,7 +113,7 @@ private:
         return row.word + std::to_string(numbers_[parent.path + '/' + row.word]++);
     }
 
-    // One slot for all that is plugged into it.
+    // One node for a slot, however many functions its card has.
     Site slotOf(const Site& parent, const std::string& name)
     {
         const auto [found, isNew] = slots_.try_emplace({parent.path, name});
@@ -123,7 +124,7 @@ private:
         return found->second;
     }
 
-    // A part of the machine is there once a fact tells anything of it.
+    // Adds a node for a part of the machine at the first fact about it that is not empty.
     void readPart(hwloc_obj_t machine, IC::Node::SensorType part, const std::string& text)
     {
         const Row* row = findRow(machine, part);
@@ -160,7 +161,7 @@ Site Inventory::site(const Site& parent, IC::Node::SensorType sensor, std::strin
             isPlain ? std::string(1, character) : '%' + IC::pB(static_cast<unsigned char>(character));
     }
     if (const unsigned int times = ++taken_[site.path]; times > 1)
-        site.path += '#' + std::to_string(times);  // no name has a # of its own here
+        site.path += '#' + std::to_string(times);  // unambiguous: a # in a name has become %23
     site.parent = parent.path;
     site.self = {sensor, ids_[sensor]++};
     site.above = parent.self;

@@ -1,4 +1,4 @@
-// From libsensors to nodes: fans, temperatures, voltages, power.
+// Reads fans, temperatures, voltages and power with libsensors into nodes.
 #include <sensors/sensors.h>
 
 #include <cstdlib>
@@ -20,7 +20,7 @@ const struct Kind {
     {SENSORS_FEATURE_POWER, IC::Node::SENSOR_POWER_SUPPLY, "watts"},
 };
 
-// The values of a sensor by the end of their names: fan1_min, in0_max_alarm.
+// The values of a sensor, by the ends of their names, such as fan1_min and in0_max_alarm.
 const struct ValueRow {
     std::string_view ending;
     Key key;
@@ -57,7 +57,7 @@ public:
         describe({words(KEY_NAME), words(KEY_READING) + ' ' + unit});
     }
 
-    // A changed limit is judged at once.
+    // A new limit changes the status at once.
     IC::Error setProperty(const unsigned int& key, const IC::PropertyValue& value) override
     {
         IC::Error outcome = Component::setProperty(key, value);
@@ -75,13 +75,13 @@ private:
             return;
         if (row->key == KEY_READING)
             put(row->key, IC::Number(number));
-        else if (row->key == KEY_ALARM || row->key == KEY_FAULT)  // one of several is enough
+        else if (row->key == KEY_ALARM || row->key == KEY_FAULT)  // one of several alarms is enough
             put(row->key, IC::Number(number != 0 || words(row->key) == "true"));
         else if (number != 0 || row->key == KEY_LOWER_LIMIT || row->key == KEY_LOWER_CRITICAL)
-            put(row->key, IC::Number(number), false);  // an upper limit of 0 is one that nobody set
+            put(row->key, IC::Number(number), false);  // an upper limit of 0 means that none is set
     }
 
-    // Only real numbers can be beyond each other: no limit is, nor one that was changed to something else.
+    // False unless both are real numbers: the limit may be missing or have been replaced by a value of another kind.
     bool beyond(Key limit, bool above) const
     {
         const auto bound = properties.find(limit);

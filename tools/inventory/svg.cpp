@@ -1,4 +1,4 @@
-// The machine as nested boxes: each node a box, what is part of it inside.
+// Draws the machine as nested boxes: a box for each node, with the boxes of its parts inside.
 #include <algorithm>
 #include <cmath>
 #include <ostream>
@@ -14,11 +14,11 @@ namespace inventory {
 
 namespace {
 
-// In pixels. Letters are of one width, so that the width of a text is known.
+// In pixels. All letters have the same width, so the width of a text is known.
 constexpr int letterWidth = 7;
 constexpr int lineHeight = 15;
 constexpr int gap = 5;
-constexpr std::size_t longestLine = 32;  // unless there is room
+constexpr std::size_t longestLine = 32;  // in letters; more if the box is wider
 
 struct Box {
     const IC::Node* node = nullptr;
@@ -30,7 +30,7 @@ struct Box {
     int height = 0;
 };
 
-// Printable texts are plain ASCII, so only what XML uses itself is left.
+// The texts are printable ASCII, so only XML's own characters need escaping.
 std::string escaped(const std::string& text)
 {
     std::string out;
@@ -61,8 +61,8 @@ int widthOf(const std::string& text)
     return static_cast<int>(text.size()) * letterWidth;
 }
 
-// The inner boxes in rows, from left to right, below what is written. Rows are never full, so the width to height
-// that is aimed at is more than what comes out.
+// Places the inner boxes below the text, in rows from left to right. Rows are not quite full, so the result is
+// narrower than widthToHeight says.
 void arrange(Box& box)
 {
     constexpr double widthToHeight = 2.5;
@@ -95,7 +95,7 @@ Box boxOf(const Children& children, const IC::Node& node)
 {
     Box box;
     box.node = &node;
-    // The sensor type is told by the colour.
+    // The colour shows the sensor type.
     const std::string words = inWords(node).substr(IC::pst[node.getSensor()].size() + 1);
     const std::size_t colon = words.find(": ");
     box.lines.push_back(words.substr(0, colon));
@@ -148,7 +148,7 @@ void draw(std::ostream& out, const Box& box)
     out << "</g>\n";
 }
 
-// One entry for each sensor type, in rows of the given width; gives the height.
+// Draws one entry for each sensor type, in rows of the given width. Returns the height.
 int drawLegend(std::ostream& out, const Nodes& nodes, int width)
 {
     std::set<IC::Node::SensorType> sensors;

@@ -1,4 +1,4 @@
-// How numbers, sizes, versions, dates and addresses are written in texts of others.
+// Parses numbers, sizes, versions, dates and addresses, and writes values as text.
 #include "values.h"
 
 #include <charconv>
@@ -18,7 +18,7 @@ std::string_view trimmed(std::string_view text)
                                            : text.substr(first, text.find_last_not_of(blanks) - first + 1);
 }
 
-// Takes a number off the front of the text.
+// Parses the number at the front of the text and removes it.
 template <class T>
 std::optional<T> take(std::string_view& text, int base = 10)
 {
@@ -54,7 +54,7 @@ std::optional<double> realNumber(std::string_view text)
 
 std::optional<ZQ::Uint64> sizeInBytes(std::string_view text)
 {
-    // Makers of memory count in powers of two, however they write the unit.
+    // The units of memory sizes are powers of two, even if they are written MB.
     static const struct Unit {
         std::string_view name;
         unsigned int shift;

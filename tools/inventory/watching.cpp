@@ -16,10 +16,10 @@ namespace inventory {
 
 namespace {
 
-// Puts off the signals that end the program, so that what is being written is whole.
-class SignalsPutOff {
+// Blocks the signals that end the program, so that it never ends in the middle of its output.
+class BlockedSignals {
 public:
-    SignalsPutOff()
+    BlockedSignals()
     {
         sigset_t ends;
         sigemptyset(&ends);
@@ -27,9 +27,9 @@ public:
         sigaddset(&ends, SIGTERM);
         pthread_sigmask(SIG_BLOCK, &ends, &before_);
     }
-    ~SignalsPutOff() { pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
-    SignalsPutOff(const SignalsPutOff&) = delete;
-    SignalsPutOff& operator=(const SignalsPutOff&) = delete;
+    ~BlockedSignals() { pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
+    BlockedSignals(const BlockedSignals&) = delete;
+    BlockedSignals& operator=(const BlockedSignals&) = delete;
 
 private:
     sigset_t before_ {};
@@ -39,7 +39,7 @@ private:
 
 void watch(const std::function<Inventory()>& read, double seconds, std::ostream& out, const Look& look)
 {
-    // At any other time nothing is left to do, also amid a reading that takes long.
+    // At any other time the program can end at once, even during a long reading.
     for (const int signal : {SIGINT, SIGTERM})
         std::signal(signal, [](int) { _exit(0); });
     Inventory last = read();
@@ -50,7 +50,7 @@ void watch(const std::function<Inventory()>& read, double seconds, std::ostream&
         try {
             Inventory next = read();
             const auto alerts = alertsOf(changesBetween(last.nodes, next.nodes));
-            const SignalsPutOff untilWritten;
+            const BlockedSignals untilWritten;
             if (!alerts.empty())
                 writeAlerts(out, alerts, look);
             out.flush();

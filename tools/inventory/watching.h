@@ -1,4 +1,4 @@
-// Reads a machine again and again, and tells what changed.
+// Reads a machine periodically and reports the changes.
 #pragma once
 
 #include <functional>
@@ -8,9 +8,9 @@
 
 namespace inventory {
 
-// Writes an alert for each change, until SIGINT or SIGTERM ends the program with status 0. Returns only where
-// nothing can be written any more; throws where the first reading fails. What a later one throws goes to standard
-// error, once, and the next is compared with the last that succeeded.
+// Writes an alert for each change until SIGINT or SIGTERM ends the program with status 0. Returns only if the output
+// cannot be written, and throws BadInput if the first reading fails. If a later reading fails, its message goes to
+// standard error, but not twice in a row, and the next reading is compared with the last successful one.
 void watch(const std::function<Inventory()>& read, double seconds, std::ostream& out, const Look& look);
 
 }  // namespace inventory

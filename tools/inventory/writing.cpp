@@ -1,4 +1,4 @@
-// The tree, the properties, the alerts, the changes and the summary as text.
+// Writes the tree, the properties, the alerts, the changes and the summary as text.
 #include "writing.h"
 
 #include <langinfo.h>
@@ -53,8 +53,8 @@ std::string nodeLine(const IC::Node& node, const TreeForm& form)
         + text.substr(sensor) + (trouble.empty() ? "" : painted(form.look, severities[2], trouble));
 }
 
-// What stands before a node that others follow, before the last one, below each of these, and before a property
-// of a node with children and of one without.
+// The beginnings of lines: of a child that another child follows, of the last child, of the lines below each of the
+// two, and of the properties of a node with children and of a node without.
 struct Lines {
     const char* child;
     const char* lastChild;

@@ -1,10 +1,10 @@
-# Fails unless GDB shows a program's values as shown.txt has them.
+# Fails unless GDB shows the values of a program as in shown.txt.
 #
 #   GDB        the debugger
-#   PROGRAM    what it runs
-#   PRINTERS   the script that GDB is told to read
-#   BUILD      set: this build is installed below PREFIX (its folders LIBRARIES and DATA), the program uses the library
-#              from there, and GDB finds the script by itself
+#   PROGRAM    the program
+#   PRINTERS   the script that GDB loads
+#   BUILD      optional. The build is installed below PREFIX, with the folders LIBRARIES and DATA; the program uses the
+#              installed library, and GDB loads the installed script automatically.
 if(BUILD)
     file(REMOVE_RECURSE ${PREFIX})
     execute_process(COMMAND ${CMAKE_COMMAND} --install ${BUILD} --prefix ${PREFIX}

@@ -9,7 +9,7 @@
 #include "IC/Number.h"
 #include "IC/Property.h"
 
-// Values of every class and kind, which GDB stops beside and prints.
+// Values of every class and kind. GDB stops in stop() and prints them.
 
 namespace {
 
@@ -105,7 +105,7 @@ struct Shown {
     IC::NodeInvalidSensor invalidSensor {IC::NodeInvalidSensor("74 is not a valid sensor")};
 };
 
-// Storage that nothing was built in, or that something wrote over.
+// Storage of a T that was never constructed or has been overwritten.
 template <class T>
 union Storage {
     explicit Storage(int byte) { std::memset(bytes, byte, sizeof bytes); }
@@ -115,7 +115,7 @@ union Storage {
     unsigned char bytes[sizeof(T)];
 };
 
-// As a property value lies in memory.
+// The layout of a PropertyValue.
 struct Fields {
     const void* object;
     unsigned int kind;
@@ -152,7 +152,7 @@ private:
     static inline const void* const unreadable = reinterpret_cast<const void*>(16);
 };
 
-// Both stay in memory until here, however the program is optimised.
+// Keeps both objects in memory at any level of optimisation.
 [[gnu::noinline]] void stop(const Shown& shown, const Damaged& damaged)
 {
     asm volatile("" : : "r"(&shown), "r"(&damaged) : "memory");

@@ -1,4 +1,4 @@
-// What the inventory says has changed: between nodes made here, between two exports, and while it watches.
+// The changes that the inventory reports: between nodes made here, between two exports, and with --watch.
 #include <fcntl.h>
 #include <gmock/gmock.h>
 #include <poll.h>
@@ -44,7 +44,7 @@ Nodes listOf(std::initializer_list<Made*> nodes)
 constexpr auto cpu = IC::Node::SENSOR_CPU;
 constexpr auto fan = IC::Node::SENSOR_FAN;
 
-// The lines that tell the difference between two values of property 12.
+// The lines for a change of property 12 from one value to another.
 std::string between(const IC::PropertyValue& before, const IC::PropertyValue& after)
 {
     const Nodes old = listOf({new Made(cpu, "/cpu0", {{KEY_MODEL, before}})});
@@ -59,7 +59,7 @@ std::string linesFor(const std::string& before, const std::string& after)
     return "  CPU /cpu0\n-   [12 = " + before + "] model\n+   [12 = " + after + "] model\n";
 }
 
-TEST(InventoryChanges, AreValuesThatTheOperatorsTellApart)
+TEST(InventoryChanges, IncludeValuesThatCompareUnequal)
 {
     EXPECT_EQ(between("a", "b"), linesFor("a", "b"));
     EXPECT_EQ(between(IC::Number(1u), IC::Number(2u)), linesFor("1", "2"));
@@ -72,7 +72,7 @@ TEST(InventoryChanges, AreValuesThatTheOperatorsTellApart)
               linesFor("1970-01-01T00:01:00Z", "1970-01-01T00:01:01Z"));
 }
 
-TEST(InventoryChanges, AreSignedNumbersThoughTheOperatorsCallAllOfThemEqual)
+TEST(InventoryChanges, IncludeSignedNumbersAlthoughTheyCompareEqual)
 {
     ASSERT_EQ(IC::Number(-1), IC::Number(16));
     EXPECT_EQ(between(IC::Number(-1), IC::Number(16)), linesFor("-1", "16"));
@@ -80,7 +80,7 @@ TEST(InventoryChanges, AreSignedNumbersThoughTheOperatorsCallAllOfThemEqual)
     EXPECT_EQ(between(IC::Number(-1), IC::Number(-1)), "");
 }
 
-TEST(InventoryChanges, AreRealsThatDifferBeyondTheirText)
+TEST(InventoryChanges, IncludeRealsThatHaveTheSameText)
 {
     EXPECT_EQ(between(IC::Number(0.1), IC::Number(0.1000000001)), linesFor("0.1", "0.1000000001"));
     EXPECT_EQ(between(IC::NumberArray {0.1}, IC::NumberArray {0.1000000001}),
@@ -88,7 +88,7 @@ TEST(InventoryChanges, AreRealsThatDifferBeyondTheirText)
     EXPECT_EQ(between(IC::Number(0.1), IC::Number(0.1)), "");
 }
 
-TEST(InventoryChanges, AreNoneWhereARealIsStillNotANumber)
+TEST(InventoryChanges, ExcludeARealThatStaysNaN)
 {
     const double nan = std::nan("");
     ASSERT_NE(IC::Number(nan), IC::Number(nan));
@@ -97,20 +97,20 @@ TEST(InventoryChanges, AreNoneWhereARealIsStillNotANumber)
     EXPECT_EQ(between(IC::Number(nan), IC::Number(1.0)), linesFor("nan", "1"));
 }
 
-TEST(InventoryChanges, NameTheKindsWhereTheTextsAreTheSame)
+TEST(InventoryChanges, NameTheKindsIfTheTextsAreEqual)
 {
     EXPECT_EQ(between("5", IC::Number(5u)), linesFor("5 (string)", "5 (uint32)"));
     EXPECT_EQ(between(IC::Number(5u), IC::Number(5ull)), linesFor("5 (uint32)", "5 (uint64)"));
     EXPECT_EQ(between(IC::EnumValue(5u), IC::Number(5)), linesFor("5 (enum)", "5 (int)"));
 }
 
-TEST(InventoryChanges, OfReferencesAreThoseOfTheNodesThatTheyLeadTo)
+TEST(InventoryChanges, CompareReferencesByTheNodesThatTheyLeadTo)
 {
     const auto reference = [](unsigned int id) {
         return IC::PropertyValue(IC::Number(IC::NodeRef {cpu, id}));
     };
     ASSERT_EQ(reference(0), reference(1));
-    // Two processors and something that belongs to one of them.
+    // Two processors, and a fan that belongs to one of them.
     const auto machine = [&](unsigned int first, unsigned int second, unsigned int owner) {
         return listOf({new Made(cpu, "/cpu0", {{KEY_SELF, reference(first)}}),
                        new Made(cpu, "/cpu1", {{KEY_SELF, reference(second)}}),
@@ -125,7 +125,7 @@ TEST(InventoryChanges, OfReferencesAreThoseOfTheNodesThatTheyLeadTo)
     EXPECT_EQ(changes(first, machine(0, 1, 0)), "");
     EXPECT_EQ(changes(first, machine(0, 1, 1)),
               "  Fan /fan\n-   [2 = /cpu0] parent node\n+   [2 = /cpu1] parent node\n");
-    // The processors are numbered anew: CPU:0 is another one, and CPU:1 the one that it was.
+    // The processors have exchanged their numbers.
     EXPECT_EQ(changes(first, machine(1, 0, 0)),
               "  Fan /fan\n-   [2 = /cpu0] parent node\n+   [2 = /cpu1] parent node\n");
     EXPECT_EQ(changes(first, machine(1, 0, 1)), "");
@@ -133,7 +133,7 @@ TEST(InventoryChanges, OfReferencesAreThoseOfTheNodesThatTheyLeadTo)
               "  Fan /fan\n-   [2 = /cpu0] parent node\n+   [2 = CPU:7] parent node\n");
 }
 
-TEST(InventoryChanges, AreNodesAndPropertiesThatComeAndGo)
+TEST(InventoryChanges, IncludeNodesAndPropertiesThatComeAndGo)
 {
     const Nodes before = listOf({new Made(cpu, "/cpu0", {{KEY_MODEL, "x"}, {KEY_MAKER, "y"}}),
                                  new Made(cpu, "/cpu1", {{KEY_MODEL, "x"}}), new Made(fan, "/a")});
@@ -151,7 +151,7 @@ TEST(InventoryChanges, AreNodesAndPropertiesThatComeAndGo)
               "+ CPU /a\n");
 }
 
-TEST(InventoryChanges, AreNoneInTheTimeOfReading)
+TEST(InventoryChanges, ExcludeTheTimeOfReading)
 {
     const Nodes before =
         listOf({new Made(cpu, "/cpu0", {{KEY_READ_AT, IC::Number(60L, 0)}}), new Made(fan, "/a")});
@@ -161,7 +161,7 @@ TEST(InventoryChanges, AreNoneInTheTimeOfReading)
     EXPECT_THAT(changesBetween(after, before), IsEmpty());
 }
 
-TEST(InventoryChanges, AreAlertsOfASeverityAndAClass)
+TEST(InventoryChanges, BecomeAlertsWithASeverityAndAClass)
 {
     const auto alert = [](const Nodes& before, const Nodes& after) {
         const auto alerts = alertsOf(changesBetween(before, after));
@@ -217,9 +217,9 @@ protected:
                                                    + disk("sdc", fact("Model", "X\x1b"))));
 };
 
-TEST_F(InventoryDiff, TellsNodeByNodeAndPropertyByProperty)
+TEST_F(InventoryDiff, WritesEachNodeAndPropertyThatDiffers)
 {
-    setenv("HWLOC_LIBXML", "0", 1);  // the parser that lets control characters through
+    setenv("HWLOC_LIBXML", "0", 1);  // the parser that accepts control characters
     const Outcome outcome = run(before, after);
     unsetenv("HWLOC_LIBXML");
     EXPECT_EQ(outcome.status, 1);
@@ -239,7 +239,7 @@ TEST_F(InventoryDiff, TellsNodeByNodeAndPropertyByProperty)
                     "+ Hard Drive /machine/sdc: X\\x1b\n");
 }
 
-TEST_F(InventoryDiff, SaysNothingWhereNothingDiffers)
+TEST_F(InventoryDiff, WritesNothingIfNothingDiffers)
 {
     const Outcome outcome = run(before, before);
     EXPECT_EQ(outcome.status, 0);
@@ -247,7 +247,7 @@ TEST_F(InventoryDiff, SaysNothingWhereNothingDiffers)
     EXPECT_EQ(outcome.err, "");
 }
 
-TEST_F(InventoryDiff, HasStatus2ForTrouble)
+TEST_F(InventoryDiff, ExitsWith2OnFailure)
 {
     const std::string broken = folder.write("broken.xml", "hello\n");
     for (const auto& [one, other] : {std::pair(before, broken), std::pair(broken, before)}) {
@@ -264,7 +264,7 @@ TEST_F(InventoryDiff, HasStatus2ForTrouble)
     EXPECT_EQ(full.err, "inventory: the output cannot be written\n");
 }
 
-TEST_F(InventoryDiff, TellsRealMachinesApart)
+TEST_F(InventoryDiff, FindsTheDifferencesOfRealMachines)
 {
     if (std::string(IC_TEST_TOPOLOGIES).empty())
         GTEST_SKIP() << "no folder with exports of real machines (CMake variable IC_TEST_TOPOLOGIES)";
@@ -284,7 +284,7 @@ TEST_F(InventoryDiff, TellsRealMachinesApart)
     }
 }
 
-// The program while it runs; what it writes, also to standard error, comes through a pipe.
+// A running program; its output, standard error included, comes through a pipe.
 class Running {
 public:
     explicit Running(const std::vector<std::string>& words)
@@ -317,7 +317,7 @@ public:
     Running(const Running&) = delete;
     Running& operator=(const Running&) = delete;
 
-    // Waits until what was written, from where the last wait ended, holds the text; gives what came up to there.
+    // Waits for the text in the output that follows the last match; gives that output up to the end of the text.
     std::string await(const std::string& text)
     {
         std::size_t at = 0;
@@ -335,14 +335,14 @@ public:
         return before;
     }
 
-    // The state in which the system has the process: S sleeps, R runs.
+    // The state of the process: S sleeps, R runs.
     char state() const
     {
         const std::string line = contentOf("/proc/" + std::to_string(process_) + "/stat");
         return line.at(line.rfind(')') + 2);
     }
 
-    // How often it has given up the processor, or was made to.
+    // The number of context switches, voluntary or not.
     long switches() const
     {
         long sum = 0;
@@ -352,7 +352,7 @@ public:
         return sum;
     }
 
-    // The exit status, -1 where it did not exit by itself.
+    // Sends the signal and gives the exit status, -1 if a signal ended the program.
     int end(int signal)
     {
         kill(process_, signal);
@@ -375,7 +375,7 @@ private:
 
 class InventoryWatch : public testing::Test {
 protected:
-    // At once, so that no reading sees a half of it.
+    // Replaces the file at once, so that no reading sees half of it.
     void put(const std::string& text) const
     {
         std::filesystem::rename(folder.write("new.xml", text), folder.path("machine.xml"));
@@ -407,13 +407,13 @@ TEST_F(InventoryWatch, WritesAnAlertForEachChange)
     EXPECT_EQ(program.end(SIGTERM), 0);
 }
 
-TEST_F(InventoryWatch, GoesOnAfterAReadingThatFails)
+TEST_F(InventoryWatch, ContinuesAfterAFailedReading)
 {
     Running program({INVENTORY_PROGRAM, "--watch", "0.02", file});
     program.await("\n");
     put("hello\n");
     EXPECT_THAT(program.await("\n"), HasSubstr("machine.xml: not a machine that hwloc "));
-    std::filesystem::remove(file);  // told once more, as it is another trouble
+    std::filesystem::remove(file);  // another failure, so another message
     EXPECT_EQ(program.await("\n"), "inventory: " + file + ": No such file or directory\n");
     put(machineOf(fact("DMIProductName", "Two"), disk("sda", "")));
     EXPECT_THAT(program.await("One to Two\n"),
@@ -421,9 +421,9 @@ TEST_F(InventoryWatch, GoesOnAfterAReadingThatFails)
     EXPECT_EQ(program.end(SIGINT), 0);
 }
 
-TEST_F(InventoryWatch, EndsAtASignalWithStatus0)
+TEST_F(InventoryWatch, ExitsWith0OnASignal)
 {
-    const std::string never = folder.path("never");  // nobody writes to it: no reading of it ends
+    const std::string never = folder.path("never");  // a pipe without a writer: reading it never ends
     ASSERT_EQ(mkfifo(never.c_str(), S_IRUSR | S_IWUSR), 0);
     for (const int signal : {SIGINT, SIGTERM}) {
         Running waiting({INVENTORY_PROGRAM, "--watch", "1000000000", file});
@@ -446,12 +446,12 @@ TEST_F(InventoryWatch, SleepsBetweenReadings)
         usleep(1000);
     ASSERT_EQ(program.state(), 'S');
     const long switches = program.switches();
-    usleep(200000);  // however long it is, who sleeps does not wake
+    usleep(200000);  // a sleeping process is not switched, however long this takes
     EXPECT_EQ(program.switches(), switches);
     EXPECT_EQ(program.end(SIGTERM), 0);
 }
 
-TEST_F(InventoryWatch, RefusesAPeriodThatIsNoTime)
+TEST_F(InventoryWatch, RefusesAnInvalidPeriod)
 {
     for (const char* seconds :
          {"", "0", "-1", "0.0009", "1000000001", "nan", "inf", "1e999", "ten", "1s", "1,5"}) {
@@ -460,11 +460,11 @@ TEST_F(InventoryWatch, RefusesAPeriodThatIsNoTime)
         EXPECT_EQ(outcome.out, "");
         EXPECT_EQ(outcome.err,
                   "inventory: --watch: '" + std::string(seconds)
-                      + "' is no number of seconds from 0.001 to 1000000000\n");
+                      + "' is not a number of seconds from 0.001 to 1000000000\n");
     }
 }
 
-TEST_F(InventoryWatch, FailsWhereTheFirstReadingDoesOrNothingCanBeWritten)
+TEST_F(InventoryWatch, FailsIfTheFirstReadingOrTheOutputFails)
 {
     Outcome outcome = runProgram({INVENTORY_PROGRAM, "--watch", "1", folder.path("missing.xml")});
     EXPECT_EQ(outcome.status, 2);

@@ -1,4 +1,4 @@
-// What the inventory writes: on a terminal, as JSON and as a drawing; its command line and its manual.
+// The inventory's output on a terminal, as JSON and as a drawing; its command line and its manual.
 #include <gmock/gmock.h>
 
 #include <cmath>
@@ -30,7 +30,7 @@ struct Made : IC::Node {
     }
 };
 
-// What a Python program prints that is given the file; it fails where the file is not what it reads.
+// The output of a Python program that reads the file. The program fails if the file is not valid.
 std::string readByPython(const std::string& program, const std::string& file)
 {
     const Outcome outcome = runProgram({PYTHON, "-c", program, file});
@@ -52,7 +52,7 @@ std::vector<std::string> realMachines()
 
 class InventoryOutput : public testing::Test {
 protected:
-    // With the parser that lets through what XML forbids.
+    // With hwloc's parser that accepts characters that XML forbids.
     static Outcome run(std::vector<std::string> words)
     {
         words.insert(words.begin(), {"env", "HWLOC_LIBXML=0", INVENTORY_PROGRAM});
@@ -101,7 +101,7 @@ TEST_F(InventoryOutput, HasColoursAndLinesOnATerminal)
                            "  \x1b[33m/machine/dimm0, DIMM: its size is unknown\x1b[0m\r\n"));
 }
 
-TEST_F(InventoryOutput, HasNoColoursWhereTheyAreTurnedOff)
+TEST_F(InventoryOutput, HasNoColoursIfTheyAreTurnedOff)
 {
     for (const char* setting : {"NO_COLOR=1", "TERM=dumb"}) {
         SCOPED_TRACE(setting);
@@ -118,7 +118,7 @@ TEST_F(InventoryOutput, HasNoColoursWhereTheyAreTurnedOff)
     EXPECT_THAT(runOnTerminal("LC_ALL=C.UTF-8 NO_COLOR=", file).out, StartsWith("\x1b[1mComputer"));
 }
 
-TEST_F(InventoryOutput, HasPlainLinesWhereTheTerminalIsNotUtf8)
+TEST_F(InventoryOutput, HasAsciiLinesIfTheTerminalIsNotUtf8)
 {
     EXPECT_THAT(runOnTerminal("LC_ALL=C NO_COLOR=1", "--properties --log " + file).out,
                 testing::MatchesRegex("Node 2f6d616368696e65 : 40, status = 0\r\n"
@@ -145,7 +145,7 @@ TEST_F(InventoryOutput, IsPlainTextInAPipe)
                            "  /machine/dimm0, DIMM: its size is unknown\n"));
 }
 
-TEST_F(InventoryOutput, HasChangesInColoursOnATerminal)
+TEST_F(InventoryOutput, HasColouredChangesOnATerminal)
 {
     const std::string other = folder.write("other.xml", machineOf(fact("DMIProductName", "Two")));
     const Outcome outcome = runOnTerminal("LC_ALL=C", "--diff " + file + ' ' + other);
@@ -219,7 +219,7 @@ TEST(InventoryJson, HasAValueForEachKind)
               "18 False unknown None\n");
 }
 
-TEST(InventoryJson, IsWrittenLikeThis)
+TEST(InventoryJson, HasThisLayout)
 {
     Nodes nodes;
     nodes.push_back(std::make_unique<Made>(IC::Node::SENSOR_FAN, "/fan", "", "slow",
@@ -278,7 +278,7 @@ TEST_F(InventoryOutput, IsValidJsonForEveryMachine)
     }
 }
 
-TEST_F(InventoryOutput, IsValidJsonForBytesThatAreNoText)
+TEST_F(InventoryOutput, IsValidJsonForTextsThatAreNotUtf8)
 {
     const Outcome outcome = run({"--json", hostile});
     EXPECT_EQ(outcome.status, 0) << outcome.err;
@@ -294,7 +294,7 @@ TEST_F(InventoryOutput, IsValidJsonForBytesThatAreNoText)
               "{'hex': 'fffe22011b5b324a5d5d3e3c2f746578743e26616d703b277feda080c3a4'}\n");
 }
 
-TEST_F(InventoryOutput, IsNoJsonWhereItWasNotBuiltIn)
+TEST_F(InventoryOutput, IsNoJsonIfBuiltWithoutIt)
 {
     const Outcome outcome = runProgram({INVENTORY_WITHOUT_JSON, "--json", file});
     EXPECT_EQ(outcome.status, 2);
@@ -306,8 +306,8 @@ TEST_F(InventoryOutput, IsNoJsonWhereItWasNotBuiltIn)
 
 // --- The drawing ---
 
-// Each box lies in the one around it and beside its siblings, and each text in its box; prints how many boxes there
-// are and of how many colours. What a text is wide is what a browser makes of 11 pixels of a font of one width.
+// Checks that each box lies in its parent's box without overlapping its siblings, and each text in its box. Prints the
+// numbers of boxes and of colours. Takes a letter of the monospaced 11-pixel font as 6.7 pixels wide.
 constexpr const char* measure = R"(
 import re, sys
 import xml.etree.ElementTree as tree
@@ -357,7 +357,7 @@ protected:
     }
 };
 
-TEST_F(InventoryDrawing, HasABoxInABoxForEachNode)
+TEST_F(InventoryDrawing, NestsTheBoxesAsTheNodes)
 {
     Nodes nodes;
     nodes.push_back(std::make_unique<Made>(IC::Node::SENSOR_CPU, "/cpu", "", "a<b"));
@@ -413,14 +413,14 @@ TEST_F(InventoryDrawing, IsValidAndLegibleForEveryMachine)
     }
 }
 
-TEST_F(InventoryDrawing, IsValidForBytesThatAreNoText)
+TEST_F(InventoryDrawing, IsValidForTextsThatAreNotUtf8)
 {
     EXPECT_EQ(readByPython(measure, draw(hostile)), "boxes: 3, colours: 3\n");
 }
 
-TEST_F(InventoryDrawing, HasAColourOfItsOwnForEachSensorTypeThatBlackIsReadOn)
+TEST_F(InventoryDrawing, HasALightColourOfItsOwnForEachSensorType)
 {
-    // As WCAG defines the contrast; 7 is its highest demand.
+    // The contrast as WCAG defines it; its strictest level demands 7.
     const auto contrastToBlack = [](const std::string& fill) {
         const double weights[] = {0.2126, 0.7152, 0.0722};
         double luminance = 0;
@@ -441,14 +441,14 @@ TEST_F(InventoryDrawing, HasAColourOfItsOwnForEachSensorTypeThatBlackIsReadOn)
     EXPECT_EQ(fills.size(), 27u);
 }
 
-TEST_F(InventoryDrawing, IsNotBegunWhereTheMachineCannotBeRead)
+TEST_F(InventoryDrawing, IsNotCreatedIfTheMachineCannotBeRead)
 {
     const Outcome outcome = run({"--svg", folder.path("new.svg"), folder.path("missing.xml")});
     EXPECT_EQ(outcome.status, 2);
     EXPECT_FALSE(std::filesystem::exists(folder.path("new.svg")));
 }
 
-TEST_F(InventoryDrawing, FailsWhereItCannotBeWritten)
+TEST_F(InventoryDrawing, FailsIfItCannotBeWritten)
 {
     for (const std::string& drawing : {std::string("/dev/full"), folder.path("missing/machine.svg")}) {
         const Outcome outcome = run({file, "--svg", drawing});
@@ -460,7 +460,7 @@ TEST_F(InventoryDrawing, FailsWhereItCannotBeWritten)
 
 // --- The command line and the manual ---
 
-TEST_F(InventoryOutput, IsNoneForOptionsThatCannotBeUsed)
+TEST_F(InventoryOutput, IsOneErrorLineForInvalidOptions)
 {
     const struct {
         std::vector<std::string> words;
@@ -496,7 +496,7 @@ TEST_F(InventoryOutput, IsNoneForOptionsThatCannotBeUsed)
     EXPECT_FALSE(std::filesystem::exists("x"));
 }
 
-TEST_F(InventoryOutput, FailsWhereItCannotBeWritten)
+TEST_F(InventoryOutput, FailsIfItCannotBeWritten)
 {
     for (const std::string& words :
          {file, "--json " + file, std::string("--help"), std::string("--version")}) {
@@ -515,7 +515,7 @@ TEST_F(InventoryOutput, FailsWhereItCannotBeWritten)
     EXPECT_EQ(closed.err, "inventory: the output cannot be written\n");
 }
 
-// The long options in a text, where `mark` stands before each.
+// The long options in a text; `mark` precedes each.
 std::set<std::string> optionsIn(const std::string& text, const std::string& mark)
 {
     const std::regex option(mark + "([a-z]+)");
@@ -526,7 +526,7 @@ std::set<std::string> optionsIn(const std::string& text, const std::string& mark
     return options;
 }
 
-TEST_F(InventoryOutput, HasTheSameOptionsInItsHelpAndInItsManual)
+TEST_F(InventoryOutput, HasTheSameOptionsInHelpAndManual)
 {
     const std::string help = run({"--help"}).out;
     const std::string manual = contentOf(INVENTORY_MANUAL);

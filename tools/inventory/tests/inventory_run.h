@@ -1,4 +1,4 @@
-// Runs a program as a user would: what it wrote, where, and how it ended.
+// Runs a program and gives its output and its exit status.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -12,7 +12,7 @@
 #include <string>
 #include <vector>
 
-// A folder that goes with the test.
+// A temporary folder, removed with this object.
 class Folder {
 public:
     Folder()
@@ -50,7 +50,7 @@ inline std::string contentOf(const std::string& name)
     return content.str();
 }
 
-// The export of a machine of one thread, with these facts of it and these objects in it.
+// The export of a machine with one thread, with these facts about it and these objects in it.
 inline std::string machineOf(const std::string& facts, const std::string& objects = "")
 {
     const std::string sets = " cpuset=\"0x1\" complete_cpuset=\"0x1\" allowed_cpuset=\"0x1\" nodeset=\"0x1\""

@@ -1,4 +1,4 @@
-// The inventory's sensors, on hardware that umockdev makes up.
+// The inventory's sensors, on hardware that umockdev simulates.
 #include <gmock/gmock.h>
 
 #include "inventory_run.h"
@@ -10,7 +10,7 @@ using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
 
-// The program on a machine with one chip that has these files.
+// Runs the program on a machine with one chip that has these files.
 Outcome runWith(const std::string& files, std::vector<std::string> arguments = {})
 {
     const Folder folder;
@@ -19,8 +19,8 @@ Outcome runWith(const std::string& files, std::vector<std::string> arguments = {
                                             "P: /devices/platform/board.1/hwmon/hwmon0\nE: SUBSYSTEM=hwmon\n"
                                             "A: name=board\\n\n"
                                                 + files + "L: device=../../../board.1\n\n");
-    // umockdev puts a library before all others, where AddressSanitizer wants to be; it works beside it. The
-    // plugin "pci" of hwloc leaks memory.
+    // umockdev preloads a library, and AddressSanitizer demands to be the first one, although it works as the second
+    // too. hwloc's plugin "pci" leaks memory.
     std::vector<std::string> words {"env",
                                     "ASAN_OPTIONS=verify_asan_link_order=0",
                                     "HWLOC_COMPONENTS=-pci",
@@ -90,7 +90,7 @@ TEST(InventorySensors, RaiseAnAlertBeyondALimit)
     }
 }
 
-TEST(InventorySensors, HaveLimitsThatCanBeChanged)
+TEST(InventorySensors, HaveWritableLimits)
 {
     const std::string fan = "A: fan1_input=900\\n\nA: fan1_min=1000\\n\n";
     const std::string path = "/machine/board-isa-0001:fan1";
@@ -108,11 +108,11 @@ TEST(InventorySensors, HaveLimitsThatCanBeChanged)
     EXPECT_THAT(outcome.out, EndsWith(" : 20, status = 4\n"));
     outcome = runWith(fan, {"--set", path, key, "slow"});
     EXPECT_EQ(outcome.status, 2);
-    EXPECT_EQ(outcome.err, "inventory: 'slow' is no number\n");
+    EXPECT_EQ(outcome.err, "inventory: 'slow' is not a number\n");
     EXPECT_EQ(outcome.out, "");
 }
 
-TEST(InventorySensors, AreNoPartOfAFile)
+TEST(InventorySensors, AreNotReadWithAnExport)
 {
     const Folder folder;
     const std::string file = folder.write("machine.xml", machineOf(""));

@@ -1,4 +1,4 @@
-// The inventory example: what becomes of objects of hwloc, and how the program behaves.
+// The inventory: the nodes that it makes of hwloc's objects, and the program.
 #include <gmock/gmock.h>
 #include <hwloc.h>
 #include <hwloc/export.h>
@@ -25,7 +25,7 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Not;
 
-// The export of a machine that hwloc makes up.
+// The export of a synthetic machine.
 std::string synthetic(const std::string& description)
 {
     hwloc_topology_t topology = nullptr;
@@ -50,7 +50,7 @@ void replace(std::string& text, const std::string& from, const std::string& to)
     text.replace(at, from.size(), to);
 }
 
-// A machine of two threads, with further facts of it and further objects in it.
+// The export of a machine with two threads, with further facts about it and further objects in it.
 std::string machineWith(const std::string& facts, const std::string& objects = "")
 {
     std::string xml = synthetic("pack:1 core:1 pu:2");
@@ -65,7 +65,7 @@ std::string info(const std::string& name, const std::string& value)
     return "<info name=\"" + name + "\" value=\"" + value + "\"/>";
 }
 
-const IC::Node& nodeAt(Inventory&&, const std::string&) = delete;  // the node would go with it
+const IC::Node& nodeAt(Inventory&&, const std::string&) = delete;  // the node would not outlive the call
 const IC::Node& nodeAt(const Inventory& inventory, const std::string& path)
 {
     for (const auto& node : inventory.nodes)
@@ -102,7 +102,7 @@ std::map<std::string, unsigned int> countsOf(const Inventory& inventory)
     return counts;
 }
 
-// A number as its native type, and back.
+// Converts a number to its native type and back.
 IC::Number roundTrip(const IC::Number& number)
 {
     switch (number.getKind()) {
@@ -151,14 +151,14 @@ IC::PropertyValue roundTrip(const IC::PropertyValue& value)
     }
 }
 
-// Equal, and equal as text: two node references, as two signed numbers, are equal whatever they hold.
+// Compares the texts too, because all node references compare equal, and so do all signed numbers.
 void expectSame(const IC::PropertyValue& a, const IC::PropertyValue& b)
 {
     EXPECT_EQ(a, b);
     EXPECT_EQ(std::string(a), std::string(b));
 }
 
-// Takes the records of the library, which these tests cause by the thousand, and counts them.
+// Counts the library's records instead of printing them: these tests cause thousands.
 class Records {
 public:
     Records()
@@ -177,7 +177,7 @@ private:
     int count_ = 0;
 };
 
-// What holds for the nodes of any machine.
+// Checks what holds for the nodes of every machine.
 void expectSound(const Inventory& inventory)
 {
     const Records records;
@@ -291,7 +291,7 @@ TEST(InventoryValues, AddressesAreBytes)
         EXPECT_EQ(address(text), std::nullopt) << text;
 }
 
-TEST(InventoryValues, WordsAreForReaders)
+TEST(InventoryValues, TextsAreTrimmedAndSizesHaveUnits)
 {
     EXPECT_EQ(told(" DIMM_A1 "), "DIMM_A1");
     for (const char* nothing : {"", "   ", "N/A", "None", "NONE "})
@@ -303,7 +303,7 @@ TEST(InventoryValues, WordsAreForReaders)
     EXPECT_EQ(sizeInWords(~ZQ::Uint64 {0}), "16 EiB");
 }
 
-TEST(InventoryValues, PrintableTextDrivesNoTerminal)
+TEST(InventoryValues, PrintableTextHasNoControlCharacters)
 {
     EXPECT_EQ(printable("a\"\\~ b"), "a\"\\~ b");
     EXPECT_EQ(printable(std::string("\0\x1b[2J\n\x7f\x9b\xff", 9)), "\\x00\\x1b[2J\\x0a\\x7f\\x9b\\xff");
@@ -332,7 +332,7 @@ TEST(InventoryPaths, DoNotDependOnHowHwlocNumbersItsObjects)
     EXPECT_EQ(pathsOf(readExport(xml)), before);
 }
 
-TEST(InventoryPaths, KeepNamesApart)
+TEST(InventoryPaths, AreUniqueWhateverTheNames)
 {
     const std::string device = "<object type=\"OSDev\" osdev_type=\"2\" name=";
     const Inventory inventory = readExport(machineWith(
@@ -429,7 +429,7 @@ TEST(InventoryNodes, HoldEveryKindOfValue)
     EXPECT_TRUE(alertsOf(inventory.nodes).empty());
 }
 
-TEST(InventoryNodes, KeepWhatIsNotWrittenAsExpectedAsText)
+TEST(InventoryNodes, KeepFactsThatCannotBeParsedAsText)
 {
     const Inventory inventory = readExport(
         machineWith(info("DMIBIOSDate", "yesterday") + info("DMIBIOSVersion", "1"),
@@ -448,7 +448,7 @@ TEST(InventoryNodes, KeepWhatIsNotWrittenAsExpectedAsText)
     expectSound(inventory);
 }
 
-TEST(InventoryNodes, ArePartsOfTheMachineOnlyWhereFactsTellOfThem)
+TEST(InventoryNodes, DescribeOnlyPartsOfTheMachineThatHaveFacts)
 {
     const Inventory inventory =
         readExport(machineWith(info("DMIBoardName", "  ") + info("DMIChassisVendor", "Vexilon")));
@@ -458,9 +458,9 @@ TEST(InventoryNodes, ArePartsOfTheMachineOnlyWhereFactsTellOfThem)
     EXPECT_EQ(counts.at("Chassis"), 1u);
 }
 
-TEST(InventoryAlerts, TellWhatTheSystemMayNotUse)
+TEST(InventoryAlerts, NameNodesThatTheSystemMayNotUse)
 {
-    // Threads 0 to 4 of 8: a package whole, a core of the other half, a core not at all.
+    // The system may use threads 0 to 4 of 8: the first package, one thread of the next core, nothing of the last.
     std::string xml = synthetic("pack:2 core:2 pu:2");
     replace(xml, "allowed_cpuset=\"0x000000ff\"", "allowed_cpuset=\"0x0000001f\"");
     const Inventory inventory = readExport(xml);
@@ -475,7 +475,7 @@ TEST(InventoryAlerts, TellWhatTheSystemMayNotUse)
               IC::PropertyValue(IC::Number(false)));
 }
 
-TEST(InventoryAlerts, TellOnceOfWhatLiesInsideAnother)
+TEST(InventoryAlerts, AreRaisedOnceForNestedNodes)
 {
     std::string xml = synthetic("pack:2 numa:1 core:2 pu:2");
     replace(xml, "allowed_cpuset=\"0x000000ff\"", "allowed_cpuset=\"0x0000000f\"");
@@ -490,7 +490,7 @@ TEST(InventoryAlerts, TellOnceOfWhatLiesInsideAnother)
     EXPECT_EQ(nodeAt(inventory, "/machine").getStatus(), STATUS_FINE);
 }
 
-TEST(InventoryAlerts, TellOfMemoryModulesOfUnknownSize)
+TEST(InventoryAlerts, AreRaisedForMemoryModulesOfUnknownSize)
 {
     for (const char* size : {"", "0", "Unknown", "-1"}) {
         SCOPED_TRACE(size);
@@ -528,7 +528,7 @@ TEST(InventoryExports, OfAnotherFormatAreRefused)
     EXPECT_THROW(readExport(machineWith("", "<object type=\"Turbine\"/>")), BadInput);
 }
 
-// hwloc has two parsers, one of them in a package of its own; they differ in what they take.
+// hwloc has two parsers, one of them in a separate package; they accept different bytes.
 TEST(InventoryExports, WithBytesThatAreNotUtf8AreRefusedOrSound)
 {
     try {
@@ -538,7 +538,7 @@ TEST(InventoryExports, WithBytesThatAreNotUtf8AreRefusedOrSound)
     }
 }
 
-// hwloc 2.9 does not survive a core without complete_cpuset.
+// A core without complete_cpuset crashes hwloc 2.9.
 TEST(InventoryExports, ThatCrashHwlocAreRefused)
 {
     std::string xml = synthetic("pack:1 core:2 pu:2");
@@ -612,7 +612,7 @@ protected:
                                             "arm64-20core-workstation"};
 };
 
-TEST_F(InventoryOfRealMachines, HasEveryNodeOfThem)
+TEST_F(InventoryOfRealMachines, HasEveryNode)
 {
     using Counts = std::map<std::string, unsigned int>;
     const std::map<std::string, Counts> expected {{names[0],
@@ -708,7 +708,7 @@ TEST_F(InventoryOfRealMachines, ReadsBackEveryProperty)
     }
 }
 
-TEST_F(InventoryOfRealMachines, HoldsTheirValuesAsTheyAre)
+TEST_F(InventoryOfRealMachines, KeepsTheirValuesUnchanged)
 {
     const Inventory machine = read("x86-2socket-dimms-nvme-infiniband");
     const IC::Node& module = nodeAt(machine, "/machine/dimm-DIMM_A1");
@@ -745,7 +745,7 @@ TEST_F(InventoryOfRealMachines, AreDescribedInUnderASecond)
 #ifdef NDEBUG
     EXPECT_LT(took.count(), 1.0);
 #else
-    EXPECT_LT(took.count(), 20.0);  // debug builds and sanitizers promise no time
+    EXPECT_LT(took.count(), 20.0);  // debug builds and sanitizers are slower
 #endif
 }
 
@@ -874,9 +874,9 @@ TEST_F(InventoryProgram, RefusesBadInputInOneLine)
         {{"--set", "/machine"}, "--set"},
         {{"--log=maybe", small}, "--log"},
         {{small, "--set", "/machine/cpu9", "4", "x"}, "no node has the path '/machine/cpu9'"},
-        {{small, "--set", "/machine/cpu0", "four", "x"}, "'four' is no property number"},
-        {{small, "--set", "/machine/cpu0", "-4", "x"}, "'-4' is no property number"},
-        {{small, "--set", "/machine/cpu0", "4294967296", "x"}, "'4294967296' is no property number"},
+        {{small, "--set", "/machine/cpu0", "four", "x"}, "'four' is not a property number"},
+        {{small, "--set", "/machine/cpu0", "-4", "x"}, "'-4' is not a property number"},
+        {{small, "--set", "/machine/cpu0", "4294967296", "x"}, "'4294967296' is not a property number"},
         {{small, "--set", "\x1b[2J\n", "4", "x"}, "no node has the path '\\x1b[2J\\x0a'"},
     };
     for (const auto& row : rows) {
@@ -890,16 +890,16 @@ TEST_F(InventoryProgram, RefusesBadInputInOneLine)
     }
 }
 
-TEST_F(InventoryProgram, TellsWhenItCannotWrite)
+TEST_F(InventoryProgram, ReportsThatItCannotWrite)
 {
     const Outcome outcome = runProgram({"sh", "-c", INVENTORY_PROGRAM " '" + small + "' >/dev/full"});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_EQ(outcome.err, "inventory: the output cannot be written\n");
 }
 
-TEST_F(InventoryProgram, DrivesNoTerminal)
+TEST_F(InventoryProgram, WritesNoControlCharacters)
 {
-    // The one parser of hwloc passes control characters that XML forbids, the other only those that it allows.
+    // One of hwloc's parsers accepts control characters that XML forbids, the other only those that XML allows.
     const struct {
         const char* libxml;
         const char* text;
@@ -922,7 +922,7 @@ TEST_F(InventoryProgram, DrivesNoTerminal)
     }
 }
 
-TEST_F(InventoryProgram, ShowsTraceRecordsWhenAsked)
+TEST_F(InventoryProgram, ShowsTraceRecordsOnRequest)
 {
     const std::vector<std::string> change {INVENTORY_PROGRAM, "--set", "/machine", "4", "x", small};
     std::vector<std::string> words {"env", "SPDLOG_LEVEL=trace"};
@@ -931,7 +931,7 @@ TEST_F(InventoryProgram, ShowsTraceRecordsWhenAsked)
     EXPECT_EQ(linesOf(runProgram(words).err).size(), 2u);
 }
 
-TEST_F(InventoryProgram, HelpsAndTellsItsVersion)
+TEST_F(InventoryProgram, PrintsItsHelpAndItsVersion)
 {
     const Outcome help = run({"--help"});
     EXPECT_EQ(help.status, 0);
@@ -944,7 +944,7 @@ TEST_F(InventoryProgram, HelpsAndTellsItsVersion)
 
 TEST_F(InventoryProgram, DescribesThisMachine)
 {
-    // hwloc has two ways to find PCI devices; the plugin "pci", which knows their names too, leaks memory.
+    // hwloc finds PCI devices in two ways; its plugin "pci" leaks memory.
     setenv("HWLOC_COMPONENTS", "-pci", 1);
     const Outcome outcome = run({"--properties"});
     EXPECT_EQ(outcome.status, 0);
