@@ -8,18 +8,6 @@
 
 namespace {
 
-// std::lock_guard for the platform's mutex.
-class Lock {
-public:
-    explicit Lock(ZQ::Mutex& mutex) : mutex_(mutex) { mutex_.lock(0xFFFFFFFF); }
-    ~Lock() { mutex_.unlock(); }
-    Lock(const Lock&) = delete;
-    Lock& operator=(const Lock&) = delete;
-
-private:
-    ZQ::Mutex& mutex_;
-};
-
 // Nothing if the value is no number; then the library has logged why.
 std::optional<double> numberIn(const IC::PropertyValue& value)
 {
