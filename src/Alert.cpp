@@ -32,7 +32,7 @@ Alert::Alert(unsigned char severity, unsigned char alertClass, std::vector<std::
 
 Alert& Alert::operator=(const Alert& source)
 {
-    // The copy may fail, and so may the first step of its move, the assignment of the time stamp.
+    // The copy may throw, and so may the first step of the move, the assignment of the time stamp.
     return *this = Alert(source);
 }
 

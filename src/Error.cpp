@@ -39,7 +39,7 @@ Error::Error(const std::string& message, unsigned char status)
 
 Error& Error::operator=(const Error& source)
 {
-    return *this = Error(source);  // the copy may fail, moving it cannot
+    return *this = Error(source);  // the copy may throw, the move cannot
 }
 
 void Error::refuse(unsigned char status)

@@ -19,7 +19,7 @@ namespace {
 
 constexpr detail::Source here("Node", IC_NODE::loggerNode);
 
-// The text of the exception for a sensor code, made when it is asked for.
+// The text of the exception for a sensor code, composed after the records are written.
 struct SensorRefusal {
     unsigned int sensor;
 
@@ -30,7 +30,7 @@ struct SensorRefusal {
     }
 };
 
-// What the outcome of an operation carries beside its status. Copying it costs less than making it anew.
+// The number of an outcome that has none. Copying it costs less than constructing it.
 [[gnu::init_priority(101)]] const Number nothing(Number::KIND_UNKNOWN);
 
 Error outcome(Error::StatusType status)

@@ -102,8 +102,8 @@ constexpr detail::Source here("Number", loggerNumber);
 constexpr ZQ::Uint8 largestKind = Number::KIND_NODEREF;
 constexpr ZQ::Uint32 noSensor = 74;
 
-// The real without its fraction; `real` is called again for each record. Refuses it unless it is from 0 to below
-// `limit`; a NaN passes.
+// The real without its fraction. Refuses a result below 0 or not below `limit`; a NaN passes. Each record calls `real`
+// again.
 template <class Real>
 double integralPart(const Real& real, double limit, const detail::Where& where, const char* literal,
                     const char* tooLarge, const char* negative)
@@ -361,7 +361,7 @@ sNodeRef Number::refuseNodeRef() const
 
 Number::operator std::string() const
 {
-    if (kind_ == KIND_UINT32 && detail::globalLocaleIsClassic())  // the commonest
+    if (kind_ == KIND_UINT32 && detail::globalLocaleIsClassic())  // the most frequent kind
         return detail::decimalText(load<ZQ::Uint32>());
     return detail::textOf(*this);
 }
@@ -502,7 +502,7 @@ void detail::Text::append(const Number& number)
     number.write(*this);
 }
 
-// Writes each run of 32-bit numbers, the commonest, at once.
+// Writes each run of 32-bit numbers, the most frequent kind, at once.
 void detail::Text::append(const std::vector<Number>& numbers)
 {
     const auto isUint32 = [](const Number& number) { return number.getKind() == Number::KIND_UINT32; };

@@ -59,7 +59,7 @@ bool isLess(const T& a, const T& b)
 {
     return a < b;
 }
-// Only the elements' < decides, asked both ways. In C++20 a vector's own < may ask <=> instead.
+// Uses only the elements' <. In C++20 a vector's own < prefers their <=>.
 template <class Element>
 bool isLess(const std::vector<Element>& a, const std::vector<Element>& b)
 {
@@ -144,7 +144,7 @@ PropertyValue::PropertyValue(const KindType& kind, const bool& readOnly) : readO
 template <class Visitor>
 decltype(auto) PropertyValue::visit(KindType kind, const Visitor& visitor)
 {
-    if (kind == KIND_STRING)  // the commonest; the header knows numbers
+    if (kind == KIND_STRING)  // the most frequent kind but numbers, which the header handles
         return visitor(Held<std::string>());
     switch (kind) {
     case KIND_NUMBER:
@@ -206,7 +206,7 @@ void PropertyValue::setKind(const unsigned char& kind)
     if (kind == getKind())
         return;
     if (kind > KIND_STRINGARRAY && value_ != nullptr) {
-        release();  // a refused code costs the old value; a valid one does so once the new value exists
+        release();  // a refused code discards the old value; a valid one replaces it below
         value_ = nullptr;
         kind_ = static_cast<KindType>(kind_ | without);
     }
@@ -370,7 +370,7 @@ std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, Proper
     return out << property.first << " = " << property.second;
 }
 
-// Joins what stands between two numbers, because an insertion costs more than joining.
+// Joins the text between two keys into one piece, because each insertion costs more than joining.
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties)
 {
     if (!properties.empty())

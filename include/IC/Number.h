@@ -185,7 +185,7 @@ private:
     inline void store(const T& content) noexcept;
     inline void storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept;
 
-    // What the conversions do for any kind but the commonest.
+    // What the conversions do for any kind but the most frequent.
     bool toBool() const;
     inline int toInt() const;
     ZQ::Uint32 toUint32(const char* function) const;

@@ -14,7 +14,7 @@
 
 namespace IC::detail {
 
-// The base is private, because what quotes the texts of a range would quote these, too.
+// The base is private, because a formatter of ranges quotes its elements if it finds the text formatter.
 template <class Value>
 class FmtText : fmt::formatter<fmt::string_view> {
     using Base = fmt::formatter<fmt::string_view>;
@@ -34,12 +34,12 @@ public:
 namespace fmt {
 
 ///@{
-/// For programs that format with the library {fmt}; no other header includes this one. Each class formats as its
-/// text, with what {fmt} offers for texts: fill, alignment, width and precision. It throws what the text throws.
+/// Formatters for the library {fmt}. Each class formats as its text, with the options of a text: fill, alignment, width
+/// and precision. Throws what the text conversion throws.
 ///
 ///     fmt::print("speed {:>6}\n", IC::Number(3600u));   // speed   3600
 ///
-/// Link {fmt} yourself. IC/format.h has the same for std::format.
+/// Optional: no other header includes this one. Link {fmt} yourself. IC/format.h is the same for std::format.
 template <>
 struct formatter<IC::Number> : IC::detail::FmtText<IC::Number> {
 };
@@ -57,7 +57,7 @@ struct formatter<IC::Alert> : IC::detail::FmtText<IC::Alert> {
 };
 ///@}
 
-/// Formats the text of a node, as its class writes it.
+/// Formats a node as the text that its class writes.
 template <class T>
 struct formatter<T, char, std::enable_if_t<std::is_base_of_v<IC::Node, T>>> : IC::detail::FmtText<IC::Node> {
 };

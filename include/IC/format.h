@@ -20,7 +20,7 @@
 
 namespace IC::detail {
 
-// The base is private, because what quotes the texts of a range would quote these, too.
+// The base is private, because a formatter of ranges quotes its elements if it finds the text formatter.
 template <class Value>
 class FormatText : std::formatter<std::string_view> {
     using Base = std::formatter<std::string_view>;
@@ -40,13 +40,13 @@ public:
 namespace std {
 
 ///@{
-/// For programs that format with std::format; no other header includes this one. Each class formats as its text, with
-/// what std::format offers for texts: fill, alignment, width and precision. It throws what the text throws.
+/// Formatters for std::format. Each class formats as its text, with the options of a text: fill, alignment, width and
+/// precision. Throws what the text conversion throws.
 ///
 ///     std::cout << std::format("speed {:>6}\n", IC::Number(3600u));   // speed   3600
 ///
-/// Where there is no `<format>`, including it is an error, so that nothing is missed in silence. Ask for
-/// __cpp_lib_format first, or take IC/fmt.h.
+/// Optional: no other header includes this one. Without `<format>` in the standard library, including it is an error:
+/// test __cpp_lib_format first, or use IC/fmt.h.
 template <>
 struct formatter<IC::Number> : IC::detail::FormatText<IC::Number> {
 };
@@ -64,7 +64,7 @@ struct formatter<IC::Alert> : IC::detail::FormatText<IC::Alert> {
 };
 ///@}
 
-/// Formats the text of a node, as its class writes it.
+/// Formats a node as the text that its class writes.
 template <std::derived_from<IC::Node> T>
 struct formatter<T> : IC::detail::FormatText<IC::Node> {
 };

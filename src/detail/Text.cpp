@@ -6,7 +6,7 @@
 
 namespace IC::detail {
 
-// A copy, because reaching the standard library's own costs a call.
+// A copy saves the call that returns the standard library's own.
 [[gnu::init_priority(101)]] static const std::locale classicLocale = std::locale::classic();
 
 bool globalLocaleIsClassic()
