@@ -59,7 +59,7 @@ bool isLess(const T& a, const T& b)
 {
     return a < b;
 }
-// Uses only the elements' <. In C++20 a vector's own < prefers their <=>.
+// Asks only the elements' <, both ways.
 template <class Element>
 bool isLess(const std::vector<Element>& a, const std::vector<Element>& b)
 {
