@@ -13,7 +13,7 @@ namespace IC {
 
 namespace {
 
-constexpr detail::Source here("Alert", loggerAlert);
+constexpr detail::Source here {"Alert", loggerAlert};
 
 }  // namespace
 

@@ -12,7 +12,7 @@ namespace IC {
 
 namespace {
 
-constexpr detail::Source here("EnumValue", loggerEnumvalue);
+constexpr detail::Source here {"EnumValue", loggerEnumvalue};
 
 }  // namespace
 

@@ -12,7 +12,7 @@ namespace IC {
 
 namespace {
 
-constexpr detail::Source here("Error", loggerError);
+constexpr detail::Source here {"Error", loggerError};
 
 }  // namespace
 

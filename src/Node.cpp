@@ -17,7 +17,7 @@ namespace IC {
 
 namespace {
 
-constexpr detail::Source here("Node", IC_NODE::loggerNode);
+constexpr detail::Source here {"Node", IC_NODE::loggerNode};
 
 // The text of the exception for a sensor code, composed after the records are written.
 struct SensorRefusal {

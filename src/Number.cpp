@@ -97,7 +97,7 @@ namespace IC {
 
 namespace {
 
-constexpr detail::Source here("Number", loggerNumber);
+constexpr detail::Source here {"Number", loggerNumber};
 
 constexpr ZQ::Uint8 largestKind = Number::KIND_NODEREF;
 constexpr ZQ::Uint32 noSensor = 74;

@@ -14,7 +14,7 @@ namespace IC {
 
 namespace {
 
-constexpr detail::Source here("Property", loggerProperty);
+constexpr detail::Source here {"Property", loggerProperty};
 
 // The kind, read again for each record.
 auto kindOf(const PropertyValue& value)

@@ -12,8 +12,7 @@ namespace IC::detail {
 
 // The two digits of each number below base * base.
 template <std::size_t base>
-constexpr std::array<char, 2 * base * base> digitPairs()
-{
+inline constexpr auto digitPairs = [] {
     constexpr char digits[] = "0123456789abcdef";
     std::array<char, 2 * base * base> pairs {};
     for (std::size_t number = 0; number < base * base; ++number) {
@@ -21,19 +20,17 @@ constexpr std::array<char, 2 * base * base> digitPairs()
         pairs[2 * number + 1] = digits[number % base];
     }
     return pairs;
-}
-inline constexpr auto decimalPairs = digitPairs<10>();
-inline constexpr auto hexPairs = digitPairs<16>();
+}();
 
 inline char* writeHex(char* out, unsigned char byte)
 {
-    std::memcpy(out, hexPairs.data() + 2 * std::size_t {byte}, 2);
+    std::memcpy(out, digitPairs<16>.data() + 2 * std::size_t {byte}, 2);
     return out + 2;
 }
 
 inline char* writeTwoDigits(char* out, std::uint32_t number)
 {
-    std::memcpy(out, decimalPairs.data() + 2 * std::size_t {number}, 2);
+    std::memcpy(out, digitPairs<10>.data() + 2 * std::size_t {number}, 2);
     return out + 2;
 }
 

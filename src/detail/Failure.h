@@ -23,18 +23,14 @@ struct Where {
 };
 
 // A source file, as its records name it. Called with a function's name, it gives the place of the call.
-class Source {
-public:
-    constexpr Source(const char* file, const std::string& category) : file_(file), category_(category) { }
+struct Source {
+    const char* file;
+    const std::string& category;
 
     Where operator()(const char* function, int line = __builtin_LINE()) const
     {
-        return {function, file_, line, category_};
+        return {function, file, line, category};
     }
-
-private:
-    const char* file_;
-    const std::string& category_;
 };
 
 // Codes print as numbers, also those of one byte. A function prints the value that it returns.
