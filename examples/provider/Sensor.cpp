@@ -6,49 +6,40 @@
 
 #include "IC/ICException.h"
 
-namespace {
-
-// Nothing if the value is no number; then the library has logged why.
-std::optional<double> numberIn(const IC::PropertyValue& value)
+Sensor::Sensor(const std::string& name, const std::string& label) : Node(SENSOR_TEMPERATURE_SENSOR)
 {
-    try {
-        const double number = IC::Number(value);
-        return number;
-    } catch (const IC::PropertyValueInvalidKind&) {  // no std::exception: catch it by its own name
-    } catch (const std::out_of_range&) {             // a number that is not a real one, such as a date-time
-    }
-    return std::nullopt;
-}
-
-}  // namespace
-
-Sensor::Sensor(const SensorKind& kind, const std::string& parentPath, const std::string& name,
-               const std::string& label, const AlertHandler& onAlert)
-    : Node(kind.type),
-      kind_(kind),
-      onAlert_(onAlert)
-{
-    path = parentPath + '/' + name;
-    parent = parentPath;
+    path = "/chassis/" + name;
+    parent = "/chassis";
     description = label;
-    properties.insert({LABEL, IC::PropertyValue(label, true)});
+    properties.insert({LABEL, IC::PropertyValue(label, true)});  // true: read-only
     properties.insert({READING, IC::PropertyValue(IC::Number(IC::Number::KIND_NAN), true)});
-    properties.insert({LIMIT, IC::PropertyValue(IC::Number(IC::Number::KIND_NAN))});
+    properties.insert({LIMIT, IC::PropertyValue(IC::Number(70.0))});
 }
 
-void Sensor::update(std::optional<double> reading)
+std::optional<IC::Alert> Sensor::update(const IC::Number& reading)
 {
-    // Assignment replaces the read-only mark too, so the new value needs one.
-    IC::PropertyValue value(reading ? IC::Number(*reading) : IC::Number(IC::Number::KIND_NAN), true);
+    const double degrees = reading;          // KIND_NAN converts to a NaN
+    IC::PropertyValue value(reading, true);  // assignment replaces the read-only mark too
     std::optional<IC::Alert> alert;
-    {
-        const Lock lock(mutex);
-        const StatusType next = judge(value, properties.at(LIMIT), alert);  // may throw, so it comes first
-        properties.at(READING) = std::move(value);
-        status = next;
+
+    const Lock lock(mutex);
+    const double limit = properties.at(LIMIT);
+    StatusType next = NORMAL;
+    if (std::isnan(degrees))
+        next = UNREADABLE;
+    else if (degrees > limit)
+        next = ABOVE_LIMIT;
+    if (next == ABOVE_LIMIT && status != ABOVE_LIMIT) {
+        constexpr unsigned char critical = 3;
+        constexpr unsigned char environment = 2;
+        alert = IC::Alert(critical, environment, {path}, next,
+                          description + ": " + std::string(reading) + " is above the limit of "
+                              + std::string(IC::Number(limit)));
     }
-    if (alert)
-        onAlert_(*alert);
+    // All that may throw comes before these two lines: reading and status change together or not at all.
+    properties.at(READING) = std::move(value);
+    status = next;
+    return alert;
 }
 
 IC::Error Sensor::setProperty(const unsigned int& key, const IC::PropertyValue& value)
@@ -56,46 +47,17 @@ IC::Error Sensor::setProperty(const unsigned int& key, const IC::PropertyValue& 
     if (key != LIMIT)
         return Node::setProperty(key, value);
 
-    const std::optional<double> limit = numberIn(value);
-    if (!limit)
+    double limit = 0;
+    try {
+        limit = IC::Number(value);
+    } catch (const IC::PropertyValueInvalidKind&) {  // no std::exception: catch it by its own name
         return {"the limit must be a number", INVALID_LIMIT};
-    if (!(*limit >= kind_.lowestLimit && *limit <= kind_.highestLimit))  // refuses NaN too
-        return {INVALID_LIMIT, IC::Number(*limit), "the limit is out of range"};
+    } catch (const std::out_of_range&) {  // a number of a kind that gives no real, such as a date-time
+        return {"the limit must be a real number", INVALID_LIMIT};
+    }
+    if (!(limit >= -100 && limit <= 300))  // refuses NaN too
+        return {INVALID_LIMIT, IC::Number(limit), "the limit is out of range"};
 
-    std::optional<IC::Alert> alert;
-    IC::Error outcome = setLimit(*limit, alert);
-    if (alert)
-        onAlert_(*alert);
-    return outcome;
-}
-
-// Holds the lock until the status fits the limit. Node::setProperty takes the lock again, which is re-entrant.
-IC::Error Sensor::setLimit(double limit, std::optional<IC::Alert>& alert)
-{
-    const Lock lock(mutex);
-    const StatusType next = judge(properties.at(READING), limit, alert);
-    // Passes on a new value, because the caller's may be read-only or of another kind of number.
-    IC::Error outcome = Node::setProperty(LIMIT, IC::PropertyValue(IC::Number(limit)));
-    status = next;
-    return outcome;
-}
-
-// Gives the status that follows from reading and limit, and an alert if that is a new status. NaN means none. The
-// caller holds the lock.
-Sensor::StatusType Sensor::judge(double reading, double limit, std::optional<IC::Alert>& alert) const
-{
-    const bool isBeyond = kind_.limitIsMinimum ? reading < limit : reading > limit;
-    const StatusType next = std::isnan(reading) ? UNREADABLE : isBeyond ? BEYOND_LIMIT : NORMAL;
-    if (next == status)
-        return next;
-    const std::string value = IC::Number(reading);
-    const char* const comparison =
-        kind_.limitIsMinimum ? " is below the limit of " : " is above the limit of ";
-    const std::string message = next == UNREADABLE ? "cannot be read"
-        : next == NORMAL                           ? value + " is normal"
-                                                   : value + comparison + std::string(IC::Number(limit));
-    const unsigned char severity = next == NORMAL ? 0 : next == UNREADABLE ? 2 : 3;
-    constexpr unsigned char environment = 2;
-    alert.emplace(severity, environment, std::vector<std::string> {path}, next, description + ": " + message);
-    return next;
+    // Passes on a new value: the caller's may be marked read-only, which would refuse every later limit.
+    return Node::setProperty(LIMIT, IC::PropertyValue(IC::Number(limit)));
 }
