@@ -1,11 +1,10 @@
 #!/bin/sh
-# Fails unless the libraries are hardened: hardening.sh SOURCE-FOLDER COMPILE-COMMANDS [SHARED-LIBRARY]...
+# Fails unless the libraries are hardened: hardening.sh COMPILE-COMMANDS [SHARED-LIBRARY]...
 #
-# What leaves a trace in a shared library is read from it; what leaves none, from the commands that compiled its sources.
+# Most options leave a trace in a shared library; the others are read from the commands that compiled its sources.
 set -eu
-source=$1
-commands=$2
-shift 2
+commands=$1
+shift
 status=0
 complain() {
     echo "$1" >&2
@@ -13,29 +12,23 @@ complain() {
 }
 
 [ -f "$commands" ] || { echo "no file $commands" >&2; exit 1; }
-compiled=$(python3 - "$source" "$commands" <<'END'
-import json
-import pathlib
-import sys
-
-source = pathlib.Path(sys.argv[1]).resolve()
-libraries = [source / "src", source / "platform" / "ZQ" / "src", source / "platform" / "VXLog" / "src"]
-for entry in json.loads(pathlib.Path(sys.argv[2]).read_text(encoding="utf-8")):
-    file = pathlib.Path(entry["file"]).resolve()
-    if "ICTesting" not in entry["command"] and any(library in file.parents for library in libraries):
-        print(entry["command"])
-END
-)
-[ -n "$compiled" ] || { echo "no source of a library in $commands" >&2; exit 1; }
+compiled=
+for target in IC ic_zq ic_vxlog; do  # an object lies in a folder of its target's name, wherever the checkout is
+    of_target=$(grep -E "\"command\": .* -o ([^ ]*/)?CMakeFiles/$target\.dir/" "$commands") ||
+        { echo "$commands has no source of $target" >&2; exit 1; }
+    compiled="$compiled$of_target
+"
+done
+compiled=${compiled%?}
 without() {
-    echo "$compiled" | grep -v -e "$1" | sed 's/.* -c /  /' || true
+    printf '%s\n' "$compiled" | grep -v -e "$1" | sed 's/.* -c /  /' || true
 }
 for option in -fstack-protector-strong -fstack-clash-protection; do
     lacking=$(without "$option")
     [ -z "$lacking" ] || complain "compiled without $option: $lacking"
 done
 lacking=$(without '-D_FORTIFY_SOURCE=2' | grep . || true)
-if echo "$compiled" | grep -q -e ' -O[23s]'; then
+if printf '%s\n' "$compiled" | grep -q -e ' -O[23s]'; then
     [ -z "$lacking" ] || complain "optimised without _FORTIFY_SOURCE: $lacking"
 fi
 
