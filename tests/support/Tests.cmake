@@ -4,17 +4,20 @@ list(JOIN CMAKE_CROSSCOMPILING_EMULATOR " " emulator)
 
 # Tests compile faster without optimisation, and compiling takes longer than running them. The code under test keeps
 # the options of the preset.
+if(CMAKE_CXX_FLAGS MATCHES "-fsanitize")
+    set(quick_options -O0)
+else()
+    set(quick_options $<$<CONFIG:Release>:-O1>)
+endif()
 macro(ic_compile_quickly)
-    if(CMAKE_CXX_FLAGS MATCHES "-fsanitize")
-        add_compile_options(-O0)
-    else()
-        add_compile_options($<$<CONFIG:Release>:-O1>)
-    endif()
+    add_compile_options(${quick_options})
 endmacro()
 
-# Precompiles GoogleTest's headers for all tests. The preset `clang` turns this off, so each test includes all it uses.
+# Precompiles GoogleTest's headers for all tests, with their options: compilers refuse a header compiled with others.
+# The preset `clang` turns this off, so that each test must include all it uses.
 add_executable(test_headers ${CMAKE_CURRENT_LIST_DIR}/GoogleTest.cpp)  # an executable, because its users are
 ic_target_settings(test_headers)
+target_compile_options(test_headers PRIVATE ${quick_options})
 target_link_libraries(test_headers PRIVATE GTest::gmock)
 target_precompile_headers(test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
 
