@@ -1,10 +1,9 @@
-# IC::ZQ and IC::VXLog: the agent's own libraries below IC_PLATFORM_DIR. Used by the build and by the
-# installed package.
+# IC::ZQ and IC::VXLog: the agent's own libraries below IC_PLATFORM_DIR. The build and the installed package use it.
 foreach(name ZQ VXLog)
     if(TARGET IC::${name})
         continue()
     endif()
-    # The folder is named in full, also where a toolchain file has libraries looked for in another system's root.
+    # IC_PLATFORM_DIR is not below the root in which a toolchain file has libraries looked for.
     find_library(IC_PLATFORM_${name} ${name} PATHS ${IC_PLATFORM_DIR}/lib
                  NO_DEFAULT_PATH NO_CMAKE_FIND_ROOT_PATH NO_CACHE)
     if(NOT IC_PLATFORM_${name} OR NOT IS_DIRECTORY ${IC_PLATFORM_DIR}/include/${name})

@@ -1,5 +1,5 @@
 # A machine for which Debian has a cross compiler, with its libraries in /usr/TRIPLET. The file that includes this one
-# has set CMAKE_SYSTEM_PROCESSOR, `triplet` and, unless the programs run here as they are, `emulator`.
+# sets CMAKE_SYSTEM_PROCESSOR, `triplet` and, unless this machine runs the programs directly, `emulator`.
 set(CMAKE_SYSTEM_NAME Linux)
 set(CMAKE_C_COMPILER ${triplet}-gcc)
 set(CMAKE_CXX_COMPILER ${triplet}-g++)
@@ -7,16 +7,16 @@ if(emulator)
     set(CMAKE_CROSSCOMPILING_EMULATOR ${emulator} -L /usr/${triplet})
 endif()
 
-# Programs are those of this machine, libraries and headers those of the other; packages may lie anywhere.
+# Programs of this machine, libraries and headers of the other, packages of either.
 set(CMAKE_FIND_ROOT_PATH /usr/${triplet})
 set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
 
-# What is left out for these machines: tools, and tests by the names that CTest lists.
+# Tools and tests that are not built or run for these machines.
 set(IC_LEFT_OUT
-    inventory     # the libraries that it reads this machine with, and umockdev, are installed for this machine alone
-    link_orders)  # links and starts programs by itself; an order of objects is the same for the linker everywhere
-if(emulator)  # it grants its programs memory beyond any limit that they set themselves
+    inventory     # hwloc, libsensors and umockdev are installed for this machine alone
+    link_orders)  # the linker treats the order of objects alike on every machine
+if(emulator)  # it ignores the memory limits that a program sets itself
     list(APPEND IC_LEFT_OUT MemoryLimit.KeepsTheOldValueWhenMemoryRunsOut)
 endif()

@@ -1,5 +1,5 @@
-# A 32-bit PC without SSE. An x86-64 kernel runs its programs as they are; they name the loader and the libraries that
-# come with the cross compiler.
+# A 32-bit PC without SSE. An x86-64 kernel runs its programs directly; they need the loader and the libraries of the
+# cross compiler.
 set(CMAKE_SYSTEM_PROCESSOR i686)
 set(triplet i686-linux-gnu)
 include(${CMAKE_CURRENT_LIST_DIR}/debian.cmake)

@@ -1,7 +1,7 @@
 """The recipe for Conan 2: `conan create packaging/conan` in the root of the tree.
 
-Checked: that it is valid Python, and that its version, options and files are those of the tree (tests/package/recipes.py).
-Not checked: that Conan builds a package with it; Conan is not among the packages that the tests are run with.
+tests/package/recipes.py checks that it is valid Python and that its version, description, options and files are those of
+the tree. No test builds the package: Conan is not a Debian package.
 """
 
 import os
@@ -15,14 +15,14 @@ from conan.tools.files import copy, rmdir
 class ICRecipe(ConanFile):
     name = "ic"
     version = "1.0.0"
-    description = "Value types with which a hardware-management agent describes its machine"
+    description = "C++17 library that models a machine as nodes with typed, numbered properties"
     package_type = "library"
     settings = "os", "arch", "compiler", "build_type"
     options = {"shared": [True, False], "platform_dir": ["", "ANY"]}
     default_options = {"shared": True, "platform_dir": ""}
 
     def export_sources(self):
-        # What the library is built of.
+        # The library without its tests, examples and benchmarks.
         root = os.path.join(self.recipe_folder, os.pardir, os.pardir)
         copy(self, "CMakeLists.txt", root, self.export_sources_folder)
         for folder in ("cmake", "include", "platform", "src", "testkit", "tools"):
@@ -54,7 +54,7 @@ class ICRecipe(ConanFile):
         rmdir(self, os.path.join(self.package_folder, "lib", "pkgconfig"))  # Conan writes its own
 
     def package_info(self):
-        # The library's own CMake package is used: it knows its platform.
+        # Users find the library's own CMake package, which also finds its platform.
         self.cpp_info.set_property("cmake_find_mode", "none")
         self.cpp_info.builddirs = [os.path.join("lib", "cmake", "IC")]
         self.cpp_info.set_property("pkg_config_name", "IC")

@@ -1,7 +1,7 @@
-# A port to be used in place, in the root of the tree: vcpkg install ic --overlay-ports=packaging/vcpkg
+# The port, for use in the root of the tree: vcpkg install ic --overlay-ports=packaging/vcpkg
 #
-# Checked: that the files and options named here are there (tests/package/recipes.py). Not checked: that vcpkg builds it; vcpkg
-# is not among the packages that the tests are run with.
+# tests/package/recipes.py checks that the files and options named here exist. No test builds the port: vcpkg is not a
+# Debian package.
 get_filename_component(SOURCE_PATH "${CMAKE_CURRENT_LIST_DIR}/../.." ABSOLUTE)
 
 vcpkg_cmake_configure(
@@ -15,5 +15,5 @@ vcpkg_cmake_config_fixup(PACKAGE_NAME IC CONFIG_PATH lib/cmake/IC)
 vcpkg_fixup_pkgconfig()
 
 file(REMOVE_RECURSE "${CURRENT_PACKAGES_DIR}/debug/include" "${CURRENT_PACKAGES_DIR}/debug/share")
-# The tree names no licence; the README is what it has to say.
+# The tree has no licence file; vcpkg requires a file.
 vcpkg_install_copyright(FILE_LIST "${SOURCE_PATH}/README.md")

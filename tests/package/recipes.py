@@ -1,8 +1,8 @@
 #!/usr/bin/python3
-"""Checks of the recipes for Conan and vcpkg what can be checked without the two: recipes.py ROOT-OF-THE-TREE
+"""Checks the recipes for Conan and vcpkg without running either: recipes.py ROOT-OF-THE-TREE
 
 They must be valid Python and JSON, have the version and the description of the tree, and name only files and options
-that it has.
+that exist.
 """
 
 import ast
@@ -37,7 +37,7 @@ def expect_options(recipe, text):
     named = set(re.findall(r"(?:\b|-D)(IC_\w+)", text))
     expect(named, f"{recipe} names no option")
     for option in sorted(named - options):
-        faults.append(f"{recipe} names the option {option}, which there is none of")
+        faults.append(f"{recipe} names the option {option}, which does not exist")
 
 
 # Conan
@@ -54,14 +54,14 @@ fields = {
     for node in recipe.body
     if isinstance(node, ast.Assign) and isinstance(node.value, ast.Constant)
 }
-expect(fields.get("version") == version, f"conanfile.py is of the version {fields.get('version')}, not {version}")
+expect(fields.get("version") == version, f"conanfile.py has the version {fields.get('version')}, not {version}")
 expect(fields.get("description") == description, "conanfile.py has another description than CMakeLists.txt")
 expect_options("conanfile.py", text)
 folders = re.search(r"for folder in \(([^)]*)\)", text)
 expect(folders is not None, "conanfile.py exports no folder")
 for folder in re.findall(r'"(\w+)"', folders.group(1) if folders else ""):
-    expect(os.path.isdir(os.path.join(root, folder)), f"conanfile.py exports {folder}/, which there is none of")
-# What is taken in, and what is installed, where neither tests nor examples are built.
+    expect(os.path.isdir(os.path.join(root, folder)), f"conanfile.py exports {folder}/, which does not exist")
+# The folders that a build without tests, examples and benchmarks reads.
 named = re.findall(r"(?:add_subdirectory\(|_SOURCE_DIR\}/|include\()(\w+)", cmake + read("cmake", "CMakeLists.txt"))
 for part in sorted(set(named) - {"tests", "examples", "benchmarks"}):
     if os.path.isdir(os.path.join(root, part)):
@@ -72,12 +72,12 @@ try:
     port = json.loads(read("packaging", "vcpkg", "vcpkg.json"))
 except json.JSONDecodeError as error:
     sys.exit(f"vcpkg.json is not valid: {error}")
-expect(port.get("version") == version, f"vcpkg.json is of the version {port.get('version')}, not {version}")
+expect(port.get("version") == version, f"vcpkg.json has the version {port.get('version')}, not {version}")
 expect(port.get("description") == description, "vcpkg.json has another description than CMakeLists.txt")
 portfile = read("packaging", "vcpkg", "portfile.cmake")
 expect_options("portfile.cmake", portfile)
 for file in re.findall(r"\$\{SOURCE_PATH\}/([\w./]+)", portfile):
-    expect(os.path.exists(os.path.join(root, file)), f"portfile.cmake names {file}, which there is none of")
+    expect(os.path.exists(os.path.join(root, file)), f"portfile.cmake names {file}, which does not exist")
 
 for fault in faults:
     print(fault, file=sys.stderr)
