@@ -1,7 +1,7 @@
 """The recipe for Conan 2: `conan create packaging/conan` in the root of the tree.
 
-tests/package/recipes.py checks that it is valid Python and that its version, description, options and files are those of
-the tree. No test builds the package: Conan is not a Debian package.
+tests/package/recipes.py checks that it is valid Python and that its version, description, options and files are those
+of the tree. No test builds the package: Conan is not a Debian package.
 """
 
 import os

@@ -1,8 +1,8 @@
 #!/bin/sh
-# The exported interface of a library, as libabigail reads it from the library and its debug information.
+# Describes the exported interface of a library, which libabigail reads from the library and its debug information.
 #
 #   abi.sh describe LIBRARY DESCRIPTION INCLUDE-FOLDER...    writes the description
-#   abi.sh compare LIBRARY DESCRIPTION INCLUDE-FOLDER...     fails unless the library is as described
+#   abi.sh compare LIBRARY DESCRIPTION INCLUDE-FOLDER...     fails unless the library matches the description
 set -eu
 command=$1
 library=$2
@@ -17,7 +17,7 @@ if [ "$command" = compare ]; then
     trap 'rm -f "$described"' EXIT
 fi
 
-# Only what a program sees: types of the public headers, no paths, no lines, no names of parameters.
+# Programs depend on the types of the public headers alone, not on paths, lines and names of parameters.
 for folder; do
     set -- "$@" --headers-dir "$folder"
     shift
@@ -26,7 +26,7 @@ abidw "$@" --drop-private-types --exported-interfaces-only --drop-undefined-syms
     --no-comp-dir-path --no-show-locs --no-elf-needed --type-id-style hash --out-file "$described" "$library"
 [ "$command" = compare ] || exit 0
 
-# Additions count: nothing is exported by chance.
+# An addition is a difference, too: an export is a promise.
 abidiff --no-default-suppression --harmless "$description" "$described" || {
     echo "$(basename "$library") exports another interface than $description; docs/compatibility.md says what to do" >&2
     exit 1

@@ -8,13 +8,12 @@ include=$2
 exported=$(nm --dynamic --defined-only --demangle --format=posix "$library" | sed 's/ [A-Za-z] [0-9a-f]* *[0-9a-f]*$//')
 status=0
 
-# What must not be there: other namespaces, also behind a type of this one that a template returns, and the library's
-# own inside.
+# Other namespaces, which may also follow the return type of a template, and internals of the library must be absent.
 foreign=$(echo "$exported" |
     grep -vE '^IC::(([A-Za-z0-9]+::)*operator|(~?[A-Za-z0-9]+(::|\[abi:cxx11\])?)+(\(|$))' |
     grep -vE '^(typeinfo|typeinfo name|vtable) for IC::[A-Za-z0-9]+$' || true)
 inside=$(echo "$exported" | grep -E 'IC::detail|logger' || true)
-# And what no header declares, though it is in the namespace. The operators' names are those of types.
+# So must names in the namespace that no header declares. Operators are not searched: their names are those of types.
 names=$(echo "$exported" | sed 's/\[abi:cxx11\]//g; s/(.*//; s/^.* for //' | grep -E '^IC::[A-Za-z0-9:~]*$' |
     grep -v operator | sed 's/.*::~*//' | sort -u)
 [ -n "$names" ] || { echo "$library exports nothing" >&2; exit 1; }
@@ -26,9 +25,10 @@ if [ -n "$foreign$inside" ]; then
     status=1
 fi
 
-# What must be there, once for each kind of name.
+# One example of each kind of name must be present.
 for name in 'IC::pst' 'IC::pB' 'IC::Number::setKind' 'IC::EnumValue::operator std::' 'IC::PropertyValue::setKind' \
-    'IC::Error::Error' 'IC::Alert::hexstring' 'IC::Node::Node' 'IC::operator<<' 'IC::operator==(IC::Number' 'IC::operator<(IC::PropertyValue' \
+    'IC::Error::Error' 'IC::Alert::hexstring' 'IC::Node::Node' 'IC::operator<<' 'IC::operator==(IC::Number' \
+    'IC::operator<(IC::PropertyValue' \
     'typeinfo name for IC::ICException' 'typeinfo for IC::ICException' 'typeinfo for IC::PropertyValueInvalidKind' \
     'typeinfo for IC::NodeInvalidSensor' 'typeinfo for IC::Node' 'vtable for IC::Node'; do
     if ! echo "$exported" | grep -qF "$name"; then

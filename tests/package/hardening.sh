@@ -38,16 +38,16 @@ for library; do
     segments=$(readelf --program-headers --wide "$library")
     symbols=$(readelf --dyn-syms --wide "$library")
 
-    echo "$segments" | grep -q GNU_RELRO || complain "$library: no relocation is made read-only (-z relro)"
-    echo "$dynamic" | grep -q 'FLAGS_1.* NOW' || complain "$library: symbols are bound lazily (-z now)"
-    echo "$segments" | grep -q 'GNU_STACK.* RW ' || complain "$library: the stack is executable (-z noexecstack)"
+    echo "$segments" | grep -q GNU_RELRO || complain "$library: relocations stay writable (no -z relro)"
+    echo "$dynamic" | grep -q 'FLAGS_1.* NOW' || complain "$library: symbols are bound lazily (no -z now)"
+    echo "$segments" | grep -q 'GNU_STACK.* RW ' || complain "$library: the stack is executable (no -z noexecstack)"
     echo "$symbols" | grep -q __stack_chk_fail || complain "$library: the stack is not protected"
 
-    # A sanitizer puts its own code before a function, and its run-time library is linked to the program alone.
+    # A sanitizer's code stands before a function's, and its run-time library is linked to the program alone.
     ! echo "$symbols" | grep -qE '__(asan|tsan|ubsan)_' || continue
 
     undefined=$(ldd -r "$library" 2>&1 | grep 'undefined symbol' || true)
-    [ -z "$undefined" ] || complain "$library: not linked with all that it needs (-z defs): $undefined"
+    [ -z "$undefined" ] || complain "$library: symbols are undefined (no -z defs): $undefined"
 
     [ "$(uname -m)" = x86_64 ] || continue
     functions=$(echo "$symbols" | awk '$4 == "FUNC" && $7 != "UND" { sub(/^0+/, "", $2); print $2 }' | sort -u)
@@ -55,6 +55,6 @@ for library; do
         awk '$2 == "endbr64" { sub(":", "", $1); print $1 }' | sort -u)
     [ -n "$functions" ] || complain "$library: exports no function"
     open=$(printf '%s\n' "$landings" "$landings" "$functions" | sort | uniq -u)
-    [ -z "$open" ] || complain "$library: functions without -fcf-protection at: $open"
+    [ -z "$open" ] || complain "$library: functions without a landing pad (-fcf-protection) at: $open"
 done
 exit $status

@@ -1,8 +1,8 @@
 # Builds and runs the example of a provider's test against the installed library, and expects CMake to refuse a program
 # that is linked with the library twice.
 #
-#   BUILD, EXAMPLE, WORK    the build of the library, the example, a folder of its own
-#   GENERATOR, SETTINGS     what to build with, and the file of cache variables to configure with
+#   BUILD, EXAMPLE, WORK    the build of the library, the example, a folder that is emptied
+#   GENERATOR, SETTINGS     CMake's generator, and the file of cache variables for each project
 file(REMOVE_RECURSE ${WORK})
 set(configure ${CMAKE_COMMAND} -G ${GENERATOR} -C ${SETTINGS} -DCMAKE_PREFIX_PATH=${WORK}/prefix)
 

@@ -1,7 +1,7 @@
 #include "IC/ICException.h"
 #include "IC/Node.h"
 
-// Catches one exception of the library by its type and lets the next one through.
+// Catches an exception of the library by its type, and does not catch the next one.
 extern "C" [[gnu::visibility("default")]] int caughtAndThrown()
 {
     int caught = 0;

@@ -1,14 +1,14 @@
-# Builds and runs the consumer against an installed package, and compares what it prints.
+# Installs the library, builds the consumer against it, runs it and compares what it prints.
 #
-#   BUILD          the build of the library that is installed (with its configuration, CONFIG)
+#   BUILD          the build of the library that is installed
 #   WORK           a folder of its own, emptied first
-#   TIME           how the platform prints the date-time of the consumer
-#   PLATFORM       set: the library is built anew on the platform project in this folder first
+#   TIME           the consumer's date-time as the platform prints it
+#   PLATFORM       set: the project in this folder is the platform; the library is first built on it
 #   SOURCE         the source of the library, for PLATFORM
-#   SHARED         whether the library is shared: then the plug-in is tried too
+#   SHARED         whether the library is shared; if so, the plug-in is tried, too
 #   GENERATOR      what to build every project with
 #   SETTINGS       the file of cache variables to configure every project with
-#   EMULATOR       what runs a program of another machine; empty for this one
+#   EMULATOR       the command that runs a program of another machine; empty for this one
 file(REMOVE_RECURSE ${WORK})
 set(prefix ${WORK}/moved)
 set(configure ${CMAKE_COMMAND} -G ${GENERATOR} -C ${SETTINGS})
@@ -32,7 +32,7 @@ if(PLATFORM)
 endif()
 
 run(${CMAKE_COMMAND} --install ${BUILD} --prefix ${WORK}/installed)
-file(RENAME ${WORK}/installed ${prefix})  # what is installed may be moved
+file(RENAME ${WORK}/installed ${prefix})  # the installation is relocatable
 file(GLOB_RECURSE stand_ins ${prefix}/*ZQ* ${prefix}/*VXLog* ${prefix}/ZQ/* ${prefix}/VXLog/*)
 if(PLATFORM AND stand_ins)
     message(FATAL_ERROR "Stand-ins were installed beside the agent's own platform: ${stand_ins}")
@@ -46,7 +46,7 @@ if(PLATFORM)
     set(missing -I${WORK}/platform/include -L${WORK}/platform/lib -lIC -lZQ)
     list(REMOVE_ITEM missing ${flags})
     if(missing)
-        message(FATAL_ERROR "The pkg-config module does not say ${missing}, but ${flags}")
+        message(FATAL_ERROR "The pkg-config module lacks ${missing}; it has ${flags}")
     endif()
 endif()
 

@@ -107,7 +107,7 @@ subproject() {
     quietly cmake --build "$work/build"
     check "$work/build/program"
     [ "$(ctest --test-dir "$work/build" --show-only | tail -n 1)" = 'Total Tests: 1' ] ||
-        fail "the library brings tests of its own"
+        fail "the library adds tests"
     quietly cmake --install "$work/build" --prefix "$work/$library"
     [ "$(cd "$work/$library" && find . ! -type d)" = ./bin/program ] ||
         fail "$work/$library has more than the project's own program"

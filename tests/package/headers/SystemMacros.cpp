@@ -1,4 +1,4 @@
-// Systems define these, as functions or as names; the header leaves them as they were.
+// Systems define these macros; the header must work with them and leave them defined.
 #define major(device) static_cast<int>((device) >> 8)
 #define minor 17
 

@@ -9,7 +9,7 @@
 
 #include "../Texts.h"
 
-// GoogleTest is built for another standard library than the one that has <format>.
+// Without GoogleTest, which is built with a standard library that lacks <format>.
 
 namespace {
 
