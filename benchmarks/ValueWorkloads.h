@@ -67,7 +67,7 @@ public:
         out_.seekp(0);
         return out_;
     }
-    bool empty() { return out_.str().empty(); }
+    bool isEmpty() { return out_.str().empty(); }
 
 private:
     std::ostringstream out_;
@@ -223,7 +223,7 @@ void timeStream(benchmark::State& state)
     const auto sources = values<Contender, S>();
     Target target;
     Contender::stream(target.fromTheStart(), sources.front());
-    if (target.empty())
+    if (target.isEmpty())
         state.SkipWithError("nothing was written");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize)) {
@@ -280,7 +280,7 @@ void timeMapPrint(benchmark::State& state)
     beforeTiming();
     for (auto _ : state)
         Contender::streamMap(target.fromTheStart(), map);
-    if (target.empty())
+    if (target.isEmpty())
         state.SkipWithError("nothing was written");
 }
 

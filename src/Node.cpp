@@ -3,7 +3,6 @@
 #include <ostream>
 #include <utility>
 
-#include "IC/ICException.h"
 #include "detail/Failure.h"
 #include "detail/Text.h"
 
@@ -31,7 +30,7 @@ struct SensorRefusal {
 };
 
 // The number of an outcome that has none. Copying it costs less than constructing it.
-[[gnu::init_priority(101)]] const Number nothing(Number::KIND_UNKNOWN);
+[[gnu::init_priority(101)]] const Number nothing {Number::KIND_UNKNOWN};
 
 Error outcome(Error::StatusType status)
 {

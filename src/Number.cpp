@@ -174,8 +174,8 @@ void addDateTime(detail::Text& text, const DateTimeFields& content)
     // Only the last digit of the milliseconds counts (deliberate): the agent's logs rely on it.
     const unsigned int remainder = content.milliseconds % 10u;
     if (remainder != 0)
-        record(here("operator std::string"), detail::failureLevel,
-               "string: conversion failed, remainder not zero, remainder=", remainder);
+        detail::record(here("operator std::string"), detail::failureLevel,
+                       "string: conversion failed, remainder not zero, remainder=", remainder);
     text.add(std::string(time));
     if (remainder != 0)
         text.add(".Conversion failed remainder>0");

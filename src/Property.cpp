@@ -3,8 +3,8 @@
 #include <algorithm>
 #include <ostream>
 #include <string_view>
+#include <type_traits>
 
-#include "IC/ICException.h"
 #include "detail/Failure.h"
 #include "detail/Text.h"
 
@@ -31,17 +31,6 @@ struct Held {
 };
 
 template <class T>
-T* newFirst()
-{
-    return new T;
-}
-template <>
-Number* newFirst()
-{
-    return new Number(Number::KIND_UNKNOWN);
-}
-
-template <class T>
 void replace(T& target, const T& source)
 {
     target = source;
@@ -59,7 +48,7 @@ bool isLess(const T& a, const T& b)
 {
     return a < b;
 }
-// Asks only the elements' <, both ways.
+// Asks only the elements' <, in both directions.
 template <class Element>
 bool isLess(const std::vector<Element>& a, const std::vector<Element>& b)
 {
@@ -124,9 +113,7 @@ std::string textOf(const StringArray& texts)
 }  // namespace
 
 PropertyValue::PropertyValue(const char* value, const bool& readOnly)
-    : value_(new std::string(detail::checked(value))),
-      kind_(KIND_STRING),
-      readOnly_(readOnly)
+    : PropertyValue(new std::string(detail::checked(value)), KIND_STRING, readOnly)
 {
 }
 
@@ -144,7 +131,7 @@ PropertyValue::PropertyValue(const KindType& kind, const bool& readOnly) : readO
 template <class Visitor>
 decltype(auto) PropertyValue::visit(KindType kind, const Visitor& visitor)
 {
-    if (kind == KIND_STRING)  // the most frequent kind but numbers, which the header handles
+    if (kind == KIND_STRING)  // the most frequent here: inline bodies handle numbers
         return visitor(Held<std::string>());
     switch (kind) {
     case KIND_NUMBER:
@@ -192,7 +179,13 @@ void PropertyValue::initKind(const unsigned char& kind)
                                                "PropertyValue:initKind: invalid kind of property: ", kind);
     const auto valid = static_cast<KindType>(kind);
     if (valid != KIND_UNKNOWN)
-        value_ = visit(valid, [](auto held) -> void* { return newFirst<typename decltype(held)::Type>(); });
+        value_ = visit(valid, [](auto held) -> void* {
+            using Type = typename decltype(held)::Type;
+            if constexpr (std::is_same_v<Type, Number>)
+                return new Number(Number::KIND_UNKNOWN);
+            else
+                return new Type;
+        });
     kind_ = valid;
 }
 

@@ -16,8 +16,8 @@ namespace IC {
 ///
 /// A plain value, checked once when it is built; one object belongs to one thread at a time. A refusal
 /// [logs](docs/refusals.md), throws and changes nothing. If logging throws, that exception propagates instead.
-/// Operations that copy a text may throw std::bad_alloc; those that copy or print the time stamp throw what
-/// ZQ::DateTime throws.
+/// Operations that copy a text may throw std::bad_alloc. Construction, copies, moves, getTimeStamp and text may throw
+/// what ZQ::DateTime throws.
 ///
 ///     IC::Alert alert(2, 1, {"/fan/1"}, 5, "Fan failed");
 ///     std::cout << alert;                        // Alert 2; 1; 5; Fan failed; <time>; { 2f66616e2f31 }
@@ -41,7 +41,7 @@ public:
     Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
           unsigned int status, std::string message);
 
-    /// Copies and moves.
+    /// A move may throw what ZQ::DateTime throws.
     Alert(const Alert&) = default;
     Alert(Alert&&) = default;
 
@@ -85,8 +85,9 @@ public:
     /// Two lower-case hexadecimal digits for each byte of the text, NUL bytes included.
     std::string hexstring(const std::string& text) const;
 
-    /// "Alert 2; 1; 5; Fan failed; 2009-02-13T23:31:30Z; { 2f61 2f62 }": severity, class, status, message, time
-    /// stamp, each path in hexadecimal. As a fresh std::ostringstream writes it under the global locale.
+    /// "Alert 2; 1; 5; Fan failed; 2009-02-13T23:31:30Z; { 2f61 2f62 }": severity, class, status, message, time stamp
+    /// (by its stream operator), each path in hexadecimal and a blank. As a fresh std::ostringstream writes it under
+    /// the global locale.
     operator std::string() const;
 
     ///@}

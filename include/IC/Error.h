@@ -40,7 +40,7 @@ public:
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
 
-    /// Copies and moves.
+    /// Moves never throw.
     Error(const Error&) = default;
     Error(Error&&) noexcept = default;
 

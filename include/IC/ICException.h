@@ -11,6 +11,7 @@ namespace IC {
 /// One object belongs to one thread at a time. Construction, copies and what() may throw std::bad_alloc.
 class IC_EXPORT ICException {
 public:
+    /// The message is `text`, or that of the exception copied. If a copy throws, nothing has changed.
     explicit ICException(const std::string& text = std::string());
     ICException(const ICException&) = default;
     ICException& operator=(const ICException&) = default;
@@ -23,11 +24,13 @@ protected:
     std::string message;  ///< what() returns a copy
 };
 
-/// Thrown by PropertyValue for an unknown kind, and for a value of another kind than the one asked for.
+/// Thrown by PropertyValue for an unknown kind, for a value of another kind than the one asked for, and for an order of
+/// different kinds.
 ///
 /// The base is private (deliberate): catch this class by its own name.
 class IC_EXPORT PropertyValueInvalidKind : private ICException {
 public:
+    /// The message is `text`, or that of the exception copied. If a copy throws, nothing has changed.
     explicit PropertyValueInvalidKind(const std::string& text);
     PropertyValueInvalidKind(const PropertyValueInvalidKind&) = default;
     PropertyValueInvalidKind& operator=(const PropertyValueInvalidKind&) = default;
@@ -41,6 +44,7 @@ public:
 /// The base is private (deliberate): catch this class by its own name.
 class IC_EXPORT NodeInvalidSensor : private ICException {
 public:
+    /// The message is `text`, or that of the exception copied. If a copy throws, nothing has changed.
     explicit NodeInvalidSensor(const std::string& text);
     NodeInvalidSensor(const NodeInvalidSensor&) = default;
     NodeInvalidSensor& operator=(const NodeInvalidSensor&) = default;

@@ -5,25 +5,27 @@
 #include <string>
 
 #include "IC/Error.h"
+#include "IC/ICException.h"
 #include "IC/Property.h"
-#include "IC/detail/Annotation.h"
 #include "IC/detail/Export.h"
+#include "IC/detail/ThreadSafety.h"
 #include "ZQ/Mutex.h"
 #include "ZQ/Types.h"
 
-/// A machine as nodes with typed, numbered properties; errors and alerts beside them.
+/// A machine as nodes with typed, numbered properties, with errors and alerts.
 namespace IC {
 
 /// A managed object: one component of the machine, with a sensor type, a status, a description, its own path and its
 /// parent's, and numbered properties. The base of the agent's node classes, which fill the protected members.
 ///
-/// May be shared between threads: status, description and properties are read and changed under the node's lock, and
-/// what is read is a copy. Sensor type, paths and comparison use no lock: set paths in the constructor only. One
-/// thread destroys the node, after its last use. A child of fork() must not use a node that another thread of its
-/// parent had locked. No operation holds two nodes' locks; an exception or a cancelled thread releases the lock.
+/// A node may be shared between threads: status, description and properties are read and changed under the node's
+/// lock, and what is read is a copy. Sensor type, paths and comparison use no lock: set paths in the constructor only.
+/// One thread destroys the node, after its last use. A child of fork() must not use a node that another thread of its
+/// parent had locked. No operation holds two nodes' locks. An exception or a cancelled thread releases the lock.
 ///
-/// A refusal [logs](docs/refusals.md). Exceptions from the lock, the logger or an override propagate unchanged, and
-/// copies and texts may throw std::bad_alloc; then nothing has changed.
+/// A refusal, but not in getProperty, [logs](docs/refusals.md). Exceptions from the lock, the logger or an override
+/// propagate unchanged (but not from the destructor). Copies and texts may throw std::bad_alloc. If anything throws,
+/// nothing has changed.
 ///
 ///     class Fan : public IC::Node {
 ///     public:
@@ -126,6 +128,7 @@ public:
     /// A node of this sensor type with an empty description. Throws NodeInvalidSensor for a code above 73.
     explicit Node(unsigned int sensor);
 
+    /// Neither copied nor assigned.
     Node(const Node&) = delete;
     Node& operator=(const Node&) = delete;
 
@@ -154,9 +157,9 @@ public:
     /// A copy of all of them, made under one lock.
     virtual std::map<unsigned int, PropertyValue> getProperties() const;
 
-    /// Replaces the property and its mark; never adds one. Logs the request, then returns STATUS_SUCCESS, or logs and
-    /// returns STATUS_NO_SUCH_PROPERTY, or STATUS_READ_ONLY if the stored value has the mark. If anything throws, the
-    /// property is as it was; records already written stay.
+    /// Replaces the property and its mark; never adds one. Returns STATUS_SUCCESS, STATUS_NO_SUCH_PROPERTY, or
+    /// STATUS_READ_ONLY if the stored value is read-only. Logs the request before it takes the lock, and a refusal
+    /// under it. If anything throws, the property is as it was; records already written stay.
     virtual Error setProperty(const unsigned int& key, const PropertyValue& value);
 
     ///@}
@@ -186,14 +189,12 @@ public:
     ///@}
 
 protected:
-    /// Holds a node's lock for as long as it lives. Re-entrant: its thread may call every operation of the node.
-    ///
-    ///     const Lock lock(mutex);
+    /// Holds the node's lock: `const Lock lock(mutex);`. See IC/detail/Lock.h.
     class Lock;
 
     /// Guards status, description and properties; take it with Lock.
     mutable ZQ::Mutex mutex;
-    StatusType status IC_ANNOTATION(guarded_by(mutex)) = STATUS_INITIAL;  ///< see getStatus
+    IC_GUARDED StatusType status = STATUS_INITIAL;  ///< see getStatus
 
 private:
     friend bool operator==(const Node& a, const Node& b);
@@ -202,9 +203,9 @@ private:
     SensorType sensor_ = SENSOR_UNKNOWN;
 
 protected:
-    std::string description IC_ANNOTATION(guarded_by(mutex));  ///< see getDescription
-    std::map<unsigned int, PropertyValue> properties IC_ANNOTATION(guarded_by(mutex));  ///< by number
-    std::string path;    ///< identifies the node
+    IC_GUARDED std::string description;                           ///< see getDescription
+    IC_GUARDED std::map<unsigned int, PropertyValue> properties;  ///< by number
+    std::string path;                                             ///< identifies the node
     std::string parent;  ///< the path of the node that contains this one
 };
 
@@ -224,8 +225,8 @@ IC_EXPORT bool operator>=(const Node& a, const Node& b);
 ///@}
 
 /// @relates Node
-/// Inserts the text of the node's class as one text: width and fill apply to the whole. If the conversion throws,
-/// nothing is inserted.
+/// Inserts the text that the node's own class returns, as one text: width and fill apply to the whole. If the
+/// conversion throws, nothing is inserted.
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const Node& node);
 
 }  // namespace IC

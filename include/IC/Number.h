@@ -1,12 +1,14 @@
 #pragma once
 
 #include <cstddef>
+#include <cstring>
 #include <functional>
 #include <iosfwd>
 #include <string>
 #include <type_traits>
 
 #include "IC/detail/Export.h"
+#include "IC/detail/Inline.h"
 #include "ZQ/DateTime.h"
 #include "ZQ/Types.h"
 
@@ -22,14 +24,14 @@ namespace detail {
 class Text;
 }
 
-/// A version of two numbers; its text is "2.15".
-struct Version2 {
+/// A version of two numbers. As a Number it prints as "2.15".
+struct IC_EXPORT Version2 {
     ZQ::Uint8 major;  ///< before the dot
     ZQ::Uint8 minor;  ///< after the dot
 };
 
-/// A reference to a node; its text is "CPU:7".
-struct sNodeRef {
+/// A reference to a node. As a Number it prints as "CPU:7".
+struct IC_EXPORT sNodeRef {
     ZQ::Uint32 type;  ///< a Node::SensorType, the index into `pst`
     ZQ::Uint32 id;    ///< which node of that type
 };
@@ -37,7 +39,7 @@ struct sNodeRef {
 /// The same under another name.
 using NodeRef = sNodeRef;
 
-/// One number of one of eleven kinds. It converts to the native types that can hold it and to no other.
+/// One number of one of eleven kinds. The kind decides which native types it converts to.
 ///
 /// A trivially copyable value; one object belongs to one thread at a time. `std::hash` agrees with `==`.
 /// A refusal [logs](docs/refusals.md), throws and changes nothing, except in initKind. If logging throws, that
@@ -50,7 +52,7 @@ using NodeRef = sNodeRef;
 /// Deliberate:
 /// - unsigned char is a kind code: Number(static_cast<unsigned char>(3)) is 0 of kind KIND_UINT32. unsigned
 ///   short and char widen to int and make a signed number, which converts only to int.
-/// - Two signed numbers are always equal and never ordered; so are two node references.
+/// - Two signed numbers are always equal, and neither is less; so it is with two node references.
 /// - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
 /// - `number < 5u`, `x += number` and `text = number` are ambiguous: name the type, `number < Number(5u)`.
 class IC_EXPORT Number {
@@ -88,8 +90,8 @@ public:
     /// A date-time; the scope is cut to 8 bits and the milliseconds to 16.
     Number(const ZQ::DateTime& value);
 
-    /// A number of the kind with this code and the content that initKind gives it. Throws std::invalid_argument
-    /// for 2, 10, and 11 and above.
+    /// A number of the kind with this code and its initial content, see initKind. Throws std::invalid_argument
+    /// for 2, and for 10 and above.
     Number(const unsigned char& code);
     inline Number(const KindType& kind);
 
@@ -109,26 +111,26 @@ public:
     inline KindType getKind() const noexcept;
     inline operator KindType() const noexcept;
 
-    /// Stores the kind and its first content: 0, 0.0, version 0.0, or the current time in whole seconds with
+    /// Stores the kind and its initial content: 0, 0.0, version 0.0, or the current time in whole seconds with
     /// scope 3. The kinds 0, 1, 6 and 7 clear the flag byte and keep the rest. Throws std::invalid_argument for 2,
-    /// 10, and 11 and above; that kind stays stored (deliberate). A kind of 11 or more then behaves like
+    /// and for 10 and above; that kind stays stored (deliberate). A kind of 11 or more then behaves like
     /// KIND_UNKNOWN in conversions and comparisons, and its text is "invalid".
     void initKind(const KindType& kind);
 
     /// Replaces the kind (0 to 10) and keeps the bytes of the value: a reinterpretation, no conversion. A flag
-    /// byte above 1 converts to true, 1 and 1.0. Throws std::invalid_argument for 11 and above.
+    /// byte above 1 converts to true, 1 and 1.0 and prints "true". Throws std::invalid_argument for 11 and above.
     void setKind(const unsigned char& code);
 
     ///@}
     /// @name Conversions
-    /// Each throws std::out_of_range for a kind that it does not name and for a value that does not fit; nothing is
-    /// saturated. A real is cut toward zero; a real NaN gives 0 as a 32-bit integer and 2^63 as a 64-bit one.
+    /// Each throws std::out_of_range for a kind that it does not name and for a value outside the range named; nothing
+    /// is saturated. A real is cut toward zero; a real NaN gives 0 as a 32-bit integer and 2^63 as a 64-bit one.
     ///@{
 
-    /// From a flag; from an unsigned integer or a real, whether it is not 0 (a NaN is true).
+    /// From a flag; from an unsigned integer or a real, true unless it is 0 (a NaN is true).
     inline operator bool() const;
 
-    /// From a signed integer; from what unsigned int takes, with the 32 bits taken as signed.
+    /// From a signed integer; from what unsigned int takes, where 2^31 and above become negative.
     inline operator int() const;
 
     /// From a flag, an unsigned integer below 2^32, a real above -1 and below 2^32.
@@ -155,8 +157,8 @@ public:
 
     /// As a fresh std::ostringstream writes it under the global locale: "unknown", "true", digits, a real with six
     /// significant digits, "not a number", "infinity", "2.15", a date-time, "CPU:7", "invalid". A sensor type above
-    /// 74 takes the name of entry 74. Milliseconds show only where they are no multiple of 10, as ".Conversion
-    /// failed remainder>0", which is logged too (deliberate). Nothing is refused.
+    /// 74 takes the name of entry 74. Milliseconds never show; if they are no multiple of 10, the text ends with
+    /// ".Conversion failed remainder>0" and a record is written (deliberate). Nothing is refused.
     operator std::string() const;
 
     ///@}
@@ -185,7 +187,7 @@ private:
     inline void store(const T& content) noexcept;
     inline void storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept;
 
-    // What the conversions do for any kind but the most frequent.
+    // The conversions from the less frequent kinds.
     bool toBool() const;
     inline int toInt() const;
     ZQ::Uint32 toUint32(const char* function) const;
@@ -200,7 +202,7 @@ private:
     static bool greater(const Number& a, const Number& b);
     static bool precedes(const Number& a, const Number& b);
 
-    // Appends the text. A template, because the library exports every other member.
+    // Appends the text. A template over an internal type, so the library does not export it.
     template <class Text>
     void write(Text& text) const;
 
@@ -219,10 +221,9 @@ private:
 IC_EXPORT bool operator==(const Number& a, const Number& b);
 IC_EXPORT bool operator!=(const Number& a, const Number& b);
 
-/// Within one kind. Throw std::invalid_argument for different kinds and for KIND_NAN. Signed integers, node references
-/// and kinds without a value are never less or greater. KIND_INFINITY on the left is never less, and greater than
-/// every kind but itself and KIND_NAN; on the right of another kind it is refused. `<=` and `>=` ask `==` first, so
-/// equal numbers are never refused.
+/// Within one kind; neither of two signed integers, node references or unknowns is less. Throw std::invalid_argument
+/// for KIND_NAN on either side and for different kinds, with one exception: KIND_INFINITY on the left is greater than
+/// any other kind, and never less. `<=` and `>=` ask `==` first, so equal numbers are never refused.
 IC_EXPORT bool operator<(const Number& a, const Number& b);
 IC_EXPORT bool operator<=(const Number& a, const Number& b);
 IC_EXPORT bool operator>(const Number& a, const Number& b);
@@ -236,8 +237,8 @@ IC_EXPORT bool operator>=(const Number& a, const Number& b);
 IC_EXPORT std::ostream& operator<<(std::ostream& out, const Number& number);
 
 /// The display names of the sensor types, indexed by Node::SensorType; entry 74, "invalid", is no sensor type.
-/// Filled before the program's own objects are built; then any thread may read it. Programs hold a copy of the
-/// table, so its size never changes.
+/// Initialised before the program's own objects at namespace scope; then any thread may read it. Programs hold a copy
+/// of the table, so its size never changes.
 IC_EXPORT extern const std::string pst[75];
 
 }  // namespace IC

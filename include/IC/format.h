@@ -20,7 +20,7 @@
 
 namespace IC::detail {
 
-// The base is private, because a formatter of ranges quotes its elements if it finds the text formatter.
+// Private, so that a formatter of ranges does not take the elements for strings and quote them.
 template <class Value>
 class FormatText : std::formatter<std::string_view> {
     using Base = std::formatter<std::string_view>;

@@ -10,8 +10,8 @@ namespace {
 
 // Writes a real with six significant digits if one multiplication finds them for certain; otherwise returns null.
 //
-// Multiplying by an exact power of ten moves six digits before the point, with an error below 2^-33. If the product is
-// further than that from the middle between two integers, the nearest integer has the digits of the real itself.
+// Multiplying by an exact power of ten moves six digits before the point, with an error below 2^-33. If the product
+// is further than that from the middle between two integers, the nearest integer has the digits of the real itself.
 char* writeSixDigits(char* out, double real)
 {
     static constexpr double smallest[] = {1e5, 1e4, 1e3, 1e2, 1e1, 1e0, 1e-1, 1e-2, 1e-3, 1e-4};

@@ -6,8 +6,8 @@
 #include "VXLog/VXLogger.h"
 #include "VXLog/VXMessageBuffer.h"
 
-// How the library reports: a log record, the same as a trace record and, for a refusal, an exception. Only this header
-// uses the logging platform.
+// How the library reports: a log record, a trace record with the same content and, for a refusal, an exception. Only
+// this header uses the logging platform.
 namespace IC::detail {
 
 constexpr int failureLevel = 6000;

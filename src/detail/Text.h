@@ -23,8 +23,8 @@ namespace IC::detail {
 
 bool globalLocaleIsClassic();
 
-// Collects a text form piece by piece. The text is what a fresh std::ostringstream writes under the global locale, which
-// the constructor reads. Unlike a stream, it throws std::bad_alloc when memory runs out.
+// Collects a text form piece by piece. The text is what a fresh std::ostringstream writes under the global locale, as
+// the constructor finds it. Unlike a stream, it throws std::bad_alloc when memory runs out.
 class Text {
 public:
     Text();
@@ -36,7 +36,8 @@ public:
     template <class Writer>
     void write(std::size_t longest, Writer writer)
     {
-        used_ = static_cast<std::size_t>(writer(room(longest)) - text_);
+        char* const end = writer(room(longest));
+        used_ = static_cast<std::size_t>(end - text_);
     }
 
     void add(std::string_view piece)
@@ -57,7 +58,8 @@ public:
     void add(unsigned long long number) { addInteger(number); }
     void add(double number);
 
-    // Adds the text form of a value that others contain.
+    // Adds the text form of a value; the sources of the values define these. Not named `add`, because Number and
+    // std::string_view both take a literal.
     void append(const Number& number);
     void append(const std::vector<Number>& numbers);
     void append(const EnumValue& value);
@@ -105,7 +107,7 @@ private:
     }
     void grow(std::size_t length);
 
-    // Holds short texts, so that only take() allocates.
+    // Holds short texts, so that they allocate only in take().
     char short_[256];
     std::string long_;
     char* text_ = short_;

@@ -6,7 +6,7 @@
 
 namespace IC::detail {
 
-// Moves the code for the other case out of the way.
+// Tells the compiler that the condition usually holds.
 constexpr bool likely(bool condition) noexcept
 {
     return __builtin_expect(static_cast<long>(condition), 1L) != 0;
@@ -15,7 +15,7 @@ constexpr bool likely(bool condition) noexcept
 // Joins a hash with the next one. The factor is odd, so multiplying loses no bit of the first.
 constexpr std::size_t combinedHash(std::size_t before, std::size_t next) noexcept
 {
-    return before * static_cast<std::size_t>(0x9E3779B97F4A7C15u) + next;
+    return before * static_cast<std::size_t>(0x9E3779B97F4A7C15ull) + next;
 }
 
 }  // namespace IC::detail

@@ -4,14 +4,18 @@
 
 namespace IC {
 
-class IC_ANNOTATION(scoped_lockable) Node::Lock {
+/// Holds a node's lock for as long as it lives. Re-entrant: its thread may call every operation of the node. Throws
+/// what the mutex throws.
+///
+///     const Lock lock(mutex);                    // in a member function of a class derived from Node
+class IC_SCOPED Node::Lock {
 public:
-    // Does not ask whether the lock was obtained: with this time-out lock() waits for ever.
-    explicit Lock(ZQ::Mutex& nodeMutex) IC_ANNOTATION(acquire_capability(nodeMutex)) : mutex_(nodeMutex)
+    /// Waits until the mutex is free.
+    IC_ACQUIRES explicit Lock(ZQ::Mutex& nodeMutex) : mutex_(nodeMutex)
     {
-        mutex_.lock(0xFFFFFFFF);
+        mutex_.lock(0xFFFFFFFF);  // waits for ever, so the result says nothing
     }
-    ~Lock() IC_ANNOTATION(release_capability()) { mutex_.unlock(); }
+    IC_RELEASES ~Lock() { mutex_.unlock(); }
     Lock(const Lock&) = delete;
     Lock& operator=(const Lock&) = delete;
 

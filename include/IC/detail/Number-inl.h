@@ -2,10 +2,6 @@
 
 // The end of IC/Number.h: inline bodies and std::hash.
 
-#include <cstring>
-
-#include "IC/detail/Inline.h"
-
 namespace IC {
 
 inline Number::Number(const bool& value) noexcept : Number(Tag(), KIND_BOOL)
@@ -99,7 +95,7 @@ inline Number::operator sNodeRef() const
     return kind_ == KIND_NODEREF ? nodeRef_ : refuseNodeRef();
 }
 
-// Zeroes the value, so that no byte that the kind does not use is undefined.
+// Zeroes the value, so that bytes that the kind does not use are defined.
 inline Number::Number(Tag, KindType kind) noexcept : kind_(kind), value_ {}, nodeRef_ {0, 0} { }
 
 template <class T>
