@@ -3,3 +3,6 @@ set(CMAKE_SYSTEM_PROCESSOR aarch64)
 set(triplet aarch64-linux-gnu)
 set(emulator qemu-aarch64)
 include(${CMAKE_CURRENT_LIST_DIR}/debian.cmake)
+
+# The tests that depend on the machine most. Emulation is slow, and i686, which needs none, has every folder.
+set(IC_TEST_FOLDERS classes model content CACHE STRING "The folders of tests/ that are built")
