@@ -11,9 +11,9 @@ namespace IC {
 
 /// The outcome of an operation: a status, perhaps a number, perhaps a text.
 ///
-/// A plain value, built once and read; one object belongs to one thread at a time. A refusal [logs](docs/refusals.md),
-/// throws and changes nothing. If logging throws, that exception propagates instead. Messages and text conversion may
-/// throw std::bad_alloc; the text of a date-time throws as in Number.
+/// A plain value, built once and read; one object belongs to one thread at a time. A refused status
+/// [logs](docs/refusals.md), throws and changes nothing. If logging throws, that exception propagates instead.
+/// Copying a message and text conversion may throw std::bad_alloc; the text of a date-time throws as in Number.
 ///
 ///     IC::Error error("no such property", IC::Error::STATUS_NO_SUCH_PROPERTY);
 ///     std::cout << error;                        // 5 - no such property
@@ -23,7 +23,7 @@ namespace IC {
 /// or the error itself. `error == 5` does not compile: compare with an enumerator.
 class IC_EXPORT Error {
 public:
-    /// 1 to 4 and 6 to 15 are valid too; the caller defines their meaning.
+    /// 1 to 4 and 6 to 15 are valid besides these; the caller defines their meaning.
     enum StatusType : ZQ::Uint8 {
         STATUS_SUCCESS = 0,
         STATUS_NO_SUCH_PROPERTY = 5,
@@ -33,14 +33,14 @@ public:
     /// @name Construction
     ///@{
 
-    /// Without a number, the value is of kind Number::KIND_UNKNOWN; without a text, the message is empty. Throws
+    /// Without a number, getValue gives one of kind KIND_UNKNOWN; without a text, the message is empty. Throws
     /// std::invalid_argument for a status above 16, std::logic_error for a null `message`.
     inline Error(const Number& value, unsigned char status);
     Error(unsigned char status, const Number& value, const std::string& message);
     Error(const char* message, unsigned char status);
     Error(const std::string& message, unsigned char status);
 
-    /// Moves never throw.
+    /// A copy; a move never throws.
     Error(const Error&) = default;
     Error(Error&&) noexcept = default;
 

@@ -12,18 +12,19 @@
 #include "ZQ/Mutex.h"
 #include "ZQ/Types.h"
 
-/// A machine as nodes with typed, numbered properties, with errors and alerts.
+/// Models a machine as nodes with typed, numbered properties; errors and alerts travel beside them.
 namespace IC {
 
 /// A managed object: one component of the machine, with a sensor type, a status, a description, its own path and its
 /// parent's, and numbered properties. The base of the agent's node classes, which fill the protected members.
 ///
 /// A node may be shared between threads: status, description and properties are read and changed under the node's
-/// lock, and what is read is a copy. Sensor type, paths and comparison use no lock: set paths in the constructor only.
-/// One thread destroys the node, after its last use. A child of fork() must not use a node that another thread of its
-/// parent had locked. No operation holds two nodes' locks. An exception or a cancelled thread releases the lock.
+/// re-entrant lock, and what is read is a copy. Sensor type, paths and comparison use no lock: set paths in the
+/// constructor only. One thread destroys the node, after its last use. A child of fork() must not use a node that
+/// another thread of its parent had locked. No operation holds two nodes' locks. An exception or a cancelled thread
+/// releases the lock.
 ///
-/// A refusal, but not in getProperty, [logs](docs/refusals.md). Exceptions from the lock, the logger or an override
+/// Refusals are [logged](docs/refusals.md), except in getProperty. Exceptions from the lock, the logger or an override
 /// propagate unchanged (but not from the destructor). Copies and texts may throw std::bad_alloc. If anything throws,
 /// nothing has changed.
 ///
@@ -37,7 +38,7 @@ namespace IC {
 ///     };
 class IC_EXPORT Node {
 public:
-    /// `pst` has the display names.
+    /// What a node is. The table `pst` has the display names.
     enum SensorType : ZQ::Uint32 {
         SENSOR_UNKNOWN = 0,
         SENSOR_CHASSIS = 1,
@@ -116,7 +117,8 @@ public:
         SENSOR_LARGEST = SENSOR_LAN_END_POINT
     };
 
-    /// No code has a name. A node begins with STATUS_INITIAL; an Alert takes no status above STATUS_LARGEST.
+    /// The codes between have no names. A node begins with STATUS_INITIAL; an Alert takes no status above
+    /// STATUS_LARGEST.
     enum StatusType : ZQ::Uint32 { STATUS_INITIAL = 0, STATUS_LARGEST = 85 };
 
     /// @name Construction
@@ -143,18 +145,18 @@ public:
     virtual StatusType getStatus() const;
     virtual std::string getDescription() const;
 
-    /// The status of this object, also where a derived class overrides getStatus.
+    /// The member `status`, also if a derived class overrides getStatus.
     operator StatusType() const;
 
     ///@}
     /// @name Properties
     ///@{
 
-    /// Copies the property and its mark into `value`. Returns STATUS_SUCCESS, or STATUS_NO_SUCH_PROPERTY and leaves
-    /// `value` as it was. Logs nothing.
+    /// Copies the property and its read-only mark into `value`. Returns STATUS_SUCCESS, or STATUS_NO_SUCH_PROPERTY
+    /// and leaves `value` as it was. Logs nothing.
     virtual Error getProperty(unsigned int key, PropertyValue& value) const;
 
-    /// A copy of all of them, made under one lock.
+    /// A copy of all of them as they are at one moment.
     virtual std::map<unsigned int, PropertyValue> getProperties() const;
 
     /// Replaces the property and its mark; never adds one. Returns STATUS_SUCCESS, STATUS_NO_SUCH_PROPERTY, or

@@ -6,8 +6,8 @@
 #include "Operations.h"
 #include "Sweep.h"
 
-// Every call of the platform in every operation throws in turn: that same exception reaches the caller, everything is
-// as before, and no lock stays held and no buffer or date-time alive.
+// Every call of the platform in every operation throws in turn, except unlock, which a destructor calls. The caller
+// gets that exception, everything is as before, no lock stays held, and no buffer or date-time stays alive.
 
 namespace {
 
@@ -21,7 +21,7 @@ const struct {
              {"trace record", observe::Call::trace},
              {"reading of the clock", observe::Call::now},
              {"text of a date-time", observe::Call::dateTimeText},
-             {"making or changing of a date-time", observe::Call::dateTime},
+             {"construction or change of a date-time", observe::Call::dateTime},
              {"lock", observe::Call::lock}};
 
 // Makes the first call throw, then the second, until there are no more. Returns how many there were.
@@ -37,13 +37,13 @@ long sweep(const Operation& operation, const Outcome& undisturbed, observe::Call
                            }};
         const std::string thrown =
             "observe::Thrown: call " + std::to_string(static_cast<int>(call)) + ", " + std::to_string(nth);
-        const std::string where = operation.name + ": " + name + " " + std::to_string(nth) + " throws";
-        if (!tryWith(fault, thrown, false, operation, undisturbed, where))
+        const std::string context = operation.name + ": " + name + " " + std::to_string(nth) + " throws";
+        if (!tryWith(fault, thrown, false, operation, undisturbed, context))
             return nth - 1;
     }
 }
 
-TEST(PlatformSweep, EveryCallMayThrow)
+TEST(PlatformSweep, EachCallThrowsInTurn)
 {
     const auto all = operations();
     long points = 0;
