@@ -4,5 +4,5 @@ set(triplet aarch64-linux-gnu)
 set(emulator qemu-aarch64)
 include(${CMAKE_CURRENT_LIST_DIR}/debian.cmake)
 
-# The tests that depend on the machine most. Emulation is slow, and i686, which needs none, has every folder.
+# The tests that depend on the machine most, because emulation is slow. i686 needs no emulation and has every folder.
 set(IC_TEST_FOLDERS classes model content CACHE STRING "The folders of tests/ that are built")

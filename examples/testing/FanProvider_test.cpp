@@ -36,7 +36,7 @@ TEST(FanProvider, TakesOverAMeasurementUnderOneLock)
     EXPECT_EQ(observe::locksHeld(), 0);
 }
 
-TEST(FanProvider, KeepsTheOldSpeedWhereTheLockFails)
+TEST(FanProvider, KeepsTheOldSpeedWhenTheLockFails)
 {
     FanProvider fan("AFB0812");
     fan.measured(3600);

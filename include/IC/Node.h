@@ -12,17 +12,16 @@
 #include "ZQ/Mutex.h"
 #include "ZQ/Types.h"
 
-/// Models a machine as nodes with typed, numbered properties; errors and alerts travel beside them.
+/// Models a machine as nodes with typed, numbered properties. Error is the outcome of an operation, Alert an event.
 namespace IC {
 
 /// A managed object: one component of the machine, with a sensor type, a status, a description, its own path and its
 /// parent's, and numbered properties. The base of the agent's node classes, which fill the protected members.
 ///
-/// A node may be shared between threads: status, description and properties are read and changed under the node's
-/// re-entrant lock, and what is read is a copy. Sensor type, paths and comparison use no lock: set paths in the
-/// constructor only. One thread destroys the node, after its last use. A child of fork() must not use a node that
-/// another thread of its parent had locked. No operation holds two nodes' locks. An exception or a cancelled thread
-/// releases the lock.
+/// Threads may share a node: its re-entrant lock guards status, description and properties, and readers get copies.
+/// Sensor type, paths and comparison use no lock: set paths in the constructor only. One thread destroys the node,
+/// after its last use. A child of fork() must not use a node that another thread of its parent had locked. No
+/// operation holds two nodes' locks. An exception or a cancelled thread releases the lock.
 ///
 /// Refusals are [logged](docs/refusals.md), except in getProperty. Exceptions from the lock, the logger or an override
 /// propagate unchanged (but not from the destructor). Copies and texts may throw std::bad_alloc. If anything throws,
@@ -117,7 +116,7 @@ public:
         SENSOR_LARGEST = SENSOR_LAN_END_POINT
     };
 
-    /// The codes between have no names. A node begins with STATUS_INITIAL; an Alert takes no status above
+    /// The codes 1 to 84 have no names. A node begins with STATUS_INITIAL; an Alert takes no status above
     /// STATUS_LARGEST.
     enum StatusType : ZQ::Uint32 { STATUS_INITIAL = 0, STATUS_LARGEST = 85 };
 

@@ -52,7 +52,7 @@ using NodeRef = sNodeRef;
 /// Deliberate:
 /// - unsigned char is a kind code: Number(static_cast<unsigned char>(3)) is 0 of kind KIND_UINT32. unsigned
 ///   short and char widen to int and make a signed number, which converts only to int.
-/// - Two signed numbers are always equal, and neither is less; so it is with two node references.
+/// - Two signed numbers are always equal, and neither is less; the same holds for two node references.
 /// - On 64-bit Linux std::uint64_t is unsigned long and does not compile; write ZQ::Uint64{value}.
 /// - `number < 5u`, `x += number` and `text = number` are ambiguous: name the type, `number < Number(5u)`.
 class IC_EXPORT Number {

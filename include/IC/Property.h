@@ -26,7 +26,7 @@ using StringArray = std::vector<std::string>;
 /// or nothing; and a read-only mark, which only Node::setProperty checks. Assignment replaces the mark.
 ///
 /// A value type: a copy is independent of its source. One object belongs to one thread at a time. `std::hash` agrees
-/// with `==`. A refusal [logs](docs/refusals.md) (except in the conversion to EnumValue), throws and changes nothing
+/// with `==`. A refusal [logs](docs/refusals.md) (except in the conversion to EnumValue and for a null text), throws and changes nothing
 /// (except in setKind). If logging throws, that exception propagates instead. Construction, copies, setKind and text
 /// may throw std::bad_alloc and then change nothing; moves, swap and comparison allocate nothing. The text of a
 /// date-time throws as in Number.
@@ -40,7 +40,7 @@ using StringArray = std::vector<std::string>;
 /// - An integer is a kind code: PropertyValue(5) is an empty array of numbers. Write PropertyValue(IC::Number(5)).
 /// - `IC::StringArray texts {value}` makes an array of one element: write `IC::StringArray texts = value`.
 /// - `value == Number(5u)` and `text = value` are ambiguous: write `value == PropertyValue(Number(5u))` and
-///   `text = std::string(value)`. A text compares as it stands: `value == "AFB0812"`.
+///   `text = std::string(value)`. A literal compiles: `value == "AFB0812"`.
 class IC_EXPORT PropertyValue {
 public:
     /// What a value can hold. Records name a kind by its code.
@@ -224,8 +224,8 @@ private:
 IC_EXPORT bool operator==(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator!=(const PropertyValue& a, const PropertyValue& b);
 
-/// Within one kind, lexicographic for texts, bytes (unsigned) and arrays, by the elements' own `<`; of two values
-/// without content neither is less. Throw PropertyValueInvalidKind for different kinds. `<=` and `>=` ask `==` first,
+/// Within one kind, lexicographic for texts, bytes (unsigned) and arrays, by the elements' own `<`; a value
+/// without content is neither less nor greater. Throw PropertyValueInvalidKind for different kinds. `<=` and `>=` ask `==` first,
 /// so equal values are never refused.
 IC_EXPORT bool operator<(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator<=(const PropertyValue& a, const PropertyValue& b);

@@ -252,7 +252,7 @@ TEST(NodeConstructor, RefusesASensorAbove73)
     EXPECT_TRUE(observe::lockCalls().empty());
 }
 
-TEST(NodeConstructor, RefusesASensorInTheSameWordsWhateverTheLocale)
+TEST(NodeConstructor, TheRefusalTextDoesNotDependOnTheLocale)
 {
     const GlobalGroupingLocale grouping(1);
     try {
@@ -436,7 +436,7 @@ TEST(NodeDestructor, ContinuesWhenLockReturnsFalse)
     EXPECT_EQ(allocation::aliveNow, before);
 }
 
-TEST(NodeDestructor, EndsTheProgramWhereTheLockThrows)
+TEST(NodeDestructor, EndsTheProgramIfTheLockThrows)
 {
     EXPECT_EXIT(
         {

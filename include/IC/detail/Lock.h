@@ -13,7 +13,7 @@ public:
     /// Waits until the mutex is free.
     IC_ACQUIRES explicit Lock(ZQ::Mutex& nodeMutex) : mutex_(nodeMutex)
     {
-        mutex_.lock(0xFFFFFFFF);  // waits for ever, so the result says nothing
+        mutex_.lock(0xFFFFFFFF);  // no time-out, so the result is not needed
     }
     IC_RELEASES ~Lock() { mutex_.unlock(); }
     Lock(const Lock&) = delete;
