@@ -306,6 +306,25 @@ TEST(PropertyKind, HasAnInitialValueForEachKind)
     EXPECT_TRUE(observe::records().empty());
 }
 
+TEST(PropertyKind, AllocatesAnInitialValueOfItsType)
+{
+    const struct {
+        PropertyValue::KindType kind;
+        std::size_t bytes;
+    } rows[] = {{PropertyValue::KIND_NUMBER, sizeof(Number)},
+                {PropertyValue::KIND_STRING, sizeof(std::string)},
+                {PropertyValue::KIND_BUFFER, sizeof(IC::Buffer)},
+                {PropertyValue::KIND_ENUMVALUE, sizeof(EnumValue)},
+                {PropertyValue::KIND_NUMBERARRAY, sizeof(IC::NumberArray)},
+                {PropertyValue::KIND_STRINGARRAY, sizeof(IC::StringArray)}};
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.kind);
+        allocation::latestSize = 0;
+        const PropertyValue value(row.kind);
+        EXPECT_EQ(allocation::latestSize, row.bytes);
+    }
+}
+
 TEST(PropertyKind, RefusesEveryCodeAboveSix)
 {
     for (unsigned int code = kinds; code <= 255; ++code) {

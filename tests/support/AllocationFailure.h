@@ -20,6 +20,7 @@ inline thread_local bool failsOnce = false;  // after one failure, allocations s
 inline thread_local bool failedNow = false;
 inline thread_local long madeSoFar = 0;
 inline thread_local long aliveNow = 0;
+inline thread_local std::size_t latestSize = 0;     // in bytes
 inline thread_local void (*onRelease)() = nullptr;  // called before each release of memory
 
 // Runs the operation with memory for `allowed` allocations; every later one throws std::bad_alloc. Returns false when
@@ -122,6 +123,7 @@ void expectTextCompleteOrThrows(const Value& value, const std::string& whole)
         --allocation::allowedNow;
     ++allocation::madeSoFar;
     ++allocation::aliveNow;
+    allocation::latestSize = size;
     return memory;
 }
 
