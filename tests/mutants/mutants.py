@@ -1,10 +1,10 @@
-"""Changes the library for the worse in one place at a time and runs the tests of the classes: they have to fail.
+"""Changes the library in one place at a time and runs the tests of the classes, of which one must fail.
 
-    mutants.py branches    each conditional branch of the compiled library is taken always, and never
-    mutants.py rules       the wrong rules of rules.txt, one after another
+    mutants.py branches    takes each conditional branch of the compiled library always, and never
+    mutants.py rules       makes the changes of rules.txt
 
-Prints the mutants by file, and each one that no test noticed. harmless.txt names the branches that need not be
-noticed and says why. Exits with 1 where anything is left over, in either direction.
+Prints how many mutants each file has and how many a test noticed, then each mutant that no test noticed. Exits with 1
+if there is one that harmless.txt does not name, and if harmless.txt or rules.txt is stale.
 """
 
 import collections
@@ -21,20 +21,21 @@ import sys
 import tempfile
 import time
 
-HERE = pathlib.Path(__file__).resolve().parent
-ROOT = HERE.parent.parent
+from quotes import ROOT, code, harmless, rules
+
 BUILD = ROOT / "build" / "mutants"
 JOBS = os.cpu_count()
 MEMORY = 1 << 29  # bytes that a test program may use; more counts as a failure
 
-# Every inline function of the public headers, so that there is something to change and to link first.
+# Stands for one source that includes the public headers; its object file has all their inline functions.
 HEADERS = "include/IC"
 
-# Assembly in which a condition of the source is a jump, also in a switch, and in which little else is one.
+# Compiles each condition of the source to jumps, also those of a switch, and little else.
 JUMPING = ["-S", "-g1", "-O1", "-fno-inline", "-fno-jump-tables", "-fno-bit-tests", "-fno-if-conversion",
            "-fno-if-conversion2", "-fno-tree-loop-if-convert", "-fno-ssa-phiopt"]  # fmt: skip
 
 Mutant = collections.namedtuple("Mutant", "file name objects")
+Branch = collections.namedtuple("Branch", "function source statement turned")
 
 
 def fail(message):
@@ -49,15 +50,15 @@ def output_of(command, **options):
 
 
 class Program:
-    """A test program: how it is linked, and what it needed when nothing was wrong."""
+    """A test program: how it is linked, and how long it takes with the unchanged library."""
 
     def __init__(self, path):
         self.name = pathlib.Path(path).name
-        # ": && compiler objects -o tests/X libraries && what is done with the program"
+        # ": && compiler objects -o tests/X libraries && further commands"
         line = output_of(["ninja", "-C", BUILD, "-t", "commands", path]).splitlines()[-1]
         words = shlex.split(line.split(" && ")[1])
         at = words.index("-o")
-        # What is linked first provides the inline functions to all.
+        # The object linked first provides the inline functions to all others.
         self.start = [words[0]]
         self.rest = [*words[1:at], *words[at + 2 :], "-fuse-ld=lld", "-Wl,--threads=1"]
         self.seconds = None
@@ -69,7 +70,7 @@ class Program:
 
     def passes(self, objects, place):
         program = self.link(objects, place)
-        # Generous: where time decides, the program is in a loop, or waits for ever.
+        # Generous, so that only an endless loop or wait exceeds it.
         seconds = 60 if self.seconds is None else 2 + int(5 * self.seconds)
 
         def limit():
@@ -98,7 +99,7 @@ class Program:
 
 
 class Suite:
-    """The library as the class tests see it, and these tests."""
+    """The library as the tests of the classes link it, and these tests."""
 
     def __init__(self):
         print("Building the tests", file=sys.stderr)
@@ -122,24 +123,24 @@ class Suite:
         self.place = pathlib.Path(tempfile.mkdtemp(dir=BUILD))
 
     def compile(self, file, output, tree=ROOT, options=("-c", "-O0")):
-        """Compiles a source of the library, or HEADERS, as it stands in `tree`."""
+        """Compiles a source of the library, or HEADERS, from the folder `tree`."""
         words = [word.replace(f"{ROOT}/include", f"{tree}/include").replace(f"{ROOT}/src", f"{tree}/src")
                  for word in self.commands[file if file != HEADERS else "src/Alert.cpp"]]  # fmt: skip
         source = tree / file
         if file == HEADERS:
             source = output.with_suffix(".cpp")
-            # The two for formatting have templates alone, and the functions of what they include.
+            # These two have only templates.
             names = sorted({header.name for header in (ROOT / HEADERS).glob("*.h")} - {"fmt.h", "format.h"})
             source.write_text("".join(f'#include "IC/{name}"\n' for name in names))
             options = [*options, "-fkeep-inline-functions"]
         output_of([*words, *options, "-w", "-o", output, source], cwd=BUILD)
 
     def likeliest_first(self, file):
-        stem = pathlib.Path(file).stem
+        stem = pathlib.Path(file).stem.replace("-inl", "")
         return sorted(self.programs, key=lambda program: (not program.name.startswith(stem), program.seconds))
 
     def check(self, objects):
-        """The unchanged library has to pass."""
+        """Exits unless all tests pass with the unchanged library."""
         for program in self.programs:
             if not program.passes(objects, self.place):
                 fail(f"{program.name} fails with the unchanged library")
@@ -163,14 +164,14 @@ class Suite:
                     noticed.append(result)
                     if len(noticed) % 100 == 0:
                         print(f"{len(noticed)} of {len(mutants)}", file=sys.stderr)
-            except BaseException:  # also fail(), for one that does not compile
+            except BaseException:  # also SystemExit, of fail(), if a mutant does not compile
                 pool.shutdown(cancel_futures=True)
                 raise
-        print(f"{'':24}{'mutants':>10}{'noticed':>10}")
+        print(f"{'':34}{'mutants':>10}{'noticed':>10}")
         for file in sorted({mutant.file for mutant in mutants}):
             results = [result for mutant, result in zip(mutants, noticed) if mutant.file == file]
-            print(f"{file:24}{len(results):10}{sum(results):10}")
-        print(f"{'total':24}{len(mutants):10}{sum(noticed):10}  in {time.monotonic() - started:.0f} s")
+            print(f"{file:34}{len(results):10}{sum(results):10}")
+        print(f"{'total':34}{len(mutants):10}{sum(noticed):10}  in {time.monotonic() - started:.0f} s")
         return [mutant for mutant, result in zip(mutants, noticed) if not result]
 
 
@@ -195,49 +196,43 @@ def branches(suite):
         originals.append(assemble(lines, suite.place, assembly.stem))
         jumps = jumps_of(lines, seen)
         names = demangled({function for function, _, _ in jumps})
-        total = collections.Counter((function, text) for function, text, _ in jumps)
-        count = collections.Counter()
-        for function, text, at in jumps:
-            count[function, text] += 1
-            which = f"{count[function, text]} of {total[function, text]}"
-            for direction in ("always", "never"):
-                mutants.append(
-                    Mutant(file, (names[function], text, f"{which} {direction}"), turned(lines, at, direction))
-                )
+        for (function, source, statement), numbers in jumps.items():
+            for which, number in enumerate(numbers, 1):
+                for direction in ("always", "never"):
+                    turned = f"{which} of {len(numbers)} {direction}"
+                    branch = Branch(names[function], source, statement, turned)
+                    mutants.append(Mutant(file, branch, with_jump(lines, number, direction)))
         seen |= {function for function, _, _ in jumps}
     suite.check(originals)
     return mutants
 
 
 def jumps_of(lines, seen):
-    """(function, text of the source's line, number of the assembly's line), in order."""
+    """{(function, source, statement): numbers of the assembly's lines}"""
     files = {}
-    function = text = None
-    jumps = []
-    for at, line in enumerate(lines):
+    function = place = None
+    jumps = collections.defaultdict(list)
+    for number, line in enumerate(lines):
         if label := re.match(r"(\w+):", line):
             function = label[1]
         elif named := re.match(r'\t\.file\s(\d+) "([^"]*)"(?: "([^"]*)")?', line):
             files[named[1]] = pathlib.Path(named[2], named[3] or "")
-        elif located := re.match(r"\t\.loc\s(\d+) (\d+)", line):
-            text = (files[located[1]], int(located[2]))
+        elif located := re.match(r"\t\.loc\s(\d+) (\d+) (\d+)", line):
+            place = located.groups()
         elif re.match(r"\tj(?!mp)\w+\t", line) and re.match(r"_ZZ*NK?(2IC|7IC_NODE)", function):
             if function not in seen:
-                jumps.append((function, source_line(*text), at))
+                source = str(files[place[0]].relative_to(ROOT))
+                here = code(source)
+                statement = here.statement(here.at(int(place[1]), int(place[2])))
+                jumps[function, source, statement].append(number)
     return jumps
 
 
-def source_line(file, number, cache={}):
-    if file not in cache:
-        cache[file] = file.read_text().splitlines()
-    return cache[file][number - 1].strip()
-
-
-def turned(lines, at, direction):
+def with_jump(lines, number, direction):
     def objects(place):
-        target = lines[at].split()[1]
+        target = lines[number].split()[1]
         jump = f"\tjmp\t{target}" if direction == "always" else ""
-        return [assemble([*lines[:at], jump, *lines[at + 1 :]], place, "mutant")]
+        return [assemble([*lines[:number], jump, *lines[number + 1 :]], place, "mutant")]
 
     return objects
 
@@ -248,71 +243,60 @@ def demangled(functions):
     return dict(zip(functions, names))
 
 
-def harmless():
-    """{(function, line, branch): reason}"""
-    reasons = {}
-    for block in re.split(r"\n\s*\n", (HERE / "harmless.txt").read_text()):
-        fields = dict(line.split(": ", 1) for line in block.splitlines() if line and not line.startswith("#"))
-        if fields:
-            reasons[fields["function"], fields["line"], fields["branch"]] = fields["why"]
-    return reasons
+def means(entry, branch):
+    """Whether an entry of harmless.txt is about this branch."""
+    quoted = (entry["file"], entry["quoted"], entry["branch"])
+    return quoted == (branch.source, branch.statement, branch.turned) and any(
+        part in branch.function for part in entry.get("for", "").split(", ")
+    )
 
 
 def run_branches(suite):
+    known = harmless()
     mutants = branches(suite)
-    unnoticed = {mutant.name: mutant for mutant in suite.unnoticed(mutants)}
-    reasons = harmless()
+    unnoticed = [mutant.name for mutant in suite.unnoticed(mutants)]
     status = 0
-    for name, mutant in unnoticed.items():
-        if name in reasons:
-            continue
-        function, text, branch = name
-        print(f"\nNo test noticed, in {mutant.file}:\nfunction: {function}\nline: {text}\nbranch: {branch}")
-        status = 1
-    for function, text, branch in reasons.keys() - unnoticed.keys():
-        print(f"\nharmless.txt names what is not there or was noticed:\nfunction: {function}\nline: {text}\nbranch: {branch}")
-        status = 1
-    print(f"harmless: {len(reasons.keys() & unnoticed.keys())}, see tests/mutants/harmless.txt")
+    stated = [branch for branch in unnoticed if any(means(entry, branch) for entry in known)]
+    for branch in unnoticed:
+        if branch not in stated:
+            print(f"\nNo test noticed, in {branch.function}:\nin: {branch.source}: ")
+            print(f"statement: {code(branch.source).quote(branch.statement)}\nbranch: {branch.turned}\nwhy: ")
+            status = 1
+    for entry in known:
+        meant = [mutant.name for mutant in mutants if means(entry, mutant.name)]
+        if not meant or not set(meant) <= set(unnoticed):
+            print("\nharmless.txt names what a test noticed, or no branch:")
+            print("".join(f"{key}: {entry[key]}\n" for key in ("in", "statement", "branch")), end="")
+            status = 1
+    print(f"harmless: {len(stated)}, see tests/mutants/harmless.txt")
     return status
 
 
 # Rules
 
 
-def rules():
-    """(file, name, old, new) of each block of rules.txt."""
-    for block in re.split(r"\n\s*\n", (HERE / "rules.txt").read_text()):
-        lines = [line for line in block.splitlines() if line and not line.startswith("#")]
-        if not lines:
-            continue
-        file, _, name = lines[0].partition(": ")
-        old = "\n".join(line[1:] for line in lines if line.startswith("-"))
-        new = "\n".join(line[1:] for line in lines if line.startswith("+"))
-        if not name or not old or old == new or not (ROOT / file).is_file():
-            fail(f"rules.txt: not a rule: {lines[0]}")
-        if (count := (ROOT / file).read_text().count(old)) != 1:
-            fail(f"rules.txt: {lines[0]}: stands there {count} times")
-        yield file, name, old, new
-
-
 def compiled_with(suite, file):
-    """What is compiled anew when this file changes: a header's inline functions, and the sources it decides."""
+    """The sources to compile again when this file changes."""
     if file in suite.commands:
         return [file]
     header = pathlib.Path(file)
-    if str(header.parent) == HEADERS:
-        return [HEADERS, f"src/{header.stem}.cpp"]
-    return [source for source in suite.commands if header.name in (ROOT / source).read_text()]
+    if file.startswith(HEADERS):
+        # Its constants also stand compiled in the source of the same name.
+        return [HEADERS, *(source for source in suite.commands if source == f"src/{header.stem}.cpp")]
+    users = [source for source in suite.commands if f"detail/{header.name}" in (ROOT / source).read_text()]
+    for other in (ROOT / "src/detail").glob("*.h"):
+        if f"detail/{header.name}" in other.read_text():
+            users += compiled_with(suite, str(other.relative_to(ROOT)))
+    return sorted(set(users))
 
 
-def broken(suite, file, old, new):
+def broken(suite, rule):
     def objects(place):
         tree = place / "tree"
         for folder in ("include", "src"):
             shutil.copytree(ROOT / folder, tree / folder)
-        changed = tree / file
-        changed.write_text(changed.read_text().replace(old, new))
-        return compile_all(suite, compiled_with(suite, file), tree, place)
+        (tree / rule["file"]).write_text(code(rule["file"]).replaced(rule["quoted"], rule["new"]))
+        return compile_all(suite, compiled_with(suite, rule["file"]), tree, place)
 
     return objects
 
@@ -326,7 +310,7 @@ def compile_all(suite, files, tree, place):
 
 
 def run_rules(suite):
-    mutants = [Mutant(file, name, broken(suite, file, old, new)) for file, name, old, new in rules()]
+    mutants = [Mutant(rule["file"], rule["rule"], broken(suite, rule)) for rule in rules()]
     suite.check(compile_all(suite, [HEADERS, *suite.commands], ROOT, suite.place))
     unnoticed = suite.unnoticed(mutants)
     for mutant in unnoticed:
@@ -337,7 +321,7 @@ def run_rules(suite):
 def main():
     parts = {"branches": run_branches, "rules": run_rules}
     if len(sys.argv) != 2 or sys.argv[1] not in parts:
-        sys.exit("usage: scripts/checks/mutants branches | rules")
+        sys.exit("usage: scripts/checks/mutants [branches|rules|--check]")
     suite = Suite()
     try:
         status = parts[sys.argv[1]](suite)
