@@ -26,10 +26,10 @@ using StringArray = std::vector<std::string>;
 /// or nothing; and a read-only mark, which only Node::setProperty checks. Assignment replaces the mark.
 ///
 /// A value type: a copy is independent of its source. One object belongs to one thread at a time. `std::hash` agrees
-/// with `==`. A refusal [logs](docs/refusals.md) (except in the conversion to EnumValue and for a null text), throws and changes nothing
-/// (except in setKind). If logging throws, that exception propagates instead. Construction, copies, setKind and text
-/// may throw std::bad_alloc and then change nothing; moves, swap and comparison allocate nothing. The text of a
-/// date-time throws as in Number.
+/// with `==`. A refusal [logs](docs/refusals.md) (except in the conversion to EnumValue and for a null text), throws
+/// and changes nothing (except in setKind). If logging throws, that exception propagates instead. Construction,
+/// copies, setKind and text may throw std::bad_alloc and then change nothing; moves, swap and comparison allocate
+/// nothing. The text of a date-time throws as in Number.
 ///
 ///     IC::PropertyValue model("DCS8000Z", true); // a read-only text
 ///     std::string text = model;                  // DCS8000Z
@@ -224,9 +224,9 @@ private:
 IC_EXPORT bool operator==(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator!=(const PropertyValue& a, const PropertyValue& b);
 
-/// Within one kind, lexicographic for texts, bytes (unsigned) and arrays, by the elements' own `<`; a value
-/// without content is neither less nor greater. Throw PropertyValueInvalidKind for different kinds. `<=` and `>=` ask `==` first,
-/// so equal values are never refused.
+/// Within one kind, lexicographic for texts, bytes (unsigned) and arrays, by the elements' own `<`; a value without
+/// content is neither less nor greater. Throw PropertyValueInvalidKind for different kinds. `<=` and `>=` ask `==`
+/// first, so equal values are never refused.
 IC_EXPORT bool operator<(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator<=(const PropertyValue& a, const PropertyValue& b);
 IC_EXPORT bool operator>(const PropertyValue& a, const PropertyValue& b);
