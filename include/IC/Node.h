@@ -190,7 +190,7 @@ public:
     ///@}
 
 protected:
-    /// Holds the node's lock: `const Lock lock(mutex);`. See IC/detail/Lock.h.
+    /// Holds the node's lock: `const Lock lock(mutex);`. Re-entrant; see IC/detail/Lock.h.
     class Lock;
 
     /// Guards status, description and properties; take it with Lock.

@@ -15,7 +15,9 @@ public:
     {
         mutex_.lock(0xFFFFFFFF);  // no time-out, so the result is not needed
     }
+    /// Releases it.
     IC_RELEASES ~Lock() { mutex_.unlock(); }
+    /// Neither copied nor assigned.
     Lock(const Lock&) = delete;
     Lock& operator=(const Lock&) = delete;
 
