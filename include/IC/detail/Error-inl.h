@@ -4,7 +4,7 @@
 
 namespace IC {
 
-inline Error::Error(const Number& value, unsigned char status) : value_(value), message_()
+inline Error::Error(const Number& value, unsigned char status) : value_(value)
 {
     initStatus(status);
 }
