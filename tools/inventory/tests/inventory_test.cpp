@@ -65,13 +65,13 @@ std::string info(const std::string& name, const std::string& value)
     return "<info name=\"" + name + "\" value=\"" + value + "\"/>";
 }
 
-const IC::Node& nodeAt(Inventory&&, const std::string&) = delete;  // the node would not outlive the call
-const IC::Node& nodeAt(const Inventory& inventory, const std::string& path)
+const IC::Node& nodeAt(Inventory&&, std::string_view) = delete;  // the node would not outlive the call
+const IC::Node& nodeAt(const Inventory& inventory, std::string_view path)
 {
     for (const auto& node : inventory.nodes)
         if (node->getPath() == path)
             return *node;
-    throw std::runtime_error("no node " + path);
+    throw std::runtime_error("no node " + std::string(path));
 }
 
 IC::PropertyValue property(const IC::Node& node, Key key)
