@@ -66,8 +66,8 @@ def quoted(string):
         string.fetch_lazy()
         printer = gdb.default_visualizer(string)
         content = printer.to_string() if printer else None
-        if hasattr(content, "address"):
-            gdb.selected_inferior().read_memory(content.address, min(content.length, 1))
+        if hasattr(content, "address") and content.length != 0:  # GDB 16 refuses to read no byte
+            gdb.selected_inferior().read_memory(content.address, 1)
         return string.format_string()
     except UNREADABLE as error:
         return unreadable(error)
