@@ -521,7 +521,7 @@ TEST(InventoryExports, CutOffAnywhereAreRefusedOrRead)
 TEST(InventoryExports, OfAnotherFormatAreRefused)
 {
     std::string xml = synthetic("pack:1 core:1 pu:1");
-    replace(xml, "topology version=\"2.0\"", "topology version=\"3.0\"");
+    replace(xml, "topology version=\"2.0\"", "topology version=\"99.0\"");
     EXPECT_THROW(readExport(xml), BadInput);
     EXPECT_THROW(readExport("<?xml version=\"1.0\"?><machine/>"), BadInput);
     EXPECT_THROW(readExport("\x89PNG"), BadInput);
@@ -851,7 +851,7 @@ TEST_F(InventoryProgram, TellsWhyAPropertyIsNotChanged)
 TEST_F(InventoryProgram, RefusesBadInputInOneLine)
 {
     std::string newer = synthetic("pack:1 core:1 pu:1");
-    replace(newer, "topology version=\"2.0\"", "topology version=\"3.0\"");
+    replace(newer, "topology version=\"2.0\"", "topology version=\"99.0\"");
     std::string crashing = synthetic("pack:1 core:2 pu:2");
     const auto set = crashing.find(" complete_cpuset=", crashing.find("type=\"Core\""));
     crashing.erase(set, crashing.find("\" ", set) + 1 - set);
