@@ -76,8 +76,8 @@ def main():
     if not table:
         sys.exit(f"{options.table} has no operations")
     if compiler != options.compiler and not options.update:
-        sys.exit(f"{options.table} has the counts of {compiler}, not of {options.compiler}; "
-                 "replace them with --update")
+        sys.exit(f"{options.table} has the counts of {compiler}, and each compiler has its own; this is "
+                 f"{options.compiler}. To compare a change here, first make a table without it, with --update")
 
     operations = operations_of(options.program)
     if set(operations) != set(table) and not options.update:
