@@ -5,6 +5,8 @@
 #
 # Needs root, or as an ordinary user newuidmap and a range of user ids in /etc/subuid.
 
+PATH=$PATH:/usr/sbin:/sbin  # an ordinary user may lack them
+
 fail() {
     echo "$*" >&2
     exit 1
