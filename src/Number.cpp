@@ -343,14 +343,12 @@ Version2 Number::toVersion() const
 
 Number::operator ZQ::DateTime() const
 {
-    const auto content = load<DateTimeFields>();
-    if (kind_ != KIND_DATETIME || content.scope < 1 || content.scope > 3)
+    const auto scope = load<DateTimeFields>().scope;
+    if (kind_ != KIND_DATETIME || scope < 1 || scope > 3)
         detail::fail<std::out_of_range>(here("operator ZQ::DateTime"),
                                         "Can't return current value as a DateTime",
                                         "DateTime: Can't return current value as a DateTime, kind=", kind_);
-    ZQ::DateTime time(content.seconds, content.scope);
-    time.setMillisecond(content.milliseconds);
-    return time;
+    return loadDateTime();
 }
 
 sNodeRef Number::refuseNodeRef() const

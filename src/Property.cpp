@@ -24,12 +24,6 @@ auto kindOf(const PropertyValue& value)
 
 constexpr char notANumber[] = "Can't return current value as a Number";
 
-// Names the type of the object that a kind holds.
-template <class T>
-struct Held {
-    using Type = T;
-};
-
 template <class T>
 void replace(T& target, const T& source)
 {
@@ -125,26 +119,6 @@ PropertyValue::PropertyValue(const unsigned char& kind, const bool& readOnly) : 
 PropertyValue::PropertyValue(const KindType& kind, const bool& readOnly) : readOnly_(readOnly)
 {
     initKind(static_cast<unsigned char>(kind));
-}
-
-// Calls the visitor with the type of the object that this kind holds.
-template <class Visitor>
-decltype(auto) PropertyValue::visit(KindType kind, const Visitor& visitor)
-{
-    if (kind == KIND_STRING)  // the most frequent here: inline bodies handle numbers
-        return visitor(Held<std::string>());
-    switch (kind) {
-    case KIND_NUMBER:
-        return visitor(Held<Number>());
-    case KIND_BUFFER:
-        return visitor(Held<Buffer>());
-    case KIND_ENUMVALUE:
-        return visitor(Held<EnumValue>());
-    case KIND_NUMBERARRAY:
-        return visitor(Held<NumberArray>());
-    default:  // KIND_STRINGARRAY
-        return visitor(Held<StringArray>());
-    }
 }
 
 // For a value that holds no object yet.

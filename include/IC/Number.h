@@ -22,6 +22,7 @@ namespace IC {
 
 namespace detail {
 class Text;
+struct Visit;
 }
 
 /// A version of two numbers. As a Number it prints as "2.15".
@@ -169,6 +170,7 @@ private:
     friend bool operator>(const Number& a, const Number& b);
     friend struct std::hash<Number>;
     friend class detail::Text;
+    friend struct detail::Visit;
 
     struct Tag { };
 
@@ -183,6 +185,7 @@ private:
 
     template <class T>
     inline T load() const noexcept;
+    inline ZQ::DateTime loadDateTime() const;
     template <class T>
     inline void store(const T& content) noexcept;
     inline void storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept;

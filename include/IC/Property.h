@@ -17,6 +17,10 @@
 
 namespace IC {
 
+namespace detail {
+struct Visit;
+}
+
 /// What a value holds when it holds several elements.
 using Buffer = std::vector<unsigned char>;
 using NumberArray = std::vector<Number>;
@@ -166,6 +170,7 @@ private:
     friend bool operator<(const PropertyValue& a, const PropertyValue& b);
     friend bool operator>(const PropertyValue& a, const PropertyValue& b);
     friend struct std::hash<PropertyValue>;
+    friend struct detail::Visit;
 
     // Owns the object.
     inline PropertyValue(void* object, KindType kind, const bool& readOnly) noexcept;
@@ -183,8 +188,9 @@ private:
     template <class T>
     inline const T& object() const noexcept;
 
+    // Calls the visitor with the type of the object that this kind holds.
     template <class Visitor>
-    static decltype(auto) visit(KindType kind, const Visitor& visitor);
+    static inline decltype(auto) visit(KindType kind, const Visitor& visitor);
 
     inline void release() noexcept;
     void copyObject(const PropertyValue& source);

@@ -42,3 +42,16 @@ function(ic_add_test name)
     endif()
     gtest_discover_tests(${name}_test DISCOVERY_TIMEOUT 60 ${label})
 endfunction()
+
+# Tests that the marked lines of the source do not compile, see refused.sh.
+function(ic_add_refused name source)
+    set(standard 17)
+    if(CMAKE_CXX_STANDARD)
+        set(standard ${CMAKE_CXX_STANDARD})
+    endif()
+    add_test(NAME ${name} COMMAND ${CMAKE_CURRENT_FUNCTION_LIST_DIR}/refused.sh ${CMAKE_CURRENT_SOURCE_DIR}/${source}
+        ${CMAKE_CXX_COMPILER} -std=c++${standard} -Wall -Wextra -Wpedantic -Wshadow -Wold-style-cast -Werror
+        "-I$<JOIN:$<TARGET_PROPERTY:IC,INTERFACE_INCLUDE_DIRECTORIES>,;-I>"
+        "-I$<JOIN:$<TARGET_PROPERTY:IC::ZQ,INTERFACE_INCLUDE_DIRECTORIES>,;-I>"
+        COMMAND_EXPAND_LISTS)
+endfunction()

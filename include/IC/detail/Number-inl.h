@@ -106,6 +106,15 @@ inline T Number::load() const noexcept
     return content;
 }
 
+// Whatever the scope is.
+inline ZQ::DateTime Number::loadDateTime() const
+{
+    const auto content = load<DateTimeFields>();
+    ZQ::DateTime time(content.seconds, content.scope);
+    time.setMillisecond(content.milliseconds);
+    return time;
+}
+
 template <class T>
 inline void Number::store(const T& content) noexcept
 {

@@ -8,6 +8,16 @@
 
 namespace IC {
 
+namespace detail {
+
+// Names the type of the object that a kind holds.
+template <class T>
+struct Held {
+    using Type = T;
+};
+
+}  // namespace detail
+
 inline PropertyValue::PropertyValue(const std::string& value, const bool& readOnly)
     : PropertyValue(new std::string(value), KIND_STRING, readOnly)
 {
@@ -212,6 +222,25 @@ template <class T>
 inline const T& PropertyValue::object() const noexcept
 {
     return *static_cast<const T*>(value_);
+}
+
+template <class Visitor>
+inline decltype(auto) PropertyValue::visit(KindType kind, const Visitor& visitor)
+{
+    if (kind == KIND_STRING)  // the most frequent here: inline bodies handle numbers
+        return visitor(detail::Held<std::string>());
+    switch (static_cast<ZQ::Uint32>(kind)) {
+    case KIND_NUMBER:
+        return visitor(detail::Held<Number>());
+    case KIND_BUFFER:
+        return visitor(detail::Held<Buffer>());
+    case KIND_ENUMVALUE:
+        return visitor(detail::Held<EnumValue>());
+    case KIND_NUMBERARRAY:
+        return visitor(detail::Held<NumberArray>());
+    default:  // KIND_STRINGARRAY
+        return visitor(detail::Held<StringArray>());
+    }
 }
 
 // Leaves value_ dangling.
