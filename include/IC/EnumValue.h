@@ -17,12 +17,28 @@ namespace IC {
 /// [logs](docs/refusals.md), throws and changes nothing. If logging throws, that exception propagates instead.
 /// Otherwise only text conversion throws (std::bad_alloc).
 ///
-///     IC::EnumValue state(7u);
-///     unsigned char code = state;                // 7
-///     std::cout << state;                        // 7
+///     enum class State { Off, On };
+///     IC::EnumValue state(State::On);
+///     auto read = static_cast<State>(state);     // State::On
+///     unsigned char code = state;                // 1
+///     std::cout << state;                        // 1
 ///
 /// `state == 7u` is ambiguous: write `state == EnumValue(7u)`. So is `state = 7`, with a signed number.
 class IC_EXPORT EnumValue {
+    // What the constructors from integers take. The enumerations among them convert without a cast, so the explicit
+    // constructor must not be the better match for them.
+    struct Integers {
+        void operator()(const unsigned char&);
+        void operator()(const unsigned short&);
+        void operator()(const unsigned int&);
+    };
+    template <class T>
+    static constexpr bool isInteger = std::is_invocable_v<Integers, T>;
+    template <class T>
+    static constexpr bool isEnumeration = std::is_enum_v<T> && sizeof(T) <= sizeof(ZQ::Uint32);
+    template <class T>
+    static constexpr bool isTooLarge = std::is_enum_v<T> && sizeof(T) > sizeof(ZQ::Uint32);
+
 public:
     /// @name Construction
     ///@{
@@ -33,6 +49,19 @@ public:
     EnumValue(const unsigned short& value) noexcept : value_(value) { }
     EnumValue(const unsigned int& value) noexcept : value_(value) { }
 
+    /// The value of an enumerator; a negative one becomes 2^31 or more. An enumeration that converts to one of the
+    /// integers above without a cast, such as Node::SensorType, still converts so.
+    template <class Enum, std::enable_if_t<isEnumeration<Enum> && !isInteger<Enum>, int> = 0>
+    explicit EnumValue(Enum value) noexcept
+        : value_(
+            static_cast<ZQ::Uint32>(static_cast<std::underlying_type_t<Enum>>(value)))  // extends the sign
+    {
+    }
+
+    /// Deleted: an enumeration of 64 bits.
+    template <class Enum, std::enable_if_t<isTooLarge<Enum>, int> = 0>
+    explicit EnumValue(Enum) = delete;
+
     ///@}
     /// @name Conversions
     ///@{
@@ -41,6 +70,14 @@ public:
     operator unsigned int() const noexcept { return value_; }
     inline operator unsigned short() const;
     inline operator unsigned char() const;
+
+    /// The enumerator with this value, also a negative one. Throws std::out_of_range if the type of the enumeration
+    /// cannot hold it. If that type is not fixed, the value must be in the range of the enumerators.
+    template <class Enum, std::enable_if_t<isEnumeration<Enum>, int> = 0>
+    explicit operator Enum() const
+    {
+        return static_cast<Enum>(as<std::underlying_type_t<Enum>>());
+    }
 
     ///@}
     /// @name Text
@@ -52,6 +89,8 @@ public:
     ///@}
 
 private:
+    template <class Integer>
+    inline Integer as() const;
     [[noreturn, gnu::cold]] unsigned short refuseUint16() const;
     [[noreturn, gnu::cold]] unsigned char refuseUint8() const;
 

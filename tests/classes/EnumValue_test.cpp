@@ -10,6 +10,7 @@
 #include <gtest/gtest.h>
 
 #include "IC/EnumValue.h"
+#include "IC/Node.h"
 #include "observe/Refusal.h"
 #include "support/GroupingLocale.h"
 
@@ -232,6 +233,106 @@ TEST(EnumValueStream, AppliesWidthAndFillToTheWholeText)
     out << '|' << std::left << std::setw(6) << EnumValue(7u) << '|' << EnumValue(7u);
     out << std::setw(2) << EnumValue(12345u);
     EXPECT_EQ(out.str(), "***255|7*****|712345");
+}
+
+enum class State { Off, On };  // of type int
+enum class Offset : signed char { Lowest = -128, Below = -1, Highest = 127 };
+enum class Step : short { Lowest = -32768, Below = -1, Highest = 32767 };
+enum class Byte : unsigned char { Highest = 255 };
+enum class Word : unsigned short { Highest = 65535 };
+enum class Whole : unsigned int { Highest = 4294967295 };
+enum class Answer : bool { No, Yes };
+enum class Long : long long { None };
+enum Plain { PLAIN_ZERO, PLAIN_SEVEN = 7 };
+enum PlainNegative { PLAIN_BELOW = -1, PLAIN_ABOVE = 1 };
+enum PlainLong { PLAIN_LONG = 0x100000000 };
+enum Code : unsigned short { CODE_FIVE = 5 };  // converts without a cast
+
+static_assert(std::is_constructible_v<EnumValue, State>);
+static_assert(!std::is_convertible_v<State, EnumValue>);
+static_assert(!std::is_convertible_v<Plain, EnumValue>);
+static_assert(std::is_convertible_v<Code, EnumValue>);
+static_assert(std::is_constructible_v<State, EnumValue>);
+static_assert(!std::is_convertible_v<EnumValue, State>);
+static_assert(!std::is_convertible_v<EnumValue, Plain>);
+static_assert(!std::is_convertible_v<EnumValue, Code>);
+static_assert(std::is_nothrow_constructible_v<EnumValue, State>);
+
+// 64 bits do not fit.
+static_assert(!std::is_constructible_v<EnumValue, Long>);
+static_assert(!std::is_constructible_v<EnumValue, PlainLong>);
+static_assert(!std::is_constructible_v<Long, EnumValue>);
+static_assert(!std::is_constructible_v<PlainLong, EnumValue>);
+
+template <class Enum>
+void expectThereAndBack(Enum enumerator, unsigned int number)
+{
+    const EnumValue value(enumerator);
+    EXPECT_EQ(to<unsigned int>(value), number);
+    EXPECT_EQ(static_cast<Enum>(value), enumerator);
+}
+
+TEST(EnumValueEnumeration, EveryEnumeratorComesBack)
+{
+    expectThereAndBack(State::On, 1);
+    expectThereAndBack(Offset::Highest, 127);
+    expectThereAndBack(Step::Highest, 32767);
+    expectThereAndBack(Byte::Highest, 255);
+    expectThereAndBack(Word::Highest, 65535);
+    expectThereAndBack(Whole::Highest, 4294967295);
+    expectThereAndBack(Answer::Yes, 1);
+    expectThereAndBack(PLAIN_SEVEN, 7);
+    expectThereAndBack(PLAIN_ABOVE, 1);
+    expectThereAndBack(CODE_FIVE, 5);
+    expectThereAndBack(IC::Node::SENSOR_FAN, 20);
+}
+
+TEST(EnumValueEnumeration, ANegativeEnumeratorIsExtendedTo32Bits)
+{
+    expectThereAndBack(static_cast<State>(-2147483647 - 1), 2147483648);
+    expectThereAndBack(Offset::Lowest, 4294967168);
+    expectThereAndBack(Offset::Below, 4294967295);
+    expectThereAndBack(Step::Lowest, 4294934528);
+    expectThereAndBack(Step::Below, 4294967295);
+    expectThereAndBack(PLAIN_BELOW, 4294967295);
+}
+
+template <class Enum>
+void expectEnumeratorRefused(unsigned int number, const std::string& bits, const std::string& sentence)
+{
+    SCOPED_TRACE(number);
+    const EnumValue value(number);
+    expectRefusal<std::out_of_range>(
+        [&] { return static_cast<Enum>(value); }, "operator ZQ::Uint" + bits, "EnumValue",
+        "Vexilon.IC.EnumValue", "Uint" + bits + ": number out of range: " + std::to_string(number), sentence);
+    EXPECT_EQ(to<unsigned int>(value), number);
+}
+
+TEST(EnumValueEnumeration, AValueThatItsTypeCannotHoldIsRefused)
+{
+    const char* const tooLarge8 = "The number is too large to convert to an 8-bit integer";
+    const char* const tooLarge16 = "The number is too large to convert to a 16-bit integer";
+    expectEnumeratorRefused<Byte>(256, "8", tooLarge8);
+    expectEnumeratorRefused<Byte>(4294967295, "8", tooLarge8);
+    expectEnumeratorRefused<Offset>(128, "8", tooLarge8);
+    expectEnumeratorRefused<Offset>(255, "8", tooLarge8);
+    expectEnumeratorRefused<Offset>(4294967167, "8", tooLarge8);
+    expectEnumeratorRefused<Answer>(2, "8", tooLarge8);
+    expectEnumeratorRefused<Word>(65536, "16", tooLarge16);
+    expectEnumeratorRefused<Step>(32768, "16", tooLarge16);
+    expectEnumeratorRefused<Step>(65535, "16", tooLarge16);
+    expectEnumeratorRefused<Step>(4294934527, "16", tooLarge16);
+    expectEnumeratorRefused<Code>(65536, "16", tooLarge16);
+}
+
+TEST(EnumValueEnumeration, WhatConvertsWithoutACastStillDoes)
+{
+    EnumValue value = {IC::Node::SENSOR_FAN};
+    EXPECT_EQ(to<unsigned int>(value), 20u);
+    value = CODE_FIVE;
+    EXPECT_EQ(to<unsigned int>(value), 5u);
+    value = IC::Error::STATUS_READ_ONLY;
+    EXPECT_EQ(to<unsigned int>(value), 16u);
 }
 
 }  // namespace

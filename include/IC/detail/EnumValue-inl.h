@@ -14,6 +14,19 @@ inline EnumValue::operator unsigned char() const
     return value_ <= 0xFFu ? static_cast<unsigned char>(value_) : refuseUint8();
 }
 
+// Of a signed type, the negative values are those that it extends to this value.
+template <class Integer>
+inline Integer EnumValue::as() const
+{
+    const auto value = static_cast<Integer>(value_);
+    if (static_cast<ZQ::Uint32>(value) == value_)
+        return value;
+    if constexpr (sizeof(Integer) == sizeof(unsigned short))
+        refuseUint16();
+    else
+        refuseUint8();  // no integer of 32 bits gets here
+}
+
 static_assert(std::is_trivially_copyable_v<EnumValue>);
 
 }  // namespace IC
