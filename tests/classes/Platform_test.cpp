@@ -533,6 +533,46 @@ TEST_F(Sink, EscapesWhatCouldForgeALineOrDriveATerminal)
     }
 }
 
+TEST_F(Sink, EscapesWhatReordersOrHidesText)
+{
+    const struct {
+        std::string text;
+        const char* written;
+    } rows[] = {
+        {"\xe2\x80\xaa", "\\xe2\\x80\\xaa"},  // U+202A, left-to-right embedding
+        {"gnp.\xe2\x80\xae"
+         "exe",
+         "gnp.\\xe2\\x80\\xaeexe"},                    // U+202E, right-to-left override
+        {"\xe2\x80\xaf", "\xe2\x80\xaf"},              // U+202F, a narrow blank
+        {"\xe2\x81\xa5", "\xe2\x81\xa5"},              // U+2065, unassigned
+        {"\xe2\x81\xa6", "\\xe2\\x81\\xa6"},           // U+2066, left-to-right isolate
+        {"\xe2\x81\xa9", "\\xe2\\x81\\xa9"},           // U+2069, the end of an isolate
+        {"\xe2\x81\xb0", "\xe2\x81\xb0"},              // U+2070, superscript zero
+        {"\xe2\x80\x8a", "\xe2\x80\x8a"},              // U+200A, hair space
+        {"\xe2\x80\x8b", "\\xe2\\x80\\x8b"},           // U+200B, zero-width space
+        {"\xe2\x80\x8f", "\\xe2\\x80\\x8f"},           // U+200F, right-to-left mark
+        {"\xe2\x80\x90", "\xe2\x80\x90"},              // U+2010, hyphen
+        {"\xc2\xac", "\xc2\xac"},                      // U+00AC, not sign
+        {"\xc2\xad", "\\xc2\\xad"},                    // U+00AD, soft hyphen
+        {"\xc2\xae", "\xc2\xae"},                      // U+00AE, registered sign
+        {"\xd8\x9b", "\xd8\x9b"},                      // U+061B, Arabic semicolon
+        {"\xd8\x9c", "\\xd8\\x9c"},                    // U+061C, Arabic letter mark
+        {"\xef\xbb\xbe", "\xef\xbb\xbe"},              // U+FEFE
+        {"\xef\xbb\xbf", "\\xef\\xbb\\xbf"},           // U+FEFF, byte order mark
+        {"\xef\xbf\xb9", "\\xef\\xbf\\xb9"},           // U+FFF9, interlinear annotation
+        {"\xef\xbf\xbc", "\xef\xbf\xbc"},              // U+FFFC, object replacement
+        {"\xf3\x9f\xbf\xbf", "\xf3\x9f\xbf\xbf"},      // U+DFFFF
+        {"\xf3\xa0\x80\x80", "\\xf3\\xa0\\x80\\x80"},  // U+E0000, the first tag
+        {"\xf3\xa0\x81\xbf", "\\xf3\\xa0\\x81\\xbf"},  // U+E007F, the last tag
+        {"\xf3\xa0\x82\x80", "\xf3\xa0\x82\x80"},      // U+E0080
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.written);
+        EXPECT_THAT(standardError([&] { log(row.text); }),
+                    testing::EndsWith(std::string(" work: ") + row.written + "\n"));
+    }
+}
+
 TEST_F(Sink, EscapesOnlyWhatIsNotPrintable)
 {
     const struct {

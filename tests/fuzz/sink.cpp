@@ -16,6 +16,7 @@
 #include "VXLog/VXMessageBuffer.h"
 #include "model/Outcome.h"
 #include "model/PropertyValue.h"
+#include "support/Printable.h"
 
 namespace {
 
@@ -66,14 +67,6 @@ std::size_t decode(std::string_view text, unsigned int& code)
         return code < form.smallest ? 0 : form.length;
     }
     return 0;
-}
-
-bool isPrintable(unsigned int code)
-{
-    const bool control = code < 0x20 || (code >= 0x7F && code <= 0x9F);
-    const bool separator = code == 0x2028 || code == 0x2029;
-    const bool surrogate = code >= 0xD800 && code <= 0xDFFF;
-    return !control && !separator && !surrogate && code <= 0x10FFFF;
 }
 
 void requirePrintable(std::string_view line)

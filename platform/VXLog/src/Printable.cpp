@@ -1,10 +1,30 @@
 #include "Printable.h"
 
+#include <algorithm>
 #include <cstddef>
+#include <iterator>
 
 namespace VXLog {
 
 namespace {
+
+// Characters that reorder or hide text or end a line: the general categories Cf, Zl and Zp of Unicode 15.1, and the
+// whole range of the tag characters, U+E0000 to U+E007F.
+constexpr struct {
+    unsigned int first;
+    unsigned int last;
+} formatCharacters[] = {{0x00AD, 0x00AD},   {0x0600, 0x0605},   {0x061C, 0x061C},   {0x06DD, 0x06DD},
+                        {0x070F, 0x070F},   {0x0890, 0x0891},   {0x08E2, 0x08E2},   {0x180E, 0x180E},
+                        {0x200B, 0x200F},   {0x2028, 0x202E},   {0x2060, 0x2064},   {0x2066, 0x206F},
+                        {0xFEFF, 0xFEFF},   {0xFFF9, 0xFFFB},   {0x110BD, 0x110BD}, {0x110CD, 0x110CD},
+                        {0x13430, 0x1343F}, {0x1BCA0, 0x1BCA3}, {0x1D173, 0x1D17A}, {0xE0000, 0xE007F}};
+
+bool isFormatCharacter(unsigned int character)
+{
+    return std::any_of(
+        std::begin(formatCharacters), std::end(formatCharacters),
+        [character](const auto& range) { return character >= range.first && character <= range.last; });
+}
 
 // The length of the printable UTF-8 character that `text` begins with, or 0 if it does not begin with one.
 std::size_t printableLength(std::string_view text)
@@ -24,8 +44,8 @@ std::size_t printableLength(std::string_view text)
     }
     const bool tooLong = (length == 3 && character < 0x800) || (length == 4 && character < 0x10000);
     const bool surrogate = character >= 0xD800 && character <= 0xDFFF;
-    const bool control = character < 0xA0 || character == 0x2028 || character == 0x2029;
-    return tooLong || surrogate || control || character > 0x10FFFF ? 0 : length;
+    const bool unprintable = character < 0xA0 || isFormatCharacter(character);
+    return tooLong || surrogate || unprintable || character > 0x10FFFF ? 0 : length;
 }
 
 void addEscaped(std::string& out, unsigned char byte)
