@@ -286,6 +286,92 @@ TEST(MessageBuffer, StartsWithDefaultSettingsAfterABufferThatChangedThem)
               "1234567 1234567 0.123456");
 }
 
+// Tells when the last locale that has it is gone.
+class ObservedDigits : public std::numpunct<char> {
+public:
+    explicit ObservedDigits(bool& isDestroyed) : isDestroyed_(isDestroyed) { }
+    ~ObservedDigits() override { isDestroyed_ = true; }
+
+private:
+    bool& isDestroyed_;
+};
+
+TEST(MessageBuffer, ReleasesTheLocaleThatItsUserSet)
+{
+    for (const bool isSetInStream : {true, false}) {
+        bool isDestroyed = false;
+        {
+            VXLog::VXMessageBuffer buffer;
+            std::ostream& stream = buffer;
+            const std::locale locale(std::locale::classic(), new ObservedDigits(isDestroyed));
+            if (isSetInStream)
+                stream.imbue(locale);
+            else
+                stream.rdbuf()->pubimbue(locale);
+        }
+        EXPECT_TRUE(isDestroyed) << isSetInStream;
+    }
+}
+
+// The events that a callback on the stream of a message buffer was called for.
+std::vector<std::ios_base::event>& streamEvents()
+{
+    static std::vector<std::ios_base::event> events;
+    return events;
+}
+
+TEST(MessageBuffer, ForgetsTheWordsAndCallbacksOfTheBufferBefore)
+{
+    const int near = std::ios_base::xalloc();
+    int far = near;
+    while (far < near + 100)  // a stream has the first words in itself and allocates the others
+        far = std::ios_base::xalloc();
+    int object = 0;
+    for (const int index : {near, far}) {
+        for (const bool hasNumber : {true, false}) {
+            {
+                VXLog::VXMessageBuffer buffer;
+                std::ostream& stream = buffer;
+                if (hasNumber)
+                    stream.iword(index) = 1;
+                else
+                    stream.pword(index) = &object;
+            }
+            VXLog::VXMessageBuffer buffer;
+            std::ostream& stream = buffer;
+            EXPECT_EQ(stream.iword(index), 0);
+            EXPECT_EQ(stream.pword(index), nullptr);
+        }
+    }
+
+    streamEvents().clear();
+    const auto callback = [](std::ios_base::event event, std::ios_base&, int) {
+        streamEvents().push_back(event);
+    };
+    {
+        VXLog::VXMessageBuffer buffer;
+        static_cast<std::ostream&>(buffer).register_callback(callback, 0);
+    }
+    // The last call is the one before the code of the callback may be unloaded.
+    EXPECT_THAT(streamEvents(), testing::ElementsAre(std::ios_base::erase_event));
+    {
+        VXLog::VXMessageBuffer buffer;
+        static_cast<std::ostream&>(buffer).imbue(groupingLocale());
+    }
+    EXPECT_THAT(streamEvents(), testing::ElementsAre(std::ios_base::erase_event));
+}
+
+TEST(MessageBuffer, KeepsAStreamForTheNextBuffer)
+{
+    const void* first = nullptr;
+    {
+        VXLog::VXMessageBuffer buffer;
+        first = &static_cast<std::ostream&>(buffer << "used");
+    }
+    VXLog::VXMessageBuffer buffer;
+    EXPECT_EQ(&static_cast<std::ostream&>(buffer), first);
+}
+
 TEST(MessageBuffer, MayBeUsedWhileAnotherIsInUse)
 {
     VXLog::VXMessageBuffer outer;

@@ -3,6 +3,7 @@
 #include <array>
 #include <charconv>
 #include <cstddef>
+#include <cstring>
 #include <iterator>
 #include <locale>
 #include <mutex>
@@ -18,8 +19,11 @@ namespace {
 class TextBuffer : public std::streambuf {
 public:
     std::string text;
+    bool isImbued = false;  // with another locale than the classic one
 
 protected:
+    void imbue(const std::locale& locale) override { isImbued = locale != std::locale::classic(); }
+
     int_type overflow(int_type character) override
     {
         if (!traits_type::eq_int_type(character, traits_type::eof()))
@@ -31,6 +35,27 @@ protected:
     {
         text.append(characters, static_cast<std::size_t>(count));
         return count;
+    }
+};
+
+// A stream that knows whether its user attached callbacks to it, or words (iword, pword).
+class Stream : public std::ostream {
+public:
+    explicit Stream(std::streambuf* buffer) : std::ostream(buffer) { }
+
+    // Releases what is attached, and returns true; or returns false, if only the destructor releases it.
+    bool detach()
+    {
+#ifdef __GLIBCXX__
+        // Reads members of libstdc++, because its swap looks up six facets: that costs as much as writing a record.
+        static constexpr unsigned char unused[sizeof _M_local_word] {};
+        return _M_callbacks == nullptr && _M_word == _M_local_word
+            && std::memcmp(_M_local_word, unused, sizeof unused) == 0;
+#else
+        std::ios fresh(nullptr);
+        std::ios::swap(fresh);
+        return true;
+#endif
     }
 };
 
@@ -46,9 +71,12 @@ struct VXMessageBuffer::Composer {
         stream.exceptions(std::ios_base::badbit);
     }
 
-    // Restores the initial state, but keeps the memory of texts of ordinary length.
-    void reset()
+    // Restores the initial state, but keeps the memory of texts of ordinary length. Returns false if the composer cannot
+    // be used again: what its user attached may belong to a plug-in, and must not outlive the buffer.
+    bool reset()
     {
+        if (!stream.detach())
+            return false;
         constexpr std::size_t ordinaryLength = 4096;
         for (std::string* text : {&buffer.text, &taken}) {
             text->clear();
@@ -58,12 +86,13 @@ struct VXMessageBuffer::Composer {
         stream.rdbuf(&buffer);  // clears the error state too
         stream.exceptions(std::ios_base::badbit);
         stream.tie(nullptr);
-        if (stream.getloc() != std::locale::classic())
+        if (buffer.isImbued || stream.getloc() != std::locale::classic())
             stream.imbue(std::locale::classic());
         stream.flags(std::ios_base::dec | std::ios_base::skipws);
         stream.precision(6);
         stream.width(0);
         stream.fill(' ');
+        return true;
     }
 
     // Returns a kept composer, which now belongs to the caller, or null if none is kept.
@@ -73,7 +102,7 @@ struct VXMessageBuffer::Composer {
     static bool keep(Composer* composer);
 
     TextBuffer buffer;
-    std::ostream stream;
+    Stream stream;
     std::string taken;
 
 private:
@@ -126,8 +155,7 @@ VXMessageBuffer::VXMessageBuffer() : composer_(Composer::takeKept())
 
 VXMessageBuffer::~VXMessageBuffer()
 {
-    composer_->reset();
-    if (!Composer::keep(composer_))
+    if (!composer_->reset() || !Composer::keep(composer_))
         delete composer_;
 }
 

@@ -25,7 +25,8 @@ public:
     std::ostream& operator<<(unsigned int number);
     std::ostream& operator<<(double number);
 
-    // The stream that the pieces are written to.
+    // The stream that the pieces are written to. Its settings, locale, words (iword, pword) and callbacks end with the
+    // buffer: the destructor calls the callbacks with erase_event.
     operator std::ostream&();
 
     // Returns what was composed since the last call of str. `last` is what the last insertion returned. The
