@@ -17,6 +17,7 @@
 #include <type_traits>
 #include <vector>
 
+#include "VXLog/Printable.h"
 #include "VXLog/RecordSink.h"
 #include "VXLog/VXLogger.h"
 #include "VXLog/VXMessageBuffer.h"
@@ -515,6 +516,12 @@ TEST_F(Sink, TheReturnedDefaultCanBeCalled)
     EXPECT_THAT(standardError([] { log("passed on"); }), testing::EndsWith(": passed on\n"));
 }
 
+TEST_F(Sink, MayCallTheDefaultSink)
+{
+    VXLog::setRecordSink([](const VXLog::Record& record) { VXLog::standardErrorSink(record); });
+    EXPECT_THAT(standardError([] { log("passed on"); }), testing::EndsWith(" work: passed on\n"));
+}
+
 TEST_F(Sink, ExceptionsPropagateToTheCallerOfTheLogger)
 {
     VXLog::setRecordSink([](const VXLog::Record&) { throw std::length_error("full"); });
@@ -616,6 +623,7 @@ TEST_F(Sink, EscapesWhatCouldForgeALineOrDriveATerminal)
         SCOPED_TRACE(row.written);
         EXPECT_THAT(standardError([&] { log(row.text); }),
                     testing::EndsWith(std::string(" work: ") + row.written + "\n"));
+        EXPECT_EQ(VXLog::printable(row.text), row.written);
     }
 }
 

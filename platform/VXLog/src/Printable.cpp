@@ -1,4 +1,4 @@
-#include "Printable.h"
+#include "VXLog/Printable.h"
 
 #include <algorithm>
 #include <cstddef>

@@ -9,15 +9,13 @@
 #include <utility>
 
 #include "Locks.h"
-#include "Printable.h"
+#include "VXLog/Printable.h"
 #include "VXLog/RecordSink.h"
 #include "ZQ/DateTime.h"
 
 namespace VXLog {
 
-namespace {
-
-void writeLine(const Record& record)
+void standardErrorSink(const Record& record)
 {
     const bool trace = record.kind == Record::Kind::trace;
     if (trace && std::getenv("VXLOG_TRACE") == nullptr)
@@ -35,9 +33,11 @@ void writeLine(const Record& record)
     pthread_setcancelstate(before, nullptr);
 }
 
+namespace {
+
 // The sink of the program. Calls in progress share it, so they can finish after it is replaced.
 struct Current {
-    std::shared_ptr<const RecordSink> sink = std::make_shared<const RecordSink>(writeLine);
+    std::shared_ptr<const RecordSink> sink = std::make_shared<const RecordSink>(standardErrorSink);
 };
 
 // Initialised before the program's own objects at namespace scope, and destroyed after them.
@@ -58,7 +58,7 @@ void pass(const Record& record)
 
 RecordSink setRecordSink(RecordSink sink)
 {
-    auto next = std::make_shared<const RecordSink>(sink ? std::move(sink) : RecordSink(writeLine));
+    auto next = std::make_shared<const RecordSink>(sink ? std::move(sink) : RecordSink(standardErrorSink));
     for (;;) {
         const auto before = currentSink();
         RecordSink copy = *before;  // outside the lock: copying runs the program's code and may throw

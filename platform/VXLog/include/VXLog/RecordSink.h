@@ -34,19 +34,23 @@ struct Record {
     NotCopied notCopied = NotCopied();
 };
 
+// The lowest level of the records that report a failure.
+inline constexpr int failureLevel = 6000;
+
 // Receives every record on the thread that writes it; several threads may call it at the same time. It may write
 // records itself and may replace the sink. If it throws, the exception propagates from the logging call.
 using RecordSink = std::function<void(const Record&)>;
 
-// Replaces the sink of the whole program and returns the previous one. An empty `sink` restores the default sink.
-// Thread-safe; a call of the previous sink that has begun runs to its end. If copying the previous sink throws or
-// memory runs out, the exception propagates and the previous sink stays.
-//
-// The default sink writes each log record to standard error as one line: time, level, category, file and line,
-// function, text. It escapes control and format characters, separators of lines and paragraphs, backslashes and bytes
-// that are not UTF-8, so no text can forge a line, control a terminal, or reorder or hide characters. It writes trace
-// records only while the environment variable VXLOG_TRACE is set, with the word "trace" after the level.
+// Replaces the sink of the whole program and returns the previous one. An empty `sink` restores the default sink,
+// standardErrorSink. Thread-safe; a call of the previous sink that has begun runs to its end. If copying the previous
+// sink throws or memory runs out, the exception propagates and the previous sink stays.
 RecordSink setRecordSink(RecordSink sink);
+
+// The default sink: writes each log record to standard error as one line: time, level, category, file and line,
+// function, text. It escapes control and format characters, separators of lines and paragraphs, backslashes and bytes
+// that are not UTF-8 (Printable.h), so no text can forge a line, control a terminal, or reorder or hide characters. It
+// writes trace records only while the environment variable VXLOG_TRACE is set, with the word "trace" after the level.
+void standardErrorSink(const Record& record);
 
 }  // namespace VXLog
 

@@ -3,6 +3,8 @@
 #include <string>
 #include <string_view>
 
+#pragma GCC visibility push(default)
+
 namespace VXLog {
 
 // Returns the text in a form that stays on one line, cannot control a terminal, and shows every character in the order
@@ -12,3 +14,5 @@ namespace VXLog {
 std::string printable(std::string_view text);
 
 }  // namespace VXLog
+
+#pragma GCC visibility pop
