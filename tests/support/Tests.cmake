@@ -23,9 +23,9 @@ target_precompile_headers(test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
 
 # The tests that ThreadSanitizer can check.
 add_custom_target(threads_tests)
-set(with_threads SharedNodes FirstUse Fork Cancellation Unload)
+set(with_threads SharedNodes FirstUse Fork Cancellation Unload SpdlogSink)
 if(NOT CMAKE_CXX_COMPILER_ID STREQUAL "Clang")  # these replace operator new, as clang's ThreadSanitizer does
-    list(APPEND with_threads Alert Failure Node Platform)
+    list(APPEND with_threads Alert Failure JournalSink Node Platform)
 endif()
 
 # Adds the test NAME_test.cpp, linked with the further arguments.

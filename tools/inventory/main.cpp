@@ -11,7 +11,7 @@
 #include <iostream>
 #include <tuple>
 
-#include "VXLog/RecordSink.h"
+#include "VXLog/SpdlogSink.h"
 #include "alerts.h"
 #include "comparing.h"
 #include "reading.h"
@@ -31,13 +31,7 @@ void connectLog()
     spdlog::set_default_logger(spdlog::stderr_color_mt(program_invocation_short_name));
     spdlog::set_pattern("%Y-%m-%dT%H:%M:%S.%e %^%l%$ %v");
     spdlog::cfg::load_env_levels();
-    VXLog::setRecordSink([](const VXLog::Record& record) {
-        constexpr int failureLevel = 6000;
-        const auto level = record.kind == VXLog::Record::Kind::trace ? spdlog::level::trace
-            : record.level >= failureLevel                           ? spdlog::level::err
-                                                                     : spdlog::level::info;
-        spdlog::log(level, "{} {}: {}", record.logger, record.function, printable(record.message));
-    });
+    VXLog::setRecordSink(VXLog::SpdlogSink(spdlog::default_logger()));
 }
 
 // The text as a value of the stored value's kind. Writable properties hold texts or real numbers.

@@ -1,0 +1,54 @@
+#pragma once
+
+#include <spdlog/logger.h>
+
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <utility>
+
+#include "VXLog/Printable.h"
+#include "VXLog/RecordSink.h"
+
+namespace VXLog {
+
+// A sink that passes each record to a logger of spdlog.
+//
+//   VXLog::setRecordSink(VXLog::SpdlogSink(spdlog::default_logger()));
+//
+// The level is error for level 6000 and above, otherwise info; it is trace for a trace record. The message is the
+// category, the function and the text, "Vexilon.IC.Node setProperty: setProperty: 1 read-only", escaped as
+// standardErrorSink escapes it. spdlog's place in the source is the record's.
+//
+// Several threads may call one sink if the logger allows it, as those whose names end in _mt do. What the logger throws
+// propagates. spdlog has locks: in a child of fork(), set another sink. A logger with a queue (spdlog::async_logger)
+// keeps the pointers to the names of file and function; in the library's records these are literals.
+//
+// Optional: no other header includes this one. Link IC::VXLog and spdlog (Debian's libspdlog-dev) yourself.
+class SpdlogSink {
+public:
+    // Throws std::invalid_argument if there is no logger.
+    explicit SpdlogSink(std::shared_ptr<spdlog::logger> logger) : logger_(std::move(logger))
+    {
+        if (!logger_)
+            throw std::invalid_argument("VXLog::SpdlogSink: there is no logger");
+    }
+
+    void operator()(const Record& record) const
+    {
+        const auto level = record.kind == Record::Kind::trace ? spdlog::level::trace
+            : record.level >= failureLevel                    ? spdlog::level::err
+                                                              : spdlog::level::info;
+        if (!logger_->should_log(level) && !logger_->should_backtrace())
+            return;
+        const std::string text =
+            printable(record.logger) + ' ' + printable(record.function) + ": " + printable(record.message);
+        logger_->log(spdlog::source_loc(record.file, record.line, record.function), level,
+                     spdlog::string_view_t(text.data(), text.size()));
+    }
+
+private:
+    std::shared_ptr<spdlog::logger> logger_;
+};
+
+}  // namespace VXLog
