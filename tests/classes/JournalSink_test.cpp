@@ -64,7 +64,7 @@ std::string separate()
                != 0) {  // with the threads of a sanitizer only this is possible, and only as root
         return std::string("no mount namespace: ") + std::strerror(errno);
     }
-    if (mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0
+    if (mount("none", "/", "none", MS_REC | MS_PRIVATE, nullptr) != 0
         || mount("tmpfs", "/run", "tmpfs", 0, nullptr) != 0
         || mount("tmpfs", "/var/log", "tmpfs", 0, nullptr) != 0)
         return std::string("no mounts: ") + std::strerror(errno);

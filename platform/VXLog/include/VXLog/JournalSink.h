@@ -15,34 +15,36 @@
 
 namespace VXLog {
 
-// A sink that writes each record to the systemd journal.
-//
-//   VXLog::setRecordSink(VXLog::JournalSink());
-//
-// An entry has these fields, each with the bytes of the record, whatever they are:
-//
-//   MESSAGE             the message
-//   PRIORITY            3 (err) for level 6000 and above, otherwise 6 (info); 7 (debug) for a trace record
-//   CODE_FILE           the file
-//   CODE_LINE           its line
-//   CODE_FUNC           the function
-//   SYSLOG_IDENTIFIER   the identifier
-//   VXLOG_CATEGORY      the category
-//   VXLOG_LEVEL         the level
-//
-// standardErrorSink receives each record that libsystemd cannot send, so also where no journal runs. The call waits
-// while the queue of the journal is full, and a cancellation waits until the call ends. It throws only std::bad_alloc.
-// Any number of threads may call one sink; it holds no lock, so a child of fork() may use it.
-//
-// Optional: no other header includes this one. Link IC::VXLog and libsystemd (Debian's libsystemd-dev, pkg-config's
-// libsystemd) yourself.
+/// A sink that writes each record to the systemd journal.
+///
+///     VXLog::setRecordSink(VXLog::JournalSink());
+///
+/// An entry has these fields, each with the bytes of the record, whatever they are:
+///
+///     MESSAGE             the message
+///     PRIORITY            3 (err) for level 6000 and above, otherwise 6 (info); 7 (debug) for a trace record
+///     CODE_FILE           the file
+///     CODE_LINE           its line
+///     CODE_FUNC           the function
+///     SYSLOG_IDENTIFIER   the identifier
+///     VXLOG_CATEGORY      the category
+///     VXLOG_LEVEL         the level
+///
+/// If a record cannot be sent, for example because no journal runs, the sink passes it to standardErrorSink. Several
+/// threads may call one sink. It has no lock, so a child of fork() may call it too.
+///
+/// Optional: no other header includes this one. Link IC::VXLog and libsystemd (Debian's libsystemd-dev, pkg-config's
+/// libsystemd) yourself.
 class JournalSink {
 public:
-    // The identifier is the name of the program without its folders.
+    /// The identifier is the name of the program without its folders.
     JournalSink() : JournalSink(program_invocation_short_name) { }
 
+    /// The identifier can have any bytes.
     explicit JournalSink(std::string identifier) : identifier_(std::move(identifier)) { }
 
+    /// Sends the record. Waits while the queue of the journal is full; a cancellation of the thread takes effect after
+    /// the record is sent. Throws only std::bad_alloc; then the record is not sent.
     void operator()(const Record& record) const
     {
         std::array<std::string, 8> fields {"MESSAGE=" + record.message,
