@@ -22,6 +22,7 @@ namespace IC {
 
 namespace detail {
 class Text;
+struct JsonAccess;
 struct Visit;
 }
 
@@ -170,6 +171,7 @@ private:
     friend bool operator>(const Number& a, const Number& b);
     friend struct std::hash<Number>;
     friend class detail::Text;
+    friend struct detail::JsonAccess;
     friend struct detail::Visit;
 
     struct Tag { };

@@ -18,6 +18,7 @@
 namespace IC {
 
 namespace detail {
+struct JsonAccess;
 struct Visit;
 }
 
@@ -170,6 +171,7 @@ private:
     friend bool operator<(const PropertyValue& a, const PropertyValue& b);
     friend bool operator>(const PropertyValue& a, const PropertyValue& b);
     friend struct std::hash<PropertyValue>;
+    friend struct detail::JsonAccess;
     friend struct detail::Visit;
 
     // Owns the object.

@@ -13,6 +13,19 @@ macro(ic_compile_quickly)
     add_compile_options(${quick_options})
 endmacro()
 
+# nlohmann/json for the tests of IC/json.h. Its headers fit every machine, but the folder around them has those of this
+# machine: a cross compiler gets a folder with them alone.
+find_package(nlohmann_json 3.11 QUIET)
+if(NOT nlohmann_json_FOUND)
+    message(STATUS "IC: IC/json.h is not tested: the Debian package nlohmann-json3-dev is missing")
+elseif(CMAKE_CROSSCOMPILING)
+    get_target_property(json_folder nlohmann_json::nlohmann_json INTERFACE_INCLUDE_DIRECTORIES)
+    file(MAKE_DIRECTORY ${PROJECT_BINARY_DIR}/nlohmann)
+    file(CREATE_LINK ${json_folder}/nlohmann ${PROJECT_BINARY_DIR}/nlohmann/nlohmann SYMBOLIC)
+    set_target_properties(nlohmann_json::nlohmann_json PROPERTIES
+        INTERFACE_INCLUDE_DIRECTORIES ${PROJECT_BINARY_DIR}/nlohmann)
+endif()
+
 # Precompiles GoogleTest's headers for all tests, with their options: compilers refuse a header compiled with others.
 # The preset `clang` turns this off, so that each test must include all it uses.
 add_executable(test_headers ${CMAKE_CURRENT_LIST_DIR}/GoogleTest.cpp)  # an executable, because its users are
