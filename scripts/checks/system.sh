@@ -95,7 +95,7 @@ clean() {
         kill -KILL ${first:-"$running"} || :
         wait "$running" || :
     fi
-    rm -rf --one-file-system "$system" "$work/temporary"
+    rm -rf --one-file-system "$system" "$work/temporary" "$work/archives/partial"
 }
 
 # inside COMMAND...: runs a command in the system as root.
