@@ -26,3 +26,4 @@ print *(IC::PropertyValue*)&damaged.damagedNumbers
 print *(IC::PropertyValue*)&damaged.damagedTexts
 with print elements 1 -- print shown.buffer
 with print elements 1 -- print shown.numbers
+print version

@@ -152,10 +152,10 @@ private:
     static inline const void* const unreadable = reinterpret_cast<const void*>(16);
 };
 
-// Keeps both objects in memory at any level of optimisation.
-[[gnu::noinline]] void stop(const Shown& shown, const Damaged& damaged)
+// Keeps both objects in memory and the version in a register at any level of optimisation.
+[[gnu::noinline]] void stop(const Shown& shown, const Damaged& damaged, IC::Version2 version)
 {
-    asm volatile("" : : "r"(&shown), "r"(&damaged) : "memory");
+    asm volatile("" : : "r"(&shown), "r"(&damaged), "r"(version.major), "r"(version.minor) : "memory");
 }
 
 }  // namespace
@@ -164,6 +164,6 @@ int main()
 {
     const Shown shown;
     const Damaged damaged;
-    stop(shown, damaged);
+    stop(shown, damaged, shown.version);
     return 0;
 }
