@@ -8,7 +8,9 @@ namespace VXLog {
 
 // Writes records: each call passes one to the current sink (RecordSink.h) on the calling thread.
 //
-// Thread-safe. A child of fork() may write records too, whatever the other threads of its parent were doing.
+// Thread-safe. A child of fork() may write records too, whatever the other threads of its parent were doing, if the
+// global locale is the classic one. Under another global locale, composing a record may ask for that locale, and the
+// child may wait for ever for the standard library's lock if another thread was asking for it at the time of the fork.
 // If the sink throws, the exception propagates to the caller.
 class __attribute__((visibility("default"))) VXLogger {
 public:
