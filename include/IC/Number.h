@@ -160,7 +160,8 @@ public:
     /// As a fresh std::ostringstream writes it under the global locale: "unknown", "true", digits, a real with six
     /// significant digits, "not a number", "infinity", "2.15", a date-time, "CPU:7", "invalid". A sensor type above
     /// 74 takes the name of entry 74. Milliseconds never show; if they are no multiple of 10, the text ends with
-    /// ".Conversion failed remainder>0" and a record is written (deliberate). Nothing is refused.
+    /// ".Conversion failed remainder>0" and a record is written (deliberate). Nothing is refused. Under the classic
+    /// locale a real is rounded to the nearest text, also where a stream would follow std::fesetround.
     operator std::string() const;
 
     ///@}

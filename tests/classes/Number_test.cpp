@@ -1,5 +1,6 @@
 #include <algorithm>
 #include <array>
+#include <cfenv>
 #include <cmath>
 #include <cstddef>
 #include <cstring>
@@ -1757,6 +1758,41 @@ private:
         return std::copy(text.begin(), text.end(), out);
     }
 };
+
+// Sets the thread's rounding mode for the lifetime of the object.
+class RoundingMode {
+public:
+    explicit RoundingMode(int mode) : before_(std::fegetround()) { EXPECT_EQ(std::fesetround(mode), 0); }
+    ~RoundingMode() { std::fesetround(before_); }
+    RoundingMode(const RoundingMode&) = delete;
+    RoundingMode& operator=(const RoundingMode&) = delete;
+
+private:
+    int before_;
+};
+
+TEST(NumberText, OfARealFollowsTheRoundingModeOnlyUnderAnotherLocaleThanTheClassicOne)
+{
+    const struct {
+        double real;
+        const char* classic;
+        const char* downward;
+        const char* upward;
+    } rows[] = {{1.0 / 3, "0.333333", "0,333333", "0,333334"},
+                {2.0 / 3, "0.666667", "0,666666", "0,666667"},
+                {-2.0 / 3, "-0.666667", "-0,666667", "-0,666666"},
+                {1234567.0, "1.23457e+06", "1,23456e+06", "1,23457e+06"},
+                {1e22 / 3, "3.33333e+21", "3,33333e+21", "3,33334e+21"}};
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.classic);
+        for (const bool isUpward : {false, true}) {
+            const RoundingMode mode(isUpward ? FE_UPWARD : FE_DOWNWARD);
+            EXPECT_EQ(std::string(Number(row.real)), row.classic);
+            const GlobalLocale locale(decimalComma());
+            EXPECT_EQ(std::string(Number(row.real)), isUpward ? row.upward : row.downward);
+        }
+    }
+}
 
 TEST(NumberText, UsesTheNumberFacetOfTheGlobalLocale)
 {

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <cfenv>
 #include <chrono>
 #include <cstdlib>
 #include <ctime>
@@ -271,6 +272,20 @@ TEST(MessageBuffer, IgnoresTheGlobalLocale)
     const GlobalGroupingLocale grouping;
     VXLog::VXMessageBuffer buffer;
     EXPECT_EQ(buffer.str(buffer << "" << 1234567u << " " << 1.5), "1234567 1.5");
+}
+
+TEST(MessageBuffer, RoundsRealsToTheNearestTextInAnyRoundingMode)
+{
+    const int before = std::fegetround();
+    for (const int mode : {FE_UPWARD, FE_DOWNWARD}) {
+        ASSERT_EQ(std::fesetround(mode), 0);
+        VXLog::VXMessageBuffer buffer;
+        const std::string third = buffer.str(buffer << "" << 1.0 / 3);
+        const std::string twoThirds = buffer.str(buffer << "" << 2.0 / 3);
+        std::fesetround(before);
+        EXPECT_EQ(third, "0.333333");
+        EXPECT_EQ(twoThirds, "0.666667");
+    }
 }
 
 TEST(MessageBuffer, StartsWithDefaultSettingsAfterABufferThatChangedThem)

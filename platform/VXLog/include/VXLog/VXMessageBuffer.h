@@ -21,7 +21,8 @@ public:
 
     VXMessageBuffer& operator<<(const char* text);
 
-    // In decimal, and in at most six significant digits as printf's %g writes them; manipulators have no effect.
+    // In decimal, and in at most six significant digits as printf's %g writes them. Manipulators have no effect, nor
+    // has the rounding mode of the thread (std::fesetround).
     std::ostream& operator<<(unsigned int number);
     std::ostream& operator<<(double number);
 
