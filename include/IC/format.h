@@ -2,9 +2,8 @@
 
 #include <version>
 
-#if !defined(__cpp_lib_format)
-#error "IC/format.h needs C++20 and a standard library that has <format>; IC/fmt.h needs neither"
-#else
+// Without std::format this header declares nothing, so that a build may include every header.
+#if defined(__cpp_lib_format)
 
 #include <concepts>
 #include <format>
@@ -45,8 +44,10 @@ namespace std {
 ///
 ///     std::cout << std::format("speed {:>6}\n", IC::Number(3600u));   // speed   3600
 ///
-/// Optional: no other header includes this one. Without `<format>` in the standard library, including it is an error:
-/// test __cpp_lib_format first, or use IC/fmt.h.
+/// Optional: no other header includes this one. std::format needs C++20 and a standard library that has it: libstdc++
+/// 13 or libc++ 17. Elsewhere this header declares nothing, and the compiler reports std::format itself: "'format' is
+/// not a member of 'std'" (g++), "no member named 'format' in namespace 'std'" (clang++). To compile on both, test
+/// `defined(__cpp_lib_format)` after including this header; or use IC/fmt.h, which needs neither.
 template <>
 struct formatter<IC::Number> : IC::detail::FormatText<IC::Number> {
 };

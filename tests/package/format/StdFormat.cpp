@@ -7,9 +7,9 @@
 #include <string_view>
 #include <vector>
 
-#include "../Texts.h"
+#include "Texts.h"
 
-// Without GoogleTest, which is built with a standard library that lacks <format>.
+// Without GoogleTest, which Debian builds with a standard library that may lack <format>.
 
 namespace {
 
