@@ -84,7 +84,7 @@ private:
 
     StatusType status_ = STATUS_SUCCESS;
     Number value_;
-    std::string message_;
+    std::string message_ = std::string();  // g++'s -Weffc++ asks for an initialiser
 };
 
 /// @relates Error

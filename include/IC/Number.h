@@ -181,7 +181,9 @@ private:
         long seconds;
         ZQ::Uint16 milliseconds;
         ZQ::Uint8 scope;
+        ZQ::Uint8 unused[sizeof(long) - 3];  // 0; padding would be undefined
     };
+    static_assert(sizeof(DateTimeFields) == 2 * sizeof(long));
     static constexpr ZQ::Uint8 defaultScope = 3;
 
     inline Number(Tag, KindType kind) noexcept;

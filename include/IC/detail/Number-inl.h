@@ -121,12 +121,9 @@ inline void Number::store(const T& content) noexcept
     std::memcpy(value_, &content, sizeof content);
 }
 
-// Field by field: copying the whole struct would copy its undefined padding.
 inline void Number::storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept
 {
-    std::memcpy(value_ + offsetof(DateTimeFields, seconds), &seconds, sizeof seconds);
-    std::memcpy(value_ + offsetof(DateTimeFields, milliseconds), &milliseconds, sizeof milliseconds);
-    std::memcpy(value_ + offsetof(DateTimeFields, scope), &scope, sizeof scope);
+    store(DateTimeFields {seconds, milliseconds, scope, {}});
 }
 
 // Differs from the unsigned conversion only in its name in the records.

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <array>
 #include <ostream>
 #include <string>
 
@@ -19,9 +20,9 @@ namespace IC {
 
 inline void PrintTo(const Number& number, std::ostream* out)
 {
-    static constexpr const char* names[] = {"KIND_UNKNOWN", "KIND_BOOL",     "KIND_INT",    "KIND_UINT32",
-                                            "KIND_UINT64",  "KIND_REAL",     "KIND_NAN",    "KIND_INFINITY",
-                                            "KIND_VERSION", "KIND_DATETIME", "KIND_NODEREF"};
+    static constexpr std::array names {"KIND_UNKNOWN", "KIND_BOOL",     "KIND_INT",    "KIND_UINT32",
+                                       "KIND_UINT64",  "KIND_REAL",     "KIND_NAN",    "KIND_INFINITY",
+                                       "KIND_VERSION", "KIND_DATETIME", "KIND_NODEREF"};
     const ZQ::Uint32 kind = number.getKind();
     if (kind > Number::KIND_NODEREF)
         *out << "kind " << kind;
@@ -38,9 +39,8 @@ inline void PrintTo(const EnumValue& value, std::ostream* out)
 
 inline void PrintTo(const PropertyValue& value, std::ostream* out)
 {
-    static constexpr const char* names[] = {"KIND_UNKNOWN",    "KIND_NUMBER",    "KIND_STRING",
-                                            "KIND_BUFFER",     "KIND_ENUMVALUE", "KIND_NUMBERARRAY",
-                                            "KIND_STRINGARRAY"};
+    static constexpr std::array names {"KIND_UNKNOWN",   "KIND_NUMBER",      "KIND_STRING",     "KIND_BUFFER",
+                                       "KIND_ENUMVALUE", "KIND_NUMBERARRAY", "KIND_STRINGARRAY"};
     const PropertyValue::KindType kind = value.getKind();
     *out << names[kind];
     const std::string text = value;  // "invalid" if the value has no object; a conversion would throw then

@@ -1,5 +1,5 @@
 // Systems define these macros; the header must work with them and leave them defined.
-#define major(device) static_cast<int>((device) >> 8)
+#define major(device) ((device) >> 8)
 #define minor 17
 
 #include "IC/Number.h"
