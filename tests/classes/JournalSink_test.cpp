@@ -198,6 +198,9 @@ protected:
                                          message);
     }
 
+    // Not inline: g++'s AddressSanitizer reports a cancelled thread whose outermost function has objects.
+    [[gnu::noinline]] static void logText() { log("text"); }
+
     static void trace(const std::string& message)
     {
         VXLog::VXLogger::traceLevelMessage("work", "Worker", 12, "Some.Category", 6000, nullptr, 0, 0,
@@ -396,7 +399,7 @@ TEST_F(JournalSink, SendsTheRecordBeforeACancellation)
     const Journal journal;
     const auto run = [](void*) -> void* {
         pthread_cancel(pthread_self());
-        log("text");
+        logText();
         pthread_testcancel();
         return nullptr;
     };
@@ -447,8 +450,12 @@ public:
             execl(program, program, nullptr);
             _exit(127);
         }
-        for (int i = 0; process_ > 0 && i < 300 && access(socketPath, F_OK) != 0; ++i)
+        for (int i = 0; process_ > 0 && i < 300 && !isReady_; ++i) {
+            if (waitpid(process_, nullptr, WNOHANG) != 0)
+                process_ = -1;
             std::this_thread::sleep_for(std::chrono::milliseconds(100));
+            isReady_ = !entriesIn(journalctl("SYSLOG_IDENTIFIER=systemd-journald")).empty();
+        }
     }
     ~Daemon()
     {
@@ -463,11 +470,9 @@ public:
     // Why it does not run, or "".
     std::string whyNot() const
     {
-        if (process_ <= 0)
+        if (access(program, X_OK) != 0)
             return "the Debian package systemd is missing";
-        if (access(socketPath, F_OK) != 0)
-            return "systemd-journald does not start here";
-        return "";
+        return isReady_ ? "" : "systemd-journald does not start here";
     }
 
     // The entries with this identifier, when there are `count` of them; what there is after half a minute.
@@ -487,7 +492,8 @@ private:
     static std::string journalctl(const std::string& matches)
     {
         const std::string command =
-            "journalctl --directory /run/log/journal --quiet --no-pager --output export " + matches;
+            "journalctl --directory /run/log/journal --quiet --no-pager --output export " + matches
+            + " 2>/dev/null";
         std::string text;
         FILE* const output = popen(command.c_str(), "r");
         if (output == nullptr)
@@ -501,6 +507,7 @@ private:
 
     static constexpr const char* program = "/lib/systemd/systemd-journald";
     pid_t process_ = -1;
+    bool isReady_ = false;
 };
 
 TEST_F(JournalSink, ReachesJournaldWithEveryField)
