@@ -257,9 +257,8 @@ TEST_F(InventoryDiff, ExitsWith2OnFailure)
         EXPECT_EQ(linesOf(outcome.err).size(), 1u);
         EXPECT_THAT(outcome.err, HasSubstr("broken.xml: not a machine that hwloc "));
     }
-    const Outcome full = runProgram(
-        {"sh", "-c",
-         "HWLOC_LIBXML=0 " INVENTORY_PROGRAM " --diff '" + before + "' '" + after + "' >/dev/full"});
+    const Outcome full =
+        runWithoutSpace({"env", "HWLOC_LIBXML=0", INVENTORY_PROGRAM, "--diff", before, after});
     EXPECT_EQ(full.status, 2);
     EXPECT_EQ(full.err, "inventory: the output cannot be written\n");
 }
@@ -470,7 +469,7 @@ TEST_F(InventoryWatch, FailsIfTheFirstReadingOrTheOutputFails)
     EXPECT_EQ(outcome.status, 2);
     EXPECT_EQ(outcome.out, "");
     EXPECT_THAT(outcome.err, HasSubstr("missing.xml: No such file or directory\n"));
-    outcome = runProgram({"sh", "-c", INVENTORY_PROGRAM " --watch 1 '" + file + "' >/dev/full"});
+    outcome = runWithoutSpace({INVENTORY_PROGRAM, "--watch", "1", file});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_EQ(outcome.err, "inventory: the output cannot be written\n");
 }

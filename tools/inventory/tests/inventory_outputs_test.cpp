@@ -1,7 +1,9 @@
 // The inventory's output on a terminal, as JSON and as a drawing; its command line and its manual.
 #include <gmock/gmock.h>
+#include <pty.h>
 
 #include <cmath>
+#include <cstring>
 #include <limits>
 #include <regex>
 #include <set>
@@ -59,14 +61,6 @@ protected:
         return runProgram(words);
     }
 
-    static Outcome runOnTerminal(const std::string& environment, const std::string& words)
-    {
-        return runProgram(
-            {"script", "-qec",
-             "env -u NO_COLOR TERM=xterm " + environment + ' ' + INVENTORY_PROGRAM + ' ' + words,
-             "/dev/null"});
-    }
-
     Folder folder;
     std::string file = folder.write(
         "machine.xml",
@@ -86,9 +80,30 @@ protected:
 
 // --- Terminals ---
 
-TEST_F(InventoryOutput, HasColoursAndLinesOnATerminal)
+class InventoryTerminal : public InventoryOutput {
+protected:
+    void SetUp() override
+    {
+        int ours = -1;
+        int its = -1;
+        if (openpty(&ours, &its, nullptr, nullptr, nullptr) != 0)
+            GTEST_SKIP() << "no pseudo-terminal can be opened: " << std::strerror(errno);
+        close(ours);
+        close(its);
+    }
+
+    static Outcome run(const std::vector<std::string>& environment, const std::vector<std::string>& words)
+    {
+        const std::vector<std::string> usual {"env", "-u", "NO_COLOR", "TERM=xterm"};
+        return runProgram({"env", "SHELL=/bin/sh", "script", "-qec",
+                           quoted(usual) + quoted(environment) + quoted({INVENTORY_PROGRAM}) + quoted(words),
+                           "/dev/null"});
+    }
+};
+
+TEST_F(InventoryTerminal, HasColoursAndLines)
 {
-    const Outcome outcome = runOnTerminal("LC_ALL=C.UTF-8", file);
+    const Outcome outcome = run({"LC_ALL=C.UTF-8"}, {file});
     EXPECT_EQ(outcome.status, 0);
     EXPECT_THAT(outcome.out,
                 StartsWith("\x1b[1mComputer\x1b[0m machine: One, CPUs: 0, cores: 0\r\n"
@@ -101,11 +116,11 @@ TEST_F(InventoryOutput, HasColoursAndLinesOnATerminal)
                            "  \x1b[33m/machine/dimm0, DIMM: its size is unknown\x1b[0m\r\n"));
 }
 
-TEST_F(InventoryOutput, HasNoColoursIfTheyAreTurnedOff)
+TEST_F(InventoryTerminal, HasNoColoursIfTheyAreTurnedOff)
 {
     for (const char* setting : {"NO_COLOR=1", "TERM=dumb"}) {
         SCOPED_TRACE(setting);
-        EXPECT_THAT(runOnTerminal(std::string("LC_ALL=C.UTF-8 ") + setting, file).out,
+        EXPECT_THAT(run({"LC_ALL=C.UTF-8", setting}, {file}).out,
                     StartsWith("Computer machine: One, CPUs: 0, cores: 0\r\n"
                                "├── Memory Array memory0\r\n"
                                "├── Disk Controller storage-0000:01:00.0: 8086:1d02\r\n"
@@ -115,12 +130,12 @@ TEST_F(InventoryOutput, HasNoColoursIfTheyAreTurnedOff)
                                "Alerts: 1\r\n"
                                "  /machine/dimm0, DIMM: its size is unknown\r\n"));
     }
-    EXPECT_THAT(runOnTerminal("LC_ALL=C.UTF-8 NO_COLOR=", file).out, StartsWith("\x1b[1mComputer"));
+    EXPECT_THAT(run({"LC_ALL=C.UTF-8", "NO_COLOR="}, {file}).out, StartsWith("\x1b[1mComputer"));
 }
 
-TEST_F(InventoryOutput, HasAsciiLinesIfTheTerminalIsNotUtf8)
+TEST_F(InventoryTerminal, HasAsciiLinesIfItIsNotUtf8)
 {
-    EXPECT_THAT(runOnTerminal("LC_ALL=C NO_COLOR=1", "--properties --log " + file).out,
+    EXPECT_THAT(run({"LC_ALL=C", "NO_COLOR=1"}, {"--properties", "--log", file}).out,
                 testing::MatchesRegex("Node 2f6d616368696e65 : 40, status = 0\r\n"
                                       "\\|     \\[1 = Computer:0\\] this node\r\n(.|\n)*"
                                       "\\|-- Node 2f6d616368696e652f6d656d6f727930 : 32, status = 0\r\n"
@@ -145,10 +160,10 @@ TEST_F(InventoryOutput, IsPlainTextInAPipe)
                            "  /machine/dimm0, DIMM: its size is unknown\n"));
 }
 
-TEST_F(InventoryOutput, HasColouredChangesOnATerminal)
+TEST_F(InventoryTerminal, HasColouredChanges)
 {
     const std::string other = folder.write("other.xml", machineOf(fact("DMIProductName", "Two")));
-    const Outcome outcome = runOnTerminal("LC_ALL=C", "--diff " + file + ' ' + other);
+    const Outcome outcome = run({"LC_ALL=C"}, {"--diff", file, other});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.out,
                 HasSubstr("  Computer /machine\r\n"
@@ -498,10 +513,11 @@ TEST_F(InventoryOutput, IsOneErrorLineForInvalidOptions)
 
 TEST_F(InventoryOutput, FailsIfItCannotBeWritten)
 {
-    for (const std::string& words :
-         {file, "--json " + file, std::string("--help"), std::string("--version")}) {
-        SCOPED_TRACE(words);
-        const Outcome full = runProgram({"sh", "-c", INVENTORY_PROGRAM " " + words + " >/dev/full"});
+    const std::vector<std::string> rows[] = {{file}, {"--json", file}, {"--help"}, {"--version"}};
+    for (std::vector<std::string> words : rows) {
+        SCOPED_TRACE(words.front());
+        words.insert(words.begin(), INVENTORY_PROGRAM);
+        const Outcome full = runWithoutSpace(words);
         EXPECT_EQ(full.status, 1);
         EXPECT_EQ(full.err, "inventory: the output cannot be written\n");
     }

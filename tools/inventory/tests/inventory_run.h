@@ -5,11 +5,13 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <string>
+#include <system_error>
 #include <vector>
 
 // A temporary folder, removed with this object.
@@ -19,7 +21,7 @@ public:
     {
         std::string name = (std::filesystem::temp_directory_path() / "inventoryXXXXXX").string();
         if (mkdtemp(name.data()) == nullptr)
-            throw std::runtime_error("no temporary folder");
+            throw std::system_error(errno, std::generic_category(), "no folder " + name);
         path_ = name;
     }
     ~Folder() { std::filesystem::remove_all(path_); }
@@ -32,7 +34,7 @@ public:
     {
         std::ofstream file(path_ / name, std::ios::binary);
         if (!(file << text).flush())
-            throw std::runtime_error("cannot write " + path(name));
+            throw std::system_error(errno, std::generic_category(), "cannot write " + path(name));
         return path(name);
     }
 
@@ -71,9 +73,9 @@ struct Outcome {
     std::string err;
 };
 
-inline Outcome runProgram(const std::vector<std::string>& words)
+// The words as a command of the shell.
+inline std::string quoted(const std::vector<std::string>& words)
 {
-    const Folder folder;
     std::string command;
     for (const std::string& word : words) {
         command += '\'';
@@ -81,10 +83,22 @@ inline Outcome runProgram(const std::vector<std::string>& words)
             command += character == '\'' ? "'\\''" : std::string(1, character);
         command += "' ";
     }
-    command += ">'" + folder.path("out") + "' 2>'" + folder.path("err") + "'";
-    const int status = std::system(command.c_str());
-    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentOf(folder.path("out")),
-            contentOf(folder.path("err"))};
+    return command;
+}
+
+inline Outcome runProgram(const std::vector<std::string>& words)
+{
+    const Folder folder;
+    const std::string out = folder.path("out");
+    const std::string err = folder.path("err");
+    const int status = std::system((quoted(words) + '>' + quoted({out}) + "2>" + quoted({err})).c_str());
+    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentOf(out), contentOf(err)};
+}
+
+// On a full device.
+inline Outcome runWithoutSpace(const std::vector<std::string>& words)
+{
+    return runProgram({"sh", "-c", quoted(words) + ">/dev/full"});
 }
 
 inline std::vector<std::string> linesOf(const std::string& text)

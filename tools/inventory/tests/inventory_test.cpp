@@ -892,7 +892,7 @@ TEST_F(InventoryProgram, RefusesBadInputInOneLine)
 
 TEST_F(InventoryProgram, ReportsThatItCannotWrite)
 {
-    const Outcome outcome = runProgram({"sh", "-c", INVENTORY_PROGRAM " '" + small + "' >/dev/full"});
+    const Outcome outcome = runWithoutSpace({INVENTORY_PROGRAM, small});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_EQ(outcome.err, "inventory: the output cannot be written\n");
 }
