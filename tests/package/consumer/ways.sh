@@ -82,12 +82,12 @@ pkg_config() {
         fail "the pkg-config module says that it is version 2"
     fi
     for variable in libdir="$library" includedir="$prefix/include"; do
-        folder=$(pkg-config --variable="${variable%%=*}" IC)
+        folder=$(pkg-config --variable="${variable%%=*}" IC | xargs)  # xargs removes the backslash before a blank
         [ "$(realpath "$folder")" = "$(realpath "${variable#*=}")" ] || fail "the module's ${variable%%=*} is $folder"
     done
-    # shellcheck disable=SC2046  # pkg-config prints a list of words
-    quietly "$1" -std="c++$2" -Wall -Wextra -Wpedantic -Werror "$here/main.cpp" -o "$work/program" \
-        $(pkg-config --cflags --libs ${3+"$3"} IC) -ldl
+    # pkg-config prints words of the shell.
+    eval "quietly \"\$1\" -std=c++$2 -Wall -Wextra -Wpedantic -Werror \"\$here/main.cpp\" -o \"\$work/program\" \
+        $(pkg-config --cflags --libs ${3+"$3"} IC) -ldl"
     check env LD_LIBRARY_PATH="$library" "$work/program"
     echo "pkg-config${3+ $3}, $library, $1, C++$2"
 }
