@@ -13,7 +13,7 @@ shift 3
 described=$description
 if [ "$command" = compare ]; then
     [ -f "$description" ] || { echo "no description $description; scripts/checks/refresh-abi writes it" >&2; exit 1; }
-    described=$(mktemp)
+    described=$PWD/$(basename "$library").abi
     trap 'rm -f "$described"' EXIT
 fi
 

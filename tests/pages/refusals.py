@@ -40,7 +40,7 @@ def pattern(text):
 
 def seen(program):
     """Yields the same, as texts, for each refusal that a test of the program expected."""
-    with tempfile.TemporaryDirectory() as folder:
+    with tempfile.TemporaryDirectory(dir=".") as folder:
         report = pathlib.Path(folder) / "report.xml"
         subprocess.run([program, "--gtest_brief=1", f"--gtest_output=xml:{report}"], check=True,
                        stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)  # fmt: skip
