@@ -23,6 +23,13 @@ Alert::Alert(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char aler
     init(timeStamp, severity, alertClass, std::move(nodePaths), status, std::move(message));
 }
 
+Alert::Alert(const ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
+             std::vector<std::string> nodePaths, unsigned int status, std::string message)
+{
+    ZQ::DateTime copy(timeStamp);
+    init(copy, severity, alertClass, std::move(nodePaths), status, std::move(message));
+}
+
 Alert::Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
              unsigned int status, std::string message)
 {

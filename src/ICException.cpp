@@ -2,6 +2,8 @@
 
 namespace IC {
 
+ICException::ICException() = default;
+
 ICException::ICException(const std::string& text) : message(text) { }
 
 ICException::~ICException() = default;

@@ -37,6 +37,9 @@ public:
     Alert(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
           std::vector<std::string> nodePaths, unsigned int status, std::string message);
 
+    Alert(const ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
+          std::vector<std::string> nodePaths, unsigned int status, std::string message);
+
     /// An event now, with the same checks. Reads the clock before them.
     Alert(unsigned char severity, unsigned char alertClass, std::vector<std::string> nodePaths,
           unsigned int status, std::string message);
@@ -71,6 +74,9 @@ public:
     /// The status of the nodes, 0 to 85, under two names.
     Node::StatusType getStatus() const noexcept { return status_; }
     operator Node::StatusType() const noexcept { return status_; }
+
+    /// Deleted: in C++20 `NodeRef x(alert);` would take a code for a sensor type.
+    explicit operator sNodeRef() const = delete;
 
     /// The paths of the nodes, in the order given.
     std::vector<std::string> getNodePaths() const { return nodePaths_; }

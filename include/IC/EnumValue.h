@@ -11,6 +11,8 @@
 
 namespace IC {
 
+struct sNodeRef;
+
 /// One member of an enumeration as a plain unsigned number; it does not know which enumeration.
 ///
 /// A trivially copyable value; one object belongs to one thread at a time. `std::hash` agrees with `==`. A refusal
@@ -78,6 +80,9 @@ public:
     {
         return static_cast<Enum>(as<std::underlying_type_t<Enum>>());
     }
+
+    /// Deleted: in C++20 `NodeRef x(value);` would take the value for a sensor type.
+    explicit operator sNodeRef() const = delete;
 
     ///@}
     /// @name Text

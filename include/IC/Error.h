@@ -65,6 +65,9 @@ public:
     Number getValue() const noexcept { return value_; }
     operator Number() const noexcept { return value_; }
 
+    /// Deleted: in C++20 `NodeRef x(error);` would take the status for a sensor type. Write `error.getValue()`.
+    explicit operator sNodeRef() const = delete;
+
     /// The text, empty if there is none.
     std::string getMessage() const { return message_; }
 

@@ -11,8 +11,9 @@ namespace IC {
 /// One object belongs to one thread at a time. Construction, copies and what() may throw std::bad_alloc.
 class IC_EXPORT ICException {
 public:
-    /// The message is `text`, or that of the exception copied. If a copy throws, nothing has changed.
-    explicit ICException(const std::string& text = std::string());
+    /// The message is empty, `text`, or that of the exception copied. If a copy throws, nothing has changed.
+    ICException();
+    explicit ICException(const std::string& text);
     ICException(const ICException&) = default;
     ICException& operator=(const ICException&) = default;
     virtual ~ICException();

@@ -172,6 +172,9 @@ public:
     SensorType getSensor() const noexcept { return sensor_; }
     operator SensorType() const noexcept { return sensor_; }
 
+    /// Deleted: in C++20 `NodeRef x(node);` would not have the number of the node.
+    explicit operator sNodeRef() const = delete;
+
     /// The node's own path, and its parent's.
     std::string getPath() const { return path; }
     std::string getParent() const { return parent; }

@@ -24,7 +24,7 @@ namespace detail {
 class Text;
 struct JsonAccess;
 struct Visit;
-}
+}  // namespace detail
 
 /// A version of two numbers. As a Number it prints as "2.15".
 struct IC_EXPORT Version2 {

@@ -42,7 +42,8 @@ using StringArray = std::vector<std::string>;
 ///     unsigned int rpm = speed;                  // 3600
 ///
 /// Deliberate:
-/// - An integer is a kind code: PropertyValue(5) is an empty array of numbers. Write PropertyValue(IC::Number(5)).
+/// - A byte is a kind code: PropertyValue(std::uint8_t {5}) is an empty array of numbers. So is an int, for which the
+///   compiler warns. Write PropertyValue(IC::Number(5)).
 /// - `IC::StringArray texts {value}` makes an array of one element: write `IC::StringArray texts = value`.
 /// - `value == Number(5u)` and `text = value` are ambiguous: write `value == PropertyValue(Number(5u))` and
 ///   `text = std::string(value)`. A literal compiles: `value == "AFB0812"`.
@@ -60,10 +61,19 @@ public:
     };
 
 private:
+    // What converts to a byte, and is neither a byte nor a kind. An int is the code of a kind, with a warning.
     template <class T>
-    static constexpr bool notAKind =
-        std::disjunction_v<std::is_same<T, bool>, std::is_floating_point<T>,
-                           std::conjunction<std::is_enum<T>, std::negation<std::is_same<T, KindType>>>>;
+    static constexpr bool notAKind = std::disjunction_v<
+        std::is_same<T, std::vector<bool>::reference>,
+        std::conjunction<std::is_enum<T>, std::negation<std::is_same<T, KindType>>>,
+        std::conjunction<
+            std::negation<std::disjunction<std::is_class<T>, std::is_enum<T>, std::is_same<T, unsigned char>,
+                                           std::is_same<T, int>>>,
+            std::is_convertible<T, unsigned char>>>;
+    template <class T>
+    static constexpr bool isMark = std::disjunction_v<std::is_same<std::remove_cv_t<T>, bool>,
+                                                      std::is_same<T, std::vector<bool>::reference>,
+                                                      std::is_same<T, std::vector<bool>::const_reference>>;
 
 public:
     /// @name Construction
@@ -90,10 +100,22 @@ public:
     PropertyValue(const unsigned char& kind, const bool& readOnly = false);
     PropertyValue(const KindType& kind, const bool& readOnly = false);
 
-    /// Deleted: flags, reals and other enumerations would become a kind code. Write Number(value) or
-    /// EnumValue(static_cast<unsigned int>(value)).
+    /// The same for an integer, of which the low 8 bits are the code of a kind. For the number write Number(value).
+    template <class T, std::enable_if_t<std::is_same_v<T, int>, int> = 0>
+    [[deprecated("an integer is a kind code: write Number(value), or a KindType")]] PropertyValue(
+        T kind, const bool& readOnly = false)
+        : PropertyValue(static_cast<unsigned char>(kind), readOnly)
+    {
+    }
+
+    /// Deleted: other integers, flags, reals and other enumerations would become a kind code. Write Number(value) or
+    /// EnumValue(value).
     template <class T, std::enable_if_t<notAKind<T>, int> = 0>
     PropertyValue(T, const bool& = false) = delete;
+
+    /// Deleted: a mark that is no bool, such as a text or a number, would be true. Write true or false.
+    template <class T, class Mark, std::enable_if_t<!isMark<Mark>, int> = 0>
+    PropertyValue(const T&, const Mark&) = delete;
 
     /// A copy has the source's mark. A moved-from value has the kind KIND_UNKNOWN and keeps its mark.
     inline PropertyValue(const PropertyValue& source);
@@ -152,8 +174,10 @@ public:
     inline operator NumberArray() const;
     inline operator StringArray() const;
 
-    /// Deleted: `int x = value;` would be a flag. Write `int x = value.operator IC::Number();`.
+    /// Deleted: `int x = value;` would be a flag, and in C++20 `NodeRef x(value);` would take a number for a sensor type.
+    /// Write `int x = value.operator IC::Number();`.
     operator int() const = delete;
+    explicit operator sNodeRef() const = delete;
 
     ///@}
     /// @name Text

@@ -195,6 +195,46 @@ TEST(Alert, DoesNotChangeTheCallersTimeStamp)
     EXPECT_EQ(partsOf(time), someTimeParts);
 }
 
+TEST(Alert, TakesATimeStampThatCannotChange)
+{
+    const ZQ::DateTime time = someTime();
+    const Alert alert(time, 2, 1, {"/a"}, 5, "Fan failed");
+    EXPECT_EQ(partsOf(alert.getTimeStamp()), someTimeParts);
+    EXPECT_EQ(alert.getSeverity(), 2);
+    EXPECT_EQ(alert.getClass(), 1);
+    EXPECT_EQ(alert.getNodePaths(), Paths {"/a"});
+    EXPECT_EQ(alert.getStatus(), 5u);
+    EXPECT_EQ(alert.getMessage(), "Fan failed");
+
+    observe::setClock(1234567890, 123);
+    const Alert now(ZQ::DateTime::now(), 0, 0, {}, 0, "");
+    EXPECT_EQ(partsOf(now.getTimeStamp()), (DateTimeParts {1234567890, 123, 3}));
+    EXPECT_EQ(observe::clockReadings(), 1);
+}
+
+TEST(Alert, RefusesCodesWithATimeStampThatCannotChange)
+{
+    expectRefusal<std::invalid_argument>([] { return Alert(someTime(), 4, 6, {}, 86, ""); }, "init", "Alert",
+                                         "Vexilon.IC.Alert", "init: Invalid severity type 4",
+                                         "Invalid severity type");
+    expectRefusal<std::invalid_argument>([] { return Alert(someTime(), 3, 6, {}, 86, ""); }, "init", "Alert",
+                                         "Vexilon.IC.Alert", "init: Invalid class type 6",
+                                         "Invalid class type");
+    expectRefusal<std::invalid_argument>([] { return Alert(someTime(), 3, 5, {}, 86, ""); }, "init", "Alert",
+                                         "Vexilon.IC.Alert", "init: Invalid status type 86",
+                                         "Invalid status type");
+}
+
+// Only the other constructor makes a copy of the time stamp.
+TEST(Alert, TakesATimeStampThatCanChangeByReference)
+{
+    ZQ::DateTime time = someTime();
+    observe::throwAt(observe::Call::dateTime, 3);  // after the default construction and the assignment
+    const Alert alert(time, 2, 1, {}, 5, "");
+    EXPECT_FALSE(observe::thrown());
+    EXPECT_THROW(Alert(std::as_const(time), 2, 1, {}, 5, ""), observe::Thrown);
+}
+
 TEST(Alert, ReturnsCopies)
 {
     const Alert alert = alertOf(0, 0, 0, "a message", {"/a"});

@@ -46,6 +46,7 @@ static_assert(std::has_virtual_destructor_v<ICException>);
 static_assert(!std::is_base_of_v<std::exception, ICException>);
 static_assert(std::is_default_constructible_v<ICException>);
 static_assert(std::is_constructible_v<ICException, const std::string&>);
+static_assert(!std::is_convertible_v<const std::string&, ICException>);
 static_assert(std::is_copy_constructible_v<ICException>);
 static_assert(std::is_copy_assignable_v<ICException>);
 static_assert(std::is_same_v<decltype(std::declval<const ICException&>().what()), std::string>);
@@ -100,6 +101,18 @@ std::string handlerOf(Operation operation)
         return "NodeInvalidSensor";
     }
     return "none";
+}
+
+ICException withoutAMessage()
+{
+    return {};
+}
+
+TEST(ExceptionClasses, ICExceptionIsInitialisedByEmptyBraces)
+{
+    const ICException exception = {};
+    EXPECT_EQ(exception.what(), "");
+    EXPECT_EQ(withoutAMessage().what(), "");
 }
 
 TEST(ExceptionClasses, ICExceptionWithoutAMessageHasAnEmptyText)

@@ -84,6 +84,33 @@ static_assert(!std::is_constructible_v<PropertyValue, IC::Alert::SeverityType>);
 static_assert(!std::is_constructible_v<PropertyValue, IC::Alert::ClassType>);
 static_assert(!std::is_constructible_v<PropertyValue, IC::Node::SensorType>);
 static_assert(!std::is_constructible_v<PropertyValue, IC::Node::StatusType, bool>);
+static_assert(!std::is_constructible_v<PropertyValue, std::vector<bool>::reference>);
+template <class... Integer>
+constexpr bool noneMakesProperty = (!std::is_constructible_v<PropertyValue, Integer> && ...)
+    && (!std::is_constructible_v<PropertyValue, Integer, bool> && ...);
+static_assert(noneMakesProperty<char, signed char, wchar_t, char16_t, char32_t, short, unsigned short,
+                                unsigned int, long, unsigned long, long long, unsigned long long>);
+static_assert(noneMakesProperty<const unsigned int&, unsigned int&>);
+static_assert(!std::is_assignable_v<PropertyValue&, unsigned int>);
+static_assert(makesProperty<int>);  // deprecated
+
+// As the mark, these would silently be true or false.
+template <class Mark>
+constexpr bool isMark = std::is_constructible_v<PropertyValue, const char*, Mark>;
+template <class Mark>
+constexpr bool isMarkOfAny = isMark<Mark> || std::is_constructible_v<PropertyValue, const std::string&, Mark> || std::is_constructible_v<PropertyValue, const Number&, Mark> || std::is_constructible_v<PropertyValue, const EnumValue&, Mark> || std::is_constructible_v<PropertyValue, IC::Buffer, Mark> || std::is_constructible_v<PropertyValue, IC::NumberArray, Mark> || std::is_constructible_v<PropertyValue, IC::StringArray, Mark> || std::is_constructible_v<PropertyValue, unsigned char, Mark> || std::is_constructible_v<PropertyValue, PropertyValue::KindType, Mark> || std::is_constructible_v<PropertyValue, int, Mark>;
+static_assert(!isMarkOfAny<const char*>);
+static_assert(!isMarkOfAny<const char (&)[10]>);
+static_assert(!isMarkOfAny<std::nullptr_t>);
+static_assert(!isMarkOfAny<int>);
+static_assert(!isMarkOfAny<unsigned char>);
+static_assert(!isMarkOfAny<double>);
+static_assert(!isMarkOfAny<PropertyValue::KindType>);
+static_assert(!isMarkOfAny<IC::Error::StatusType>);
+static_assert(!isMarkOfAny<Number>);
+static_assert(!isMarkOfAny<PropertyValue>);
+static_assert(isMark<bool> && isMark<bool&> && isMark<const bool&>);
+static_assert(isMark<std::vector<bool>::reference> && isMark<const std::vector<bool>::reference&>);
 
 // The functions that replace the object are private.
 template <class T, class = void>
@@ -251,10 +278,37 @@ TEST(PropertyConstructor, KeepsAllPartsOfANumber)
     EXPECT_EQ(seen(PropertyValue(Number(IC::sNodeRef {4, 7}))), "1 writable: CPU:7");
 }
 
-TEST(PropertyConstructor, TakesAnIntegerAsAKindCode)
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wdeprecated-declarations"
+TEST(PropertyConstructor, TakesAnIntAsAKindCode)
 {
     EXPECT_EQ(seen(PropertyValue(5)), "5 writable: {}");
     EXPECT_EQ(seen(PropertyValue(2, true)), "2 read-only: ");
+    EXPECT_EQ(seen(PropertyValue(258)), "2 writable: ");  // the low 8 bits
+    const PropertyValue assigned = 3;
+    EXPECT_EQ(seen(assigned), "3 writable: ");
+    expectRefusal<PropertyValueInvalidKind>(
+        [] { return PropertyValue(7); }, "initKind", "Property", "Vexilon.IC.Property",
+        "PropertyValue:initKind: invalid kind of property: 7", "Invalid kind of property");
+}
+#pragma GCC diagnostic pop
+
+TEST(PropertyConstructor, TakesTheMarkFromAVectorOfFlags)
+{
+    std::vector<bool> marks {true, false};
+    const std::vector<bool>& constant = marks;
+    EXPECT_EQ(seen(PropertyValue("abc", marks[0])), "2 read-only: abc");
+    EXPECT_EQ(seen(PropertyValue("abc", marks[1])), "2 writable: abc");
+    EXPECT_EQ(seen(PropertyValue("abc", constant[0])), "2 read-only: abc");
+}
+
+TEST(PropertyConstructor, TakesTheMarkFromABitField)
+{
+    struct Flags {
+        bool readOnly : 1;
+    };
+    const Flags flags {true};
+    EXPECT_EQ(seen(PropertyValue("abc", flags.readOnly)), "2 read-only: abc");
 }
 
 // Keeps the compiler from removing the allocations of an unused value.

@@ -13,6 +13,7 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
+#include "IC/visit.h"
 #include "ZQ/DateTime.h"
 #include "support/PropertySamples.h"
 
@@ -225,6 +226,9 @@ void addNumbers(Operations& all)
         addConversion<IC::Version2>(all, called, value, "Version2");
         addConversion<ZQ::DateTime>(all, called, value, "DateTime");
         addConversion<IC::NodeRef>(all, called, value, "NodeRef");
+        all.push_back(on("visit of " + called, given(value), [](const Number& n) {
+            return IC::visit(n, [](const auto& content) { return sizeof content; });
+        }));
         for (const auto& [otherName, other] : numbers()) {
             const std::string otherCalled = "Number " + otherName;
             addAssignment(all, otherCalled, other, called, value);
@@ -254,6 +258,8 @@ void addEnumValues(Operations& all)
         addConversion<unsigned int>(all, name, EnumValue(value), "unsigned int");
         addConversion<unsigned short>(all, name, EnumValue(value), "unsigned short");
         addConversion<unsigned char>(all, name, EnumValue(value), "unsigned char");
+        addConversion<Node::SensorType>(all, name, EnumValue(value), "SensorType");
+        addConversion<Error::StatusType>(all, name, EnumValue(value), "StatusType");
         addComparisons(all, name, EnumValue(value), "EnumValue 7", old);
         addAssignment(all, name, EnumValue(value), "EnumValue 7", old);
     }
@@ -383,6 +389,11 @@ void addAlerts(Operations& all)
         all.push_back(on(
             std::string(code.name) + " of a time", [] { return ZQ::DateTime(1234567890, 2); },
             [code, paths](ZQ::DateTime& time) {
+                return Alert(time, byte(code.severity), byte(code.alertClass), paths, code.status, longText);
+            }));
+        all.push_back(on(
+            std::string(code.name) + " of a constant time", [] { return ZQ::DateTime(1234567890, 2); },
+            [code, paths](const ZQ::DateTime& time) {
                 return Alert(time, byte(code.severity), byte(code.alertClass), paths, code.status, longText);
             }));
     }

@@ -14,6 +14,8 @@ void assign(std::string& text, int& whole, long& large, unsigned int& sum, IC::E
     sum += static_cast<unsigned int>(value);
     state = 5;  // does not compile: ambiguous
     state = 5u;
+    value = 5u;  // does not compile: deleted
+    value = IC::Number(5u);
     value = 0.5;  // does not compile: deleted
     value = IC::Number(0.5);
     value = true;  // does not compile: deleted
