@@ -1,5 +1,16 @@
 #include "Fan.h"
+#include "IC/visit.h"
 #include <iostream>
+
+struct Describe {
+    void operator()(const std::string& text) const { std::cout << text.size() << " characters\n"; }
+    void operator()(const IC::NumberArray& numbers) const { std::cout << numbers.size() << " numbers\n"; }
+    template <class Other>
+    void operator()(const Other&) const
+    {
+        std::cout << "something else\n";
+    }
+};
 
 int main()
 {
@@ -16,13 +27,17 @@ int main()
     }
     if (fan.getProperty(Fan::STATE, value) == IC::Error::STATUS_SUCCESS) {
         const IC::EnumValue state = value;
-        const unsigned char code = state;
-        std::cout << "state " << +code << '\n';
+        const bool running = static_cast<Fan::State>(state) == Fan::State::Running;
+        std::cout << (running ? "running\n" : "stopped\n");
     }
     if (fan.getProperty(Fan::LEVELS, value) == IC::Error::STATUS_SUCCESS) {
         const IC::NumberArray levels = value;
         const unsigned int highest = levels.back();
         std::cout << levels.size() << " levels up to " << highest << '\n';
+    }
+    for (const auto& [key, property] : fan.getProperties()) {
+        std::cout << key << ": ";
+        IC::visit(property, Describe());
     }
     std::cout << "no such property: status " << fan.getProperty(99, value) << '\n';
 }

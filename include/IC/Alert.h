@@ -36,7 +36,6 @@ public:
     /// 85, checked in this order.
     Alert(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
           std::vector<std::string> nodePaths, unsigned int status, std::string message);
-
     Alert(const ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
           std::vector<std::string> nodePaths, unsigned int status, std::string message);
 

@@ -174,8 +174,8 @@ public:
     inline operator NumberArray() const;
     inline operator StringArray() const;
 
-    /// Deleted: `int x = value;` would be a flag, and in C++20 `NodeRef x(value);` would take a number for a sensor type.
-    /// Write `int x = value.operator IC::Number();`.
+    /// Deleted: `int x = value;` would be a flag, and in C++20 `NodeRef x(value);` would take a number for a sensor
+    /// type. Write `int x = value.operator IC::Number();`.
     operator int() const = delete;
     explicit operator sNodeRef() const = delete;
 
