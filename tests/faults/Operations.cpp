@@ -436,21 +436,21 @@ void addNodes(Operations& all)
 
     for (const auto& [name, value] : properties(samples())) {
         const std::string ofNode = "of a node with " + name;
-        const auto node = [value = value] { return SampleNode(value); };
+        const auto node = [held = value] { return SampleNode(held); };
         all.push_back(
-            on("construction " + ofNode, [value = value] { return std::make_unique<SampleNode>(value); }));
+            on("construction " + ofNode, [held = value] { return std::make_unique<SampleNode>(held); }));
         all.push_back(on("getProperties " + ofNode, node, [](SampleNode& n) { return n.getProperties(); }));
         for (const auto& [otherName, other] : properties(otherSamples())) {
-            const auto both = [value = value, other = other] {
-                return NodeAndValue {SampleNode(value), other};
+            const auto both = [held = value, passed = other] {
+                return NodeAndValue {SampleNode(held), passed};
             };
             all.push_back(on("getProperty " + ofNode + " into " + otherName, both,
                              [](NodeAndValue& b) { return b.node.getProperty(1, b.value); }));
             all.push_back(on("setProperty " + ofNode + " to " + otherName, both,
                              [](NodeAndValue& b) { return b.node.setProperty(1, b.value); }));
         }
-        const auto both = [value = value] {
-            return NodeAndValue {SampleNode(PropertyValue(longText)), value};
+        const auto both = [passed = value] {
+            return NodeAndValue {SampleNode(PropertyValue(longText)), passed};
         };
         all.push_back(on("getProperty without such a property, into " + name, both,
                          [](NodeAndValue& b) { return b.node.getProperty(3, b.value); }));
