@@ -24,8 +24,8 @@ namespace IC::detail {
 bool globalLocaleIsClassic();
 
 // Collects a text form piece by piece. The text is what a fresh std::ostringstream writes under the global locale, as
-// the constructor finds it. Unlike a stream, it throws std::bad_alloc when memory runs out, and in the classic locale it
-// rounds reals to the nearest text in any rounding mode: asking for the mode would cost time in each.
+// the constructor finds it. Unlike a stream, it throws std::bad_alloc when memory runs out, and in the classic locale
+// it rounds reals to the nearest text in any rounding mode: asking for the mode would cost time in each.
 class Text {
 public:
     Text();

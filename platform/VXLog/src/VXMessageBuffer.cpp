@@ -71,8 +71,8 @@ struct VXMessageBuffer::Composer {
         stream.exceptions(std::ios_base::badbit);
     }
 
-    // Restores the initial state, but keeps the memory of texts of ordinary length. Returns false if the composer cannot
-    // be used again: what its user attached may belong to a plug-in, and must not outlive the buffer.
+    // Restores the initial state, but keeps the memory of texts of ordinary length. Returns false if the composer
+    // cannot be used again: what its user attached may belong to a plug-in, and must not outlive the buffer.
     bool reset()
     {
         if (!stream.detach())
