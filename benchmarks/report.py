@@ -24,6 +24,7 @@ SHARING = {"QVariant", "GVariant"}  # a copy is a further reference to the same 
 COLUMNS = [LIBRARY, LIMIT] + PEERS
 PRIMITIVE = "primitive"
 NODE_PANELS = {"node", "two-threads", "nodes"}
+WITHOUT_PEERS = {"bytes", "visit"}
 
 BEGIN = "<!-- measured: begin (written by scripts/run-benchmarks --update-docs) -->"
 END = "<!-- measured: end -->"
@@ -190,7 +191,7 @@ def table(results, bars, columns):
 
 def lacking(results, columns):
     """One line for each peer, with the workloads that it does not offer."""
-    rows = [row for row in results if LIBRARY in results[row] and kind(row) not in NODE_PANELS | {"bytes"}]
+    rows = [row for row in results if LIBRARY in results[row] and kind(row) not in NODE_PANELS | WITHOUT_PEERS]
     lines = []
     for column in columns:
         missing = {row for row in rows if column not in results[row]}

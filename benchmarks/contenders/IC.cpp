@@ -4,6 +4,7 @@
 
 #include "IC/ICException.h"
 #include "IC/Node.h"
+#include "IC/visit.h"
 #include "NodeWorkloads.h"
 #include "ValueWorkloads.h"
 
@@ -107,7 +108,57 @@ struct IcNode {
     static std::string text(const Node& node) { return node.operator std::string(); }
 };
 
+// Out of line, so that a visit and its limit run the same loop: where they are inlined, its branches lie differently.
+[[gnu::noinline]] std::uint64_t sumOf(const IC::NumberArray& numbers)
+{
+    std::uint64_t sum = 0;
+    for (const IC::Number& number : numbers)
+        sum += number.operator unsigned int();
+    return sum;
+}
+
+struct Sum {
+    std::uint64_t operator()(const IC::NumberArray& numbers) const { return sumOf(numbers); }
+    template <class Other>
+    std::uint64_t operator()(const Other&) const
+    {
+        return 0;
+    }
+};
+
+void timeVisit(benchmark::State& state)
+{
+    IC::PropertyValue value(Ic::native(numbersOfLength(100000, 0)));
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(value);
+        const auto sum = IC::visit(value, Sum());
+        benchmark::DoNotOptimize(sum);
+    }
+}
+
+// The limit of a visit.
+void timeLoop(benchmark::State& state)
+{
+    IC::NumberArray numbers = Ic::native(numbersOfLength(100000, 0));
+    beforeTiming();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(numbers);
+        const auto sum = sumOf(numbers);
+        benchmark::DoNotOptimize(sum);
+    }
+}
+
+bool addVisits()
+{
+    const std::string row = "visit/numbers/100000";
+    add<Ic>(row, timeVisit);
+    benchmark::RegisterBenchmark(benchmarkName(row, "limit").c_str(), timeLoop);
+    return true;
+}
+
 const bool valuesAdded = addValueWorkloads<Ic>();
+const bool visitsAdded = addVisits();
 const bool nodesAdded = addNodeWorkloads<IcNode>();
 
 }  // namespace
