@@ -19,17 +19,21 @@ Outcome runWith(const std::string& files, std::vector<std::string> arguments = {
                                             "P: /devices/platform/board.1/hwmon/hwmon0\nE: SUBSYSTEM=hwmon\n"
                                             "A: name=board\\n\n"
                                                 + files + "L: device=../../../board.1\n\n");
-    // umockdev-run expects its arguments in the encoding of the locale. It preloads a library, and AddressSanitizer
-    // demands to be the first one, although it works as the second too. hwloc's plugin "pci" leaks memory.
+    // umockdev-run takes only arguments in ASCII, so the shell reads the program's path from the environment.
+    // umockdev-run preloads a library, and AddressSanitizer demands to be the first one, although it works as the
+    // second too. hwloc's plugin "pci" leaks memory.
     std::vector<std::string> words {"env",
-                                    "LC_ALL=C.UTF-8",
+                                    "PROGRAM=" INVENTORY_PROGRAM,
                                     "ASAN_OPTIONS=verify_asan_link_order=0",
                                     "HWLOC_COMPONENTS=-pci",
                                     UMOCKDEV_RUN,
                                     "--device",
                                     device,
                                     "--",
-                                    INVENTORY_PROGRAM};
+                                    "sh",
+                                    "-c",
+                                    "exec \"$PROGRAM\" \"$@\"",
+                                    "sh"};
     words.insert(words.end(), arguments.begin(), arguments.end());
     return runProgram(words);
 }
