@@ -30,9 +30,12 @@ MEMORY = 1 << 29  # bytes that a test program may use; more counts as a failure
 # Stands for one source that includes the public headers; its object file has all their inline functions.
 HEADERS = "include/IC"
 
-# Compiles each condition of the source to jumps, also those of a switch, and little else.
-JUMPING = ["-S", "-g1", "-O1", "-fno-inline", "-fno-jump-tables", "-fno-bit-tests", "-fno-if-conversion",
-           "-fno-if-conversion2", "-fno-tree-loop-if-convert", "-fno-ssa-phiopt"]  # fmt: skip
+# Compiles each condition of the source to jumps, also those of a switch, and little else. Names the files relative to
+# TREE: the compiler writes letters of a path other than ASCII as escape sequences.
+TREE = pathlib.Path("/tree")
+JUMPING = [f"-ffile-prefix-map={ROOT}={TREE}", "-S", "-g1", "-O1", "-fno-inline", "-fno-jump-tables",
+           "-fno-bit-tests", "-fno-if-conversion", "-fno-if-conversion2", "-fno-tree-loop-if-convert",
+           "-fno-ssa-phiopt"]  # fmt: skip
 
 Mutant = collections.namedtuple("Mutant", "file name objects")
 Branch = collections.namedtuple("Branch", "function source statement turned")
@@ -222,7 +225,7 @@ def jumps_of(lines, seen):
             place = located.groups()
         elif re.match(r"\tj(?!mp)\w+\t", line) and re.match(r"_ZZ*NK?(2IC|7IC_NODE)", function):
             if function not in seen:
-                source = str(files[place[0]].relative_to(ROOT))
+                source = str(files[place[0]].relative_to(TREE))
                 here = code(source)
                 statement = here.statement(here.at(int(place[1]), int(place[2])))
                 jumps[function, source, statement].append(number)
