@@ -20,9 +20,12 @@ namespace detail {
 
 // What the library nlohmann/json calls for a class; in IC/detail/json-inl.h.
 template <class Value>
-struct JsonSerializer {
+struct JsonWriter {
     template <class Json>
     static void to_json(Json& json, const Value& value);
+};
+template <class Value>
+struct JsonSerializer : JsonWriter<Value> {
     template <class Json>
     static Value from_json(const Json& json);
     template <class Json>
@@ -97,11 +100,10 @@ struct adl_serializer<IC::Alert> : IC::detail::JsonSerializer<IC::Alert> {
 ///@}
 
 /// Writes a node; a derived node gives the document of its base. IC::StoredNode reads it. Status, description and
-/// properties are copied one after another, each with the node's own getter.
+/// properties are copied one after another by the getters of the node's class, whose exceptions propagate.
 template <class T>
-struct adl_serializer<T, std::enable_if_t<std::is_base_of_v<IC::Node, T>>> {
-    template <class Json>
-    static void to_json(Json& json, const IC::Node& node);
+struct adl_serializer<T, std::enable_if_t<std::is_base_of_v<IC::Node, T>>>
+    : IC::detail::JsonWriter<IC::Node> {
 };
 
 }  // namespace nlohmann

@@ -123,6 +123,8 @@ const std::vector<NumberRow>& numberRows()
         // What another setKind can bring back.
         {ofKind(IC::NodeRef {20, 7}, Number::KIND_UNKNOWN),
          R"({"kind":"unknown","storage":[0,0,0,20,7],"value":null})"},
+        {ofKind(IC::NodeRef {0, 7}, Number::KIND_UNKNOWN),
+         R"({"kind":"unknown","storage":[0,0,0,0,7],"value":null})"},
         {ofKind(9ull, Number::KIND_NODEREF),
          R"({"kind":"nodeRef","storage":[9,0,0,0,0],"value":{"id":0,"type":0}})"},
         {ofInvalidKind(5ull, 12), R"({"kind":"invalid","storage":[5,0,0,0,0],"value":12})"},
@@ -221,6 +223,18 @@ TEST(Json, NumbersComeBackWithEveryByteThatAKindShows)
         EXPECT_EQ(shown(json::parse(document).get<Number>()), shown(number));
         EXPECT_EQ(shown(json::from_cbor(json::to_cbor(number)).get<Number>()), shown(number));
     }
+}
+
+// setKind and initKind change the kind alone, so that any of the other bytes may be left.
+TEST(Json, NumbersComeBackWithWhatOtherKindsLeft)
+{
+    for (unsigned char kind = 0; kind <= Number::KIND_NODEREF; ++kind)
+        for (const auto& [left, document] : numberRows()) {
+            SCOPED_TRACE(std::to_string(kind) + " after " + document);
+            Number number = left;
+            number.setKind(kind);
+            EXPECT_EQ(shown(json::parse(json(number).dump()).get<Number>()), shown(number));
+        }
 }
 
 TEST(Json, HasADocumentForEveryKindOfPropertyValue)
@@ -418,7 +432,7 @@ TEST(Json, ReadsWhatOtherProgramsWriteForTheSameValue)
         {R"({"kind":"real","value":{"bits":"3ff0000000000000"}})", 1.0},
         {R"({"kind":"bool","value":0})", false},
         {R"({"kind":"bool","value":1})", true},
-        {R"({"kind":"uint32","value":5,"storage":[5,0,0,0,0]})", 5u},
+        {R"({"kind":"uint64","value":5,"storage":[5,0,0,0,0]})", 5ull},
     };
     for (const auto& [document, number] : rows) {
         SCOPED_TRACE(document);

@@ -34,8 +34,15 @@ void readAs(const json& document)
     }
 }
 
-void readAsAll(const json& document)
+template <class Parse>
+void readAsAll(Parse parse)
 {
+    json document;
+    try {
+        document = parse();
+    } catch (const json::out_of_range&) {  // a size beyond all memory, also where exceptions are turned off
+        return;
+    }
     if (document.is_discarded())
         return;
     readAs<IC::Number>(document);
@@ -57,8 +64,8 @@ void comesBack(const json& document, const agreement::ValuePair& pair)
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
 {
     agreement::takeLoggerCalls();
-    readAsAll(json::parse(data, data + size, nullptr, false));
-    readAsAll(json::from_cbor(data, data + size, true, false));
+    readAsAll([=] { return json::parse(data, data + size, nullptr, false); });
+    readAsAll([=] { return json::from_cbor(data, data + size, true, false); });
     require(agreement::takeLoggerCalls().empty(), "reading writes no record");
 
     FuzzedDataProvider bytes(data, size);

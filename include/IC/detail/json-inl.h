@@ -3,12 +3,11 @@
 // The end of IC/json.h: how the documents are written and read.
 
 #include <algorithm>
-#include <cmath>
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
 #include <initializer_list>
-#include <iterator>
 #include <limits>
 #include <string_view>
 #include <utility>
@@ -20,15 +19,14 @@ namespace IC {
 namespace detail {
 
 // The names of the kinds of a number by their codes. The last stands for the codes that are no kind.
-constexpr const char* jsonNumberKinds[] = {"unknown", "bool",     "int",     "uint32",
-                                           "uint64",  "real",     "nan",     "infinity",
-                                           "version", "dateTime", "nodeRef", "invalid"};
+constexpr std::array jsonNumberKinds {"unknown", "bool",     "int",     "uint32",   "uint64",  "real",
+                                      "nan",     "infinity", "version", "dateTime", "nodeRef", "invalid"};
 constexpr unsigned int jsonInvalidKind = 11;
 
 // The names of the kinds of a property value by their codes. A number goes by its own kind, so that "number" is only
 // the kind of a missing one.
-constexpr const char* jsonPropertyKinds[] = {"nothing",   "number",      "string",     "buffer",
-                                             "enumValue", "numberArray", "stringArray"};
+constexpr std::array jsonPropertyKinds {"nothing",   "number",      "string",     "buffer",
+                                        "enumValue", "numberArray", "stringArray"};
 constexpr const char* jsonMissing = "missing";
 
 // What a number stores beside its kind: the bytes, as an integer and, behind it, as the fields of a date-time, and the
@@ -214,19 +212,25 @@ public:
     }
 
     template <class Integer>
-    Integer integer(Integer least = std::numeric_limits<Integer>::min(),
-                    Integer most = std::numeric_limits<Integer>::max()) const
+    Integer integer(Integer least = 0, Integer most = std::numeric_limits<Integer>::max()) const
     {
+        static_assert(std::is_unsigned_v<Integer>);
+        return static_cast<Integer>(integerBetween(least, most));
+    }
+
+    template <class Integer>
+    Integer signedInteger() const
+    {
+        static_assert(std::is_signed_v<Integer>);
         if (json_.is_number_integer()) {
             const auto bits = json_.template get<std::uint64_t>();
             const auto value = static_cast<Integer>(bits);
-            // The conversion kept the value if converting back gives the same bits and the same sign.
-            const bool negative = !json_.is_number_unsigned() && json_.template get<std::int64_t>() < 0;
-            if (static_cast<std::uint64_t>(value) == bits && std::less<>()(value, Integer {0}) == negative
-                && value >= least && value <= most)
+            // Nothing was lost if the bits come back, and the sign was not taken for one of them.
+            if (static_cast<std::uint64_t>(value) == bits && (value < 0) == isNegative())
                 return value;
         }
-        fail("expected an integer from " + std::to_string(least) + " to " + std::to_string(most));
+        fail("expected an integer from " + std::to_string(std::numeric_limits<Integer>::min()) + " to "
+             + std::to_string(std::numeric_limits<Integer>::max()));
     }
 
     const std::string& string() const
@@ -259,6 +263,18 @@ private:
         if (!json_.is_object())
             fail("expected an object");
         return json_;
+    }
+
+    bool isNegative() const { return !json_.is_number_unsigned() && json_.template get<std::int64_t>() < 0; }
+
+    std::uint64_t integerBetween(std::uint64_t least, std::uint64_t most) const
+    {
+        if (json_.is_number_integer() && !isNegative()) {
+            const auto value = json_.template get<std::uint64_t>();
+            if (value >= least && value <= most)
+                return value;
+        }
+        fail("expected an integer from " + std::to_string(least) + " to " + std::to_string(most));
     }
 
     typename Json::json_pointer pointer() const
@@ -425,14 +441,14 @@ NumberStorage readStorage(const JsonPlace<Json>& place)
 template <class Json>
 void readContent(const JsonPlace<Json>& place, Number& number)
 {
-    switch (number.getKind()) {
+    switch (ZQ::Uint32 {number.getKind()}) {
     case Number::KIND_BOOL:
         JsonAccess::store(number,
                           place.json().is_boolean() ? static_cast<ZQ::Uint8>(place.flag())
                                                     : place.template integer<ZQ::Uint8>());
         return;
     case Number::KIND_INT:
-        JsonAccess::store(number, place.template integer<int>());
+        JsonAccess::store(number, place.template signedInteger<int>());
         return;
     case Number::KIND_UINT32:
         JsonAccess::store(number, place.template integer<ZQ::Uint32>());
@@ -450,7 +466,7 @@ void readContent(const JsonPlace<Json>& place, Number& number)
         return;
     case Number::KIND_DATETIME:
         place.hasOnly({"seconds", "milliseconds", "scope"});
-        JsonAccess::storeDateTime(number, place["seconds"].template integer<long>(),
+        JsonAccess::storeDateTime(number, place["seconds"].template signedInteger<long>(),
                                   place["milliseconds"].template integer<ZQ::Uint16>(),
                                   place["scope"].template integer<ZQ::Uint8>());
         return;
@@ -460,22 +476,19 @@ void readContent(const JsonPlace<Json>& place, Number& number)
                           sNodeRef {place["type"].template integer<ZQ::Uint32>(),
                                     place["id"].template integer<ZQ::Uint32>()});
         return;
-    case Number::KIND_UNKNOWN:
-    case Number::KIND_NAN:
-    case Number::KIND_INFINITY:
+    default:  // the kinds without a value
         place.null();
-        return;
     }
 }
 
 // The index of a kind's name.
-template <class Json, std::size_t count>
-ZQ::Uint32 readKind(const JsonPlace<Json>& place, const char* const (&names)[count])
+template <class Json, class Names>
+ZQ::Uint32 readKind(const JsonPlace<Json>& place, const Names& names)
 {
-    const auto* const name = std::find(std::begin(names), std::end(names), place.string());
-    if (name == std::end(names))
+    const auto name = std::find(names.begin(), names.end(), place.string());
+    if (name == names.end())
         place.fail("unknown kind");
-    return static_cast<ZQ::Uint32>(name - std::begin(names));
+    return static_cast<ZQ::Uint32>(name - names.begin());
 }
 
 // Reads the members of a number. The caller checks that there are no others.
@@ -571,8 +584,7 @@ PropertyValue read(const JsonPlace<Json>& place, Wanted<PropertyValue>)
 {
     const std::string& kind = place["kind"].string();
     const bool readOnly = place.has("readOnly") && place["readOnly"].flag();
-    if (std::find(std::begin(jsonNumberKinds), std::end(jsonNumberKinds), kind)
-        != std::end(jsonNumberKinds)) {
+    if (std::find(jsonNumberKinds.begin(), jsonNumberKinds.end(), kind) != jsonNumberKinds.end()) {
         place.hasOnly({"kind", "value", "readOnly", "storage"});
         return {readNumber(place), readOnly};
     }
@@ -671,7 +683,7 @@ Alert read(const JsonPlace<Json>& place, Wanted<Alert>)
     place.hasOnly({"time", "severity", "class", "status", "paths", "message"});
     const auto time = place["time"];
     time.hasOnly({"seconds", "milliseconds", "scope"});
-    ZQ::DateTime timeStamp(time["seconds"].template integer<long>(),
+    ZQ::DateTime timeStamp(time["seconds"].template signedInteger<long>(),
                            time["scope"].template integer<ZQ::Uint32>());
     timeStamp.setMillisecond(time["milliseconds"].template integer<ZQ::Uint32>());
     return {timeStamp,
@@ -718,7 +730,7 @@ StoredContent read(const JsonPlace<Json>& place, Wanted<StoredContent>)
 
 template <class Value>
 template <class Json>
-void JsonSerializer<Value>::to_json(Json& json, const Value& value)
+void JsonWriter<Value>::to_json(Json& json, const Value& value)
 {
     json = toJson<Json>(value);
 }
@@ -755,11 +767,3 @@ inline StoredNode::StoredNode(detail::StoredContent&& content) : Node(content.se
 }
 
 }  // namespace IC
-
-template <class T>
-template <class Json>
-void nlohmann::adl_serializer<T, std::enable_if_t<std::is_base_of_v<IC::Node, T>>>::to_json(
-    Json& json, const IC::Node& node)
-{
-    json = IC::detail::toJson<Json>(node);
-}
