@@ -20,7 +20,7 @@ namespace IC {
 namespace detail {
 struct JsonAccess;
 struct Visit;
-}
+}  // namespace detail
 
 /// What a value holds when it holds several elements.
 using Buffer = std::vector<unsigned char>;

@@ -749,6 +749,7 @@ void expectUnchangedWithoutMemory(Operation operation, State state)
     long failures = 0;
     for (;; ++failures) {
         ASSERT_LT(failures, 1000);
+        observe::reset();
         const long alive = allocation::aliveNow;
         bool threw = false;
         allocation::failFrom(failures + 1, true);
@@ -770,6 +771,8 @@ void expectUnchangedWithoutMemory(Operation operation, State state)
 TEST(Json, WithoutMemoryTheTargetIsUnchanged)
 {
     const Fan fan;
+    for (int i = 0; i < 10; ++i)
+        static_cast<void>(json(fan));  // the observer's list of lock calls keeps this capacity
     json document = "before";
     const auto textOfDocument = [&document] { return document.dump(); };
     expectUnchangedWithoutMemory([&] { document = fan; }, textOfDocument);
