@@ -66,7 +66,7 @@ struct Visit {
     template <class Visitor>
     static decltype(auto) number(const Number& number, Visitor& visitor)
     {
-        switch (number.kind_) {
+        switch (ZQ::Uint32 {number.kind_}) {
         case Number::KIND_UNKNOWN:
             return call(visitor, std::monostate());
         case Number::KIND_BOOL:
@@ -89,8 +89,9 @@ struct Visit {
             return call(visitor, number.loadDateTime());
         case Number::KIND_NODEREF:
             return call(visitor, number.nodeRef_);
+        default:
+            return call(visitor, InvalidKind {number.kind_});
         }
-        return call(visitor, InvalidKind {number.kind_});
     }
 };
 
