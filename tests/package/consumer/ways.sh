@@ -37,7 +37,7 @@ configure() {
 
 # check COMMAND...: runs the consumer and compares what it prints.
 check() {
-    sed 's/@TIME@/2009-02-13T23:31:30Z/' "$here/expected.txt" >"$work/expected.txt"
+    sed 's/@TIME@/2009-02-13T23:31:30Z/g' "$here/expected.txt" >"$work/expected.txt"
     "$@" >"$work/printed.txt" 2>"$work/records.txt" || fail "ended with $?: $*"
     cmp "$work/expected.txt" "$work/printed.txt" || fail "printed something else: $*"
     [ -s "$work/records.txt" ] || fail "wrote no record: $*"
