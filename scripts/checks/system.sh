@@ -66,7 +66,7 @@ fetch() {
         set -- sh -c 'debootstrap --variant=minbase "$1" "$2" && tar -cf "$3" -C "$2" --one-file-system .' \
             sh "$suite" "$work/temporary/system" "$work/temporary/minimal.tar"
     else
-        scripts/install-packages mmdebstrap
+        scripts/install-packages mmdebstrap debian-archive-keyring
         set -- mmdebstrap --variant=minbase --mode=root "$suite" "$work/temporary/minimal.tar" ${sources:+"$sources"}
     fi
     quietly "$suite could not be fetched" in_background env TMPDIR="$work/temporary" \
