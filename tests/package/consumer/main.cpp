@@ -1,5 +1,6 @@
-// Uses every public name of the library, so that compilers, standard libraries and the ways to take the library can be
-// compared: each has to print expected.txt.
+// Uses every public name of the library but those of IC/fmt.h, IC/format.h and IC/json.h, which need more than the library
+// itself, so that compilers, standard libraries and the ways to take the library can be compared: each has to print
+// expected.txt.
 
 #include <dlfcn.h>
 
@@ -11,6 +12,7 @@
 #include <string>
 #include <unordered_map>
 #include <utility>
+#include <variant>
 #include <vector>
 
 #include "IC/Alert.h"
@@ -20,6 +22,7 @@
 #include "IC/Node.h"
 #include "IC/Number.h"
 #include "IC/Property.h"
+#include "IC/visit.h"
 
 namespace {
 
@@ -111,6 +114,9 @@ void useEnumValue()
     std::cout << +byte << ' ' << small << ' ' << whole << '\n';
     compare("EnumValue", value, EnumValue(8u));
     std::cout << (std::hash<EnumValue>()(value) == std::hash<EnumValue>()(EnumValue(7u))) << '\n';
+    enum class State { off, on };
+    const EnumValue on(State::on);
+    std::cout << on << ' ' << (static_cast<State>(on) == State::on) << '\n';
     refuse<std::out_of_range>([] { return EnumValue(256u).operator unsigned char(); });
     refuse<std::out_of_range>([] { return EnumValue(65536u).operator unsigned short(); });
 }
@@ -263,6 +269,40 @@ void useExceptions()
     refuse<IC::ICException>([&copy] { throw copy; });
 }
 
+struct Name {
+    template <class Value>
+    const char* operator()(const Value&) const
+    {
+        return "a value";
+    }
+    const char* operator()(const std::monostate&) const { return "nothing"; }
+    const char* operator()(const IC::NotANumber&) const { return "not a number"; }
+    const char* operator()(const IC::Infinity&) const { return "infinity"; }
+    const char* operator()(const IC::InvalidKind& invalid) const
+    {
+        return invalid.kind == 11 ? "invalid kind 11" : "another kind";
+    }
+    const char* operator()(const IC::MissingObject& missing) const
+    {
+        return missing.kind == IC::PropertyValue::KIND_STRING ? "missing text" : "another kind";
+    }
+};
+
+void useVisit()
+{
+    using IC::Number;
+    using IC::PropertyValue;
+    Number invalid(0u);
+    refuse<std::invalid_argument>([&invalid] { invalid.initKind(static_cast<Number::KindType>(11)); });
+    PropertyValue missing("text");
+    refuse<IC::PropertyValueInvalidKind>([&missing] { missing.setKind(static_cast<unsigned char>(7)); });
+    std::cout << IC::visit(Number(0.5), Name()) << ", " << IC::visit(Number(Number::KIND_UNKNOWN), Name())
+              << ", " << IC::visit(Number(Number::KIND_NAN), Name()) << ", "
+              << IC::visit(Number(Number::KIND_INFINITY), Name()) << ", " << IC::visit(invalid, Name())
+              << ", " << IC::visit(PropertyValue("text"), Name()) << ", " << IC::visit(missing, Name())
+              << '\n';
+}
+
 // The argument is the plug-in; without one only the program itself is tried.
 int callPlugin(const char* path)
 {
@@ -310,5 +350,6 @@ int main(int argc, char** argv)
     useAlert();
     useNode();
     useExceptions();
+    useVisit();
     return argc > 1 ? callPlugin(argv[1]) : 0;
 }
