@@ -1,5 +1,5 @@
-// Uses every public name of the library but those of IC/fmt.h, IC/format.h and IC/json.h, which need more than the library
-// itself, so that compilers, standard libraries and the ways to take the library can be compared: each has to print
+// Uses every public name of the library but those of IC/fmt.h, IC/format.h and IC/json.h, which not every way can
+// compile, so that compilers, standard libraries and the ways to take the library can be compared: each has to print
 // expected.txt.
 
 #include <dlfcn.h>
