@@ -49,8 +49,10 @@ private:
         case model::TEXT:
             return pairOf(text(), readOnly);
         case model::BUFFER: {
-            const std::string bytes = text();
-            return pairOf(std::vector<unsigned char>(bytes.begin(), bytes.end()), readOnly);
+            std::vector<unsigned char> bytes;
+            for (const char byte : text())
+                bytes.push_back(static_cast<unsigned char>(byte));
+            return pairOf(bytes, readOnly);
         }
         case model::ENUM_VALUE:
             return pairOf(IC::EnumValue(integer<unsigned int>()), readOnly);
