@@ -26,6 +26,8 @@ quietly() {
 be_root() {
     [ "$(id -u)" -ne 0 ] || return 0
     scripts/install-packages mmdebstrap uidmap
+    unshare --map-root-user --map-auto true 2>/dev/null ||
+        fail "This system does not permit namespaces to ordinary users; run the script as root"
     exec unshare --map-root-user --map-auto -- "$PWD/scripts/checks/${0##*/}" "$@"
 }
 
@@ -133,6 +135,9 @@ start() {
     mkdir "$system"
     tar -xf "$work/minimal.tar" -C "$system" --exclude='./dev/*'
     cp /etc/resolv.conf "$system/etc/resolv.conf"
+    for proxy in ${http_proxy:+"http $http_proxy"} ${https_proxy:+"https $https_proxy"}; do
+        echo "Acquire::${proxy%% *}::Proxy \"${proxy#* }\";"
+    done >"$system/etc/apt/apt.conf.d/proxy"
     echo "127.0.0.1 localhost $(uname -n)" >"$system/etc/hosts"
     quietly "The list of packages could not be fetched" inside apt-get update
 }

@@ -83,8 +83,7 @@ protected:
     {
 #if defined(__GLIBCXX__) && !defined(_GLIBCXX_HAVE_ATOMIC_LOCK_POLICY)
         GTEST_SKIP() << "this standard library counts references under a global lock, which a child of "
-                        "fork() may find "
-                        "locked for ever (libstdc++ of GCC 12 for riscv64)";
+                        "fork() may find locked for ever (libstdc++ of GCC 12 for riscv64)";
 #endif
     }
 

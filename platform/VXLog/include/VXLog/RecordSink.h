@@ -48,8 +48,8 @@ RecordSink setRecordSink(RecordSink sink);
 
 // The default sink: writes each log record to standard error as one line: time, level, category, file and line,
 // function, text. It escapes control and format characters, separators of lines and paragraphs, backslashes and bytes
-// that are not UTF-8 (Printable.h), so no text can forge a line, control a terminal, or reorder or hide characters. It
-// writes trace records only while the environment variable VXLOG_TRACE is set, with the word "trace" after the level.
+// that are not UTF-8 (Printable.h), so no text can forge a line or control a terminal. It writes trace records only
+// while the environment variable VXLOG_TRACE is set, with the word "trace" after the level.
 void standardErrorSink(const Record& record);
 
 }  // namespace VXLog
