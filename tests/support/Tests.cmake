@@ -20,6 +20,7 @@ if(NOT nlohmann_json_FOUND)
     message(STATUS "IC: IC/json.h is not tested: the Debian package nlohmann-json3-dev is missing")
 elseif(CMAKE_CROSSCOMPILING)
     get_target_property(json_folder nlohmann_json::nlohmann_json INTERFACE_INCLUDE_DIRECTORIES)
+    list(GET json_folder 0 json_folder)  # the package names it twice
     file(MAKE_DIRECTORY ${PROJECT_BINARY_DIR}/nlohmann)
     file(CREATE_LINK ${json_folder}/nlohmann ${PROJECT_BINARY_DIR}/nlohmann/nlohmann SYMBOLIC)
     set_target_properties(nlohmann_json::nlohmann_json PROPERTIES
