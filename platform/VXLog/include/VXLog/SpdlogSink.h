@@ -21,8 +21,8 @@ namespace VXLog {
 /// The source location is the record's.
 ///
 /// Several threads may call one sink if they may use the logger, as one with sinks whose names end in _mt. spdlog has
-/// locks: in a child of fork(), set another sink. A logger with a queue (spdlog::async_logger) keeps the pointers to the
-/// names of file and function. In the library's records these are literals, valid until the library is unloaded.
+/// locks: in a child of fork(), set another sink. A logger with a queue (spdlog::async_logger) keeps the pointers to
+/// the names of file and function. In the library's records these are literals, valid until the library is unloaded.
 ///
 /// Optional: no other header includes this one. Link IC::VXLog and spdlog (Debian's libspdlog-dev) yourself.
 class SpdlogSink {
