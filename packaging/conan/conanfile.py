@@ -14,7 +14,7 @@ from conan.tools.files import copy, rmdir
 
 class ICRecipe(ConanFile):
     name = "ic"
-    version = "1.0.0"
+    version = "1.1.0"
     description = "C++17 library that models a machine as nodes with typed, numbered properties"
     package_type = "library"
     settings = "os", "arch", "compiler", "build_type"

@@ -77,7 +77,7 @@ pkg_config() {
     library=$2
     shift 2
     export PKG_CONFIG_PATH="$library/pkgconfig"
-    [ "$(pkg-config --modversion IC)" = 1.0.0 ] || fail "pkg-config finds another IC"
+    [ "$(pkg-config --modversion IC)" = 1.1.0 ] || fail "pkg-config finds another IC"
     if pkg-config --exists 'IC >= 2'; then
         fail "the pkg-config module says that it is version 2"
     fi
