@@ -72,7 +72,12 @@ struct JsonAccess {
     static void store(Number& number, const sNodeRef& content) noexcept { number.nodeRef_ = content; }
     static void storeDateTime(Number& number, long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept
     {
-        number.storeDateTime(seconds, milliseconds, scope);
+        // Changes the fields alone: with a long of 32 bits, their unused byte is part of the stored 64 bits.
+        auto time = number.load<Number::DateTimeFields>();
+        time.seconds = seconds;
+        time.milliseconds = milliseconds;
+        time.scope = scope;
+        number.store(time);
     }
 
     static PropertyValue withoutObject(PropertyValue::KindType kind, bool readOnly) noexcept
