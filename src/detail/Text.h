@@ -6,7 +6,7 @@
 #include <locale>
 #include <optional>
 #include <ostream>
-#include <sstream>
+#include <streambuf>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -69,11 +69,11 @@ public:
     template <class T>
     void addStreamed(const T& piece)
     {
-        std::ostringstream out;
+        Inserted inserted(*this);
+        std::ostream out(&inserted);
         out.imbue(locale_ ? *locale_ : std::locale::classic());
         out.exceptions(std::ios_base::badbit);
         out << piece;
-        add(out.str());
     }
 
     std::string take()
@@ -88,6 +88,28 @@ public:
     Text& operator=(const Text&) = delete;
 
 private:
+    // Appends what is written to a stream. Throws std::bad_alloc when memory runs out; a string stream of libc++ then
+    // throws std::ios_base::failure.
+    class Inserted : public std::streambuf {
+    public:
+        explicit Inserted(Text& text) : text_(text) { }
+
+    protected:
+        int_type overflow(int_type character) override
+        {
+            text_.add(traits_type::to_char_type(character));
+            return character;
+        }
+        std::streamsize xsputn(const char* characters, std::streamsize count) override
+        {
+            text_.add(std::string_view(characters, static_cast<std::size_t>(count)));
+            return count;
+        }
+
+    private:
+        Text& text_;
+    };
+
     template <class T>
     void addInteger(T number)
     {

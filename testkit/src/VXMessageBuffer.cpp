@@ -6,7 +6,19 @@
 
 namespace VXLog {
 
-VXMessageBuffer::VXMessageBuffer()
+VXMessageBuffer::Composed::int_type VXMessageBuffer::Composed::overflow(int_type character)
+{
+    text += traits_type::to_char_type(character);
+    return character;
+}
+
+std::streamsize VXMessageBuffer::Composed::xsputn(const char* characters, std::streamsize count)
+{
+    text.append(characters, static_cast<std::size_t>(count));
+    return count;
+}
+
+VXMessageBuffer::VXMessageBuffer() : stream_(&composed_)
 {
     observe::reached(observe::Call::bufferConstructor);
     stream_.exceptions(std::ios_base::badbit);
@@ -60,8 +72,8 @@ const std::string& VXMessageBuffer::str(VXMessageBuffer& last)
 const std::string& VXMessageBuffer::take()
 {
     observe::reached(observe::Call::str);
-    text_ = stream_.str();
-    stream_.str(std::string());
+    text_ = composed_.text;
+    composed_.text.clear();
     return text_;
 }
 

@@ -119,7 +119,15 @@ void addValue(Operations& all, const std::string& name, const T& value)
 const auto toThrowingStream = [](const auto& value) {
     std::ostringstream out;
     out.exceptions(std::ios_base::badbit | std::ios_base::failbit);
+#ifdef _LIBCPP_VERSION
+    try {
+        out << value;
+    } catch (const std::ios_base::failure&) {
+        throw std::bad_alloc();  // which libc++'s string stream does not let through
+    }
+#else
     out << value;
+#endif
     return out.str();
 };
 

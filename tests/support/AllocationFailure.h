@@ -15,6 +15,13 @@
 // test first fills the observer's lists, so that they have room.
 namespace allocation {
 
+// If copying an element throws, the copy constructor of a vector loses the elements that it has copied.
+#if defined(_LIBCPP_VERSION) && _LIBCPP_VERSION < 16000
+constexpr bool vectorsLeak = true;
+#else
+constexpr bool vectorsLeak = false;
+#endif
+
 inline thread_local long allowedNow = -1;    // how many more allocations succeed; below 0: all
 inline thread_local bool failsOnce = false;  // after one failure, allocations succeed again
 inline thread_local bool failedNow = false;
@@ -75,7 +82,7 @@ long expectAllMemoryGivenBack(Operation operation)
     long allowed = 0;
     while (!completesWith(allowed, operation) && allowed < 100)
         ++allowed;
-    EXPECT_EQ(aliveNow, before);
+    EXPECT_TRUE(aliveNow == before || vectorsLeak) << aliveNow - before << " allocations are not released";
     EXPECT_GT(allowed, 0) << "the operation needs no memory";
     EXPECT_LT(allowed, 100) << "the operation does not complete";
     return allowed;
@@ -91,7 +98,7 @@ void expectTextCompleteOrThrows(const Value& value, const std::string& whole)
     while (!completesWith(allowed, [&] { text = value.operator std::string(); }))
         ASSERT_LT(++allowed, 1000);
     EXPECT_EQ(text, whole) << "with memory for " << allowed << " allocations";
-    EXPECT_GT(allowed, 0) << "the text is too short to need memory";
+    EXPECT_EQ(allowed > 0, whole.size() > std::string().capacity());  // short ones fit into the object
 
     for (allowed = 0;; ++allowed) {
         ASSERT_LT(allowed, 1000);

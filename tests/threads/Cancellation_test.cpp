@@ -85,8 +85,18 @@ void cancelIn(void (*operation)(Fan&))
 
 class Cancellation : public testing::Test {
 protected:
-    void SetUp() override { before_ = VXLog::setRecordSink(nullptr); }
-    void TearDown() override { VXLog::setRecordSink(before_); }
+    void SetUp() override
+    {
+        before_ = VXLog::setRecordSink(nullptr);
+#ifdef _LIBCPP_VERSION
+        GTEST_SKIP()
+            << "the unwinder of libc++ cannot unwind a cancelled thread: glibc begins that with GCC's";
+#endif
+    }
+    void TearDown() override
+    {
+        VXLog::setRecordSink(before_);
+    }
 
 private:
     VXLog::RecordSink before_;

@@ -1,7 +1,7 @@
 #pragma once
 
 #include <ostream>
-#include <sstream>
+#include <streambuf>
 #include <string>
 
 namespace VXLog {
@@ -29,9 +29,20 @@ public:
     const std::string& str(VXMessageBuffer& last);
 
 private:
+    // Throws std::bad_alloc if memory runs out; the buffer of a string stream need not.
+    class Composed : public std::streambuf {
+    public:
+        std::string text = std::string();
+
+    protected:
+        int_type overflow(int_type character) override;
+        std::streamsize xsputn(const char* characters, std::streamsize count) override;
+    };
+
     const std::string& take();
 
-    std::stringstream stream_;
+    Composed composed_;
+    std::ostream stream_;
     std::string text_;
     bool streamReturned_ = false;
 };
