@@ -1,6 +1,7 @@
 #!/bin/sh
 # Fails unless the library given exports its public names and nothing else: exports.sh LIBRARY INCLUDE-FOLDER
 set -eu
+export LC_ALL=C  # in Turkish, I is not between A and Z
 library=$1
 include=$2
 [ -f "$library" ] || { echo "no library $library" >&2; exit 1; }
