@@ -138,8 +138,10 @@ pkg_config)
     pkg_config "$work/absolute" "$work/absolute-libraries" g++ 20 --static
     ;;
 add_subdirectory)
-    subproject "$source" shared g++ 20
+    subproject "$source" shared g++ 20 -DCMAKE_BUILD_TYPE=RelWithDebInfo
     subproject "$source" static g++ 20
+    # The project's debugger finds the library's sources by their full paths.
+    ! grep -F -e -prefix-map "$work/build/build.ninja" || fail "the library changes the paths in debug information"
     ;;
 FetchContent)
     # A release must hold at least these.
