@@ -6,6 +6,7 @@
 #include <string>
 #include <type_traits>
 
+#include "IC/detail/Arguments.h"
 #include "IC/detail/Export.h"
 #include "ZQ/Types.h"
 
@@ -27,20 +28,6 @@ struct sNodeRef;
 ///
 /// `state == 7u` is ambiguous: write `state == EnumValue(7u)`. So is `state = 7`, with a signed number.
 class IC_EXPORT EnumValue {
-    // What the constructors from integers take. The enumerations among them convert without a cast, so the explicit
-    // constructor must not be the better match for them.
-    struct Integers {
-        void operator()(const unsigned char&);
-        void operator()(const unsigned short&);
-        void operator()(const unsigned int&);
-    };
-    template <class T>
-    static constexpr bool isInteger = std::is_invocable_v<Integers, T>;
-    template <class T>
-    static constexpr bool isEnumeration = std::is_enum_v<T> && sizeof(T) <= sizeof(ZQ::Uint32);
-    template <class T>
-    static constexpr bool isTooLarge = std::is_enum_v<T> && sizeof(T) > sizeof(ZQ::Uint32);
-
 public:
     /// @name Construction
     ///@{
@@ -53,7 +40,8 @@ public:
 
     /// The value of an enumerator; a negative one becomes 2^31 or more. An enumeration that converts to one of the
     /// integers above without a cast, such as Node::SensorType, still converts so.
-    template <class Enum, std::enable_if_t<isEnumeration<Enum> && !isInteger<Enum>, int> = 0>
+    template <class Enum,
+              std::enable_if_t<detail::isEnumeration<Enum> && !detail::isEnumValueInteger<Enum>, int> = 0>
     explicit EnumValue(Enum value) noexcept
         : value_(
             static_cast<ZQ::Uint32>(static_cast<std::underlying_type_t<Enum>>(value)))  // extends the sign
@@ -61,7 +49,7 @@ public:
     }
 
     /// Deleted: an enumeration of 64 bits.
-    template <class Enum, std::enable_if_t<isTooLarge<Enum>, int> = 0>
+    template <class Enum, std::enable_if_t<detail::isTooLargeEnumeration<Enum>, int> = 0>
     explicit EnumValue(Enum) = delete;
 
     ///@}
@@ -75,7 +63,7 @@ public:
 
     /// The enumerator with this value, also a negative one. Throws std::out_of_range if the type of the enumeration
     /// cannot hold it. If that type is not fixed, the value must be in the range of the enumerators.
-    template <class Enum, std::enable_if_t<isEnumeration<Enum>, int> = 0>
+    template <class Enum, std::enable_if_t<detail::isEnumeration<Enum>, int> = 0>
     explicit operator Enum() const
     {
         return static_cast<Enum>(as<std::underlying_type_t<Enum>>());

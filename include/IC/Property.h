@@ -12,6 +12,7 @@
 #include "IC/EnumValue.h"
 #include "IC/ICException.h"
 #include "IC/Number.h"
+#include "IC/detail/Arguments.h"
 #include "IC/detail/Export.h"
 #include "ZQ/Types.h"
 
@@ -60,22 +61,6 @@ public:
         KIND_STRINGARRAY = 6   ///< a StringArray
     };
 
-private:
-    // What converts to a byte, and is neither a byte nor a kind. An int is the code of a kind, with a warning.
-    template <class T>
-    static constexpr bool notAKind = std::disjunction_v<
-        std::is_same<T, std::vector<bool>::reference>,
-        std::conjunction<std::is_enum<T>, std::negation<std::is_same<T, KindType>>>,
-        std::conjunction<
-            std::negation<std::disjunction<std::is_class<T>, std::is_enum<T>, std::is_same<T, unsigned char>,
-                                           std::is_same<T, int>>>,
-            std::is_convertible<T, unsigned char>>>;
-    template <class T>
-    static constexpr bool isMark = std::disjunction_v<std::is_same<std::remove_cv_t<T>, bool>,
-                                                      std::is_same<T, std::vector<bool>::reference>,
-                                                      std::is_same<T, std::vector<bool>::const_reference>>;
-
-public:
     /// @name Construction
     ///@{
 
@@ -110,11 +95,19 @@ public:
 
     /// Deleted: other integers, flags, reals and other enumerations would become a kind code. Write Number(value) or
     /// EnumValue(value).
-    template <class T, std::enable_if_t<notAKind<T>, int> = 0>
+    template <class T, std::enable_if_t<detail::isNotAKind<T, KindType>, int> = 0>
     PropertyValue(T, const bool& = false) = delete;
 
+    /// Deleted: the same for an object that converts to a number and to nothing else that a value holds, such as a
+    /// std::atomic<unsigned int> or an element of a std::vector<bool>. Write Number(counter.load()) or
+    /// Number(bool {element}).
+    template <class T,
+              std::enable_if_t<
+                  detail::isObjectOfNumber<T, KindType> && !detail::hasConversion<T, PropertyValue>, int> = 0>
+    PropertyValue(T&&, const bool& = false) = delete;
+
     /// Deleted: a mark that is no bool, such as a text or a number, would be true. Write true or false.
-    template <class T, class Mark, std::enable_if_t<!isMark<Mark>, int> = 0>
+    template <class T, class Mark, std::enable_if_t<!detail::isMark<Mark>, int> = 0>
     PropertyValue(const T&, const Mark&) = delete;
 
     /// A copy has the source's mark. A moved-from value has the kind KIND_UNKNOWN and keeps its mark.

@@ -1,3 +1,5 @@
+#include <atomic>
+#include <bitset>
 #include <cstddef>
 #include <functional>
 #include <stdexcept>
@@ -57,6 +59,11 @@ static_assert(std::is_nothrow_swappable_v<PropertyValue>);
 static_assert(noexcept(std::declval<PropertyValue&>().swap(std::declval<PropertyValue&>())));
 static_assert(std::is_nothrow_destructible_v<PropertyValue>);
 
+template <class Type>
+struct Convertible {
+    operator Type() const;
+};
+
 // Each constructor takes the value, and optionally the read-only mark.
 template <class Value>
 constexpr bool makesProperty =
@@ -84,7 +91,6 @@ static_assert(!std::is_constructible_v<PropertyValue, IC::Alert::SeverityType>);
 static_assert(!std::is_constructible_v<PropertyValue, IC::Alert::ClassType>);
 static_assert(!std::is_constructible_v<PropertyValue, IC::Node::SensorType>);
 static_assert(!std::is_constructible_v<PropertyValue, IC::Node::StatusType, bool>);
-static_assert(!std::is_constructible_v<PropertyValue, std::vector<bool>::reference>);
 template <class... Integer>
 constexpr bool noneMakesProperty = (!std::is_constructible_v<PropertyValue, Integer> && ...)
     && (!std::is_constructible_v<PropertyValue, Integer, bool> && ...);
@@ -93,6 +99,33 @@ static_assert(noneMakesProperty<char, signed char, wchar_t, char16_t, char32_t, 
 static_assert(noneMakesProperty<const unsigned int&, unsigned int&>);
 static_assert(!std::is_assignable_v<PropertyValue&, unsigned int>);
 static_assert(makesProperty<int>);  // deprecated
+static_assert(noneMakesProperty<std::vector<bool>::reference, std::bitset<8>::reference, std::true_type,
+                                std::integral_constant<int, 5>, std::atomic<unsigned int>&,
+                                const std::atomic<long long>&, std::reference_wrapper<unsigned int>,
+                                std::reference_wrapper<const double>>);
+
+// An object that converts to what a constructor takes, or to a property value, may convert to a number too.
+template <class... Types>
+struct ConvertsTo : Convertible<Types>... {
+};
+static_assert(makesProperty<ConvertsTo<std::string>>);
+static_assert(makesProperty<ConvertsTo<const char*>>);
+static_assert(makesProperty<ConvertsTo<Number>>);
+static_assert(makesProperty<ConvertsTo<EnumValue>>);
+static_assert(makesProperty<ConvertsTo<IC::StringArray>>);
+static_assert(makesProperty<ConvertsTo<PropertyValue::KindType>>);
+static_assert(makesProperty<std::reference_wrapper<unsigned char>>);
+static_assert(std::is_convertible_v<ConvertsTo<PropertyValue>, PropertyValue>);
+static_assert(std::is_convertible_v<ConvertsTo<PropertyValue, unsigned int>, PropertyValue>);
+static_assert(std::is_convertible_v<ConvertsTo<const PropertyValue&, unsigned int>, PropertyValue>);
+static_assert(makesProperty<IC::NodeRef>);
+static_assert(makesProperty<IC::Version2>);
+struct OwnText : std::string {
+    operator unsigned int() const { return 0; }
+};
+struct OwnNumber : Number { };
+static_assert(makesProperty<OwnText>);
+static_assert(makesProperty<OwnNumber>);
 
 // As the mark, these would silently be true or false.
 template <class Mark>

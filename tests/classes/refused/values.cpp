@@ -1,6 +1,10 @@
 // Calls that would silently take a wrong value.
 #include "IC/Alert.h"
 #include "IC/Node.h"
+#include <atomic>
+#include <bitset>
+#include <functional>
+#include <type_traits>
 #include <vector>
 
 enum class Long : long long { None };
@@ -15,6 +19,11 @@ extern unsigned int speed;
 extern long offset;
 extern char letter;
 extern std::vector<bool> flags;
+extern const std::vector<bool> constantFlags;
+extern std::bitset<8> bits;
+extern std::atomic<unsigned int> counter;
+extern const std::atomic<long> constantCounter;
+extern std::atomic<bool> changed;
 
 void kinds()
 {
@@ -23,8 +32,25 @@ void kinds()
     value = speed;               // does not compile: deleted
     value = offset;              // does not compile: deleted
     value = letter;              // does not compile: deleted
-    value = flags[0];            // does not compile: deleted
     value = 5;  // does not compile: an integer is a kind code: write Number(value), or a KindType
+}
+
+void objects()
+{
+    value = IC::PropertyValue(IC::Number(counter.load()));
+    value = IC::PropertyValue(IC::Number(bool {flags[0]}));
+    value = flags[0];                                     // does not compile: deleted
+    value = IC::PropertyValue(flags[0]);                  // does not compile: deleted
+    value = IC::PropertyValue(flags[0], true);            // does not compile: deleted
+    value = IC::PropertyValue(bits[0]);                   // does not compile: deleted
+    value = IC::PropertyValue(counter);                   // does not compile: deleted
+    value = IC::PropertyValue(constantCounter);           // does not compile: deleted
+    value = IC::PropertyValue(changed, flags[0]);         // does not compile: deleted
+    value = IC::PropertyValue(std::ref(speed));           // does not compile: deleted
+    value = IC::PropertyValue(std::true_type());          // does not compile: deleted
+    value = IC::PropertyValue {std::true_type()};         // does not compile: deleted
+    node.setProperty(2, {std::true_type()});              // does not compile: deleted
+    const IC::PropertyValue reference(std::ref(letter));  // does not compile: deleted
 }
 
 void marks()
