@@ -6,8 +6,7 @@
 int main()
 {
     const Fan fan;
-    ZQ::DateTime time(1234567890, 3);  // without a time: the current time
-    const IC::Alert alert(time, 2, 1, {fan.getPath()}, 5, "Fan failed");
+    const IC::Alert alert(ZQ::DateTime(1234567890, 3), 2, 1, {fan.getPath()}, 5, "Fan failed");
     std::cout << alert << '\n';
     std::cout << "severity " << +alert.getSeverity() << ": " << alert.getMessage() << '\n';
     for (const auto& path : alert.getNodePaths())
