@@ -366,6 +366,21 @@ TEST(Json, ADerivedNodeGivesTheDocumentOfItsBase)
               R"("properties":{},"sensor":0,"status":0})");
 }
 
+struct OwnFan : Fan {
+    friend void to_json(json& document, const OwnFan& /*fan*/) { document = "own"; }
+};
+struct OwnValue : PropertyValue {
+    using PropertyValue::PropertyValue;
+    friend void to_json(json& document, const OwnValue& /*value*/) { document = "own"; }
+};
+
+// Unlike that of a class that derives from another value.
+TEST(Json, ToJsonOfAnOwnNodeClassIsNotCalled)
+{
+    EXPECT_EQ(json(OwnFan()).dump(), fanDocument);
+    EXPECT_EQ(json(OwnValue("a")).dump(), R"("own")");
+}
+
 TEST(Json, AStoredNodeHasWhatTheNodeHad)
 {
     const Fan fan;
@@ -428,6 +443,9 @@ TEST(Json, ReadsWhatOtherProgramsWriteForTheSameValue)
     } rows[] = {
         {R"({"kind":"real","value":3600})", 3600.0},
         {R"({"kind":"real","value":-7})", -7.0},
+        {R"({"kind":"real","value":-0})", 0.0},  // the JSON library's integer has no sign
+        {R"({"kind":"int","value":-0})", 0},
+        {R"({"kind":"uint32","value":-0})", 0u},
         {R"({"kind":"real","value":9223372036854776000})", 0x1p63},
         {R"({"kind":"real","value":{"bits":"3ff0000000000000"}})", 1.0},
         {R"({"kind":"bool","value":0})", false},
@@ -710,6 +728,34 @@ TEST(Json, RefusesOtherClassesWithTheirPlace)
         EXPECT_EQ(refusal<IC::StoredNode>(document), text);
         EXPECT_THAT(observe::records(), testing::IsEmpty());
     }
+}
+
+TEST(Json, InAVectorThePlaceIsRelativeToTheElement)
+{
+    EXPECT_EQ(refusal<std::vector<PropertyValue>>(
+                  json::parse(R"([{"kind":"int","value":5},{"kind":"int","value":null}])")),
+              R"(at "/value": expected an integer from -2147483648 to 2147483647)");
+}
+
+TEST(Json, RefusesADeepDocument)
+{
+    const std::size_t depth = 100000;
+    const std::string deep = std::string(depth, '[') + std::string(depth, ']');
+    const json document = json::parse(deep);
+    EXPECT_EQ(refusal<Number>(document), R"(at "": expected an object)");
+    EXPECT_EQ(refusal<IC::EnumValue>(document), R"(at "": expected an integer from 0 to 4294967295)");
+    EXPECT_EQ(refusal<PropertyValue>(document), R"(at "": expected an object)");
+    EXPECT_EQ(refusal<Properties>(document), R"(at "": expected an object)");
+    EXPECT_EQ(refusal<IC::Error>(document), R"(at "": expected an object)");
+    EXPECT_EQ(refusal<IC::Alert>(document), R"(at "": expected an object)");
+    EXPECT_EQ(refusal<IC::StoredNode>(document), R"(at "": expected an object)");
+    EXPECT_EQ(refusal<Number>(json::parse(R"({"kind":"real","value":)" + deep + "}")),
+              R"(at "/value": expected a string)");
+    EXPECT_EQ(refusal<PropertyValue>(json::parse(R"({"kind":"numberArray","value":)" + deep + "}")),
+              R"(at "/value/0": expected an object)");
+    EXPECT_EQ(refusal<PropertyValue>(json::parse(R"({"kind":"stringArray","value":)" + deep + "}")),
+              R"(at "/value/0": expected a string)");
+    EXPECT_EQ(refusal<Properties>(json::parse(R"({"1":)" + deep + "}")), R"(at "/1": expected an object)");
 }
 
 TEST(Json, ARefusalLeavesTheTargetUnchanged)

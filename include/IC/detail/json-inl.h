@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -346,11 +347,11 @@ Json realToJson(ZQ::Uint64 bits, ZQ::Real64 real)
         return Json("infinity");
     if (bits == negativeInfiniteBits)
         return Json("-infinity");
-    Buffer bytes;
+    std::string digits;
     for (unsigned int shift = 64; shift > 0; shift -= 8)
-        bytes.push_back(static_cast<unsigned char>(bits >> (shift - 8) & 0xFF));
+        digits += pB(static_cast<unsigned char>(bits >> (shift - 8) & 0xFF));
     Json json = Json::object();
-    json["bits"] = jsonHex(bytes);
+    json["bits"] = digits;
     return json;
 }
 
@@ -414,8 +415,20 @@ struct NumberWriter {
     Json operator()(InvalidKind invalid) const { return Json(static_cast<ZQ::Uint32>(invalid.kind)); }
 };
 
-template <class Json>
-Number readNumber(const JsonPlace<Json>& place);
+// What setKind and initKind left in the storage, which another setKind can bring back: all but what the kind shows.
+inline NumberStorage leftOver(const Number& number)
+{
+    Number rest = number;
+    visit(number, [&rest](const auto& shown) {
+        using Shown = std::decay_t<decltype(shown)>;
+        if constexpr (std::is_same_v<Shown, ZQ::DateTime>)
+            JsonAccess::storeDateTime(rest, 0, 0, 0);
+        else if constexpr (std::is_arithmetic_v<
+                               Shown> || std::is_same_v<Shown, Version2> || std::is_same_v<Shown, NodeRef>)
+            JsonAccess::store(rest, Shown());
+    });
+    return JsonAccess::storageOf(rest);
+}
 
 template <class Json>
 Json toJson(const Number& number)
@@ -424,8 +437,7 @@ Json toJson(const Number& number)
     Json json = Json::object();
     json["kind"] = jsonNumberKinds[std::min<ZQ::Uint32>(number.getKind(), jsonInvalidKind)];
     json["value"] = visit(number, NumberWriter<Json> {storage, JsonAccess::flagOf(number)});
-    // What setKind and initKind left in the storage, which another setKind can bring back.
-    if (!(JsonAccess::storageOf(readNumber(JsonPlace<Json>(json))) == storage))
+    if (!(leftOver(number) == NumberStorage {}))
         json["storage"] = Json::array(
             {storage.bits, storage.milliseconds, storage.scope, storage.nodeRef.type, storage.nodeRef.id});
     return json;
@@ -638,13 +650,11 @@ PropertyMap read(const JsonPlace<Json>& place, Wanted<PropertyMap>)
 {
     PropertyMap properties;
     place.forEachMember([&properties](const std::string& key, const JsonPlace<Json>& value) {
-        const bool isNumber = !key.empty() && key.size() <= 10
-            && key.find_first_not_of("0123456789") == std::string::npos && (key[0] != '0' || key.size() == 1);
-        const unsigned long long number =
-            isNumber ? std::stoull(key) : std::numeric_limits<ZQ::Uint64>::max();
-        if (number > std::numeric_limits<unsigned int>::max())
+        unsigned int number = 0;
+        std::from_chars(key.data(), key.data() + key.size(), number);
+        if (std::to_string(number) != key)
             value.fail("expected a property number as the key");
-        properties.emplace(static_cast<unsigned int>(number), read(value, Wanted<PropertyValue>()));
+        properties.emplace(number, read(value, Wanted<PropertyValue>()));
     });
     return properties;
 }
