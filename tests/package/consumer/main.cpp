@@ -218,6 +218,8 @@ void useAlert()
               << +moved.operator IC::Alert::ClassType() << ' ' << ZQ::Uint32 {moved.getStatus()} << ' '
               << ZQ::Uint32 {moved.operator IC::Node::StatusType()} << ' ' << moved.getNodePaths().size()
               << ' ' << moved.getMessage() << ' ' << moved.hexstring("/a") << '\n';
+    const ZQ::DateTime constantTime(1234567890, 3);
+    insert(Alert(constantTime, Alert::SEVERITY_SMALLEST, Alert::CLASS_SMALLEST, {"/a"}, 0, "Fan works"));
     refuse<std::invalid_argument>([] { return Alert(4, 0, {}, 0, ""); });
 }
 
