@@ -70,29 +70,32 @@ std::string Alert::hexstring(const std::string& text) const
 
 Alert::operator std::string() const
 {
-    detail::Text text;
-    text.add("Alert ");
-    text.add(static_cast<unsigned int>(severity_));
-    text.add("; ");
-    text.add(static_cast<unsigned int>(alertClass_));
-    text.add("; ");
-    text.add(static_cast<unsigned int>(status_));
-    text.add("; ");
-    text.add(message_);
-    text.add("; ");
-    text.addStreamed(timeStamp_);
-    text.add("; { ");
-    for (const std::string& path : nodePaths_) {
-        text.add(hexstring(path));
-        text.add(' ');
+    return detail::textOf(*this);
+}
+
+void detail::Text::append(const Alert& alert)
+{
+    add("Alert ");
+    add(static_cast<unsigned int>(alert.severity_));
+    add("; ");
+    add(static_cast<unsigned int>(alert.alertClass_));
+    add("; ");
+    add(static_cast<unsigned int>(alert.status_));
+    add("; ");
+    add(alert.message_);
+    add("; ");
+    addStreamed(alert.timeStamp_);
+    add("; { ");
+    for (const std::string& path : alert.nodePaths_) {
+        add(alert.hexstring(path));
+        add(' ');
     }
-    text.add('}');
-    return text.take();
+    add('}');
 }
 
 std::ostream& operator<<(std::ostream& out, const Alert& alert)
 {
-    return out << std::string(alert);
+    return detail::insert(out, alert);
 }
 
 }  // namespace IC

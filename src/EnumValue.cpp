@@ -67,7 +67,7 @@ bool operator>=(const EnumValue& a, const EnumValue& b)
 
 std::ostream& operator<<(std::ostream& out, const EnumValue& value)
 {
-    return out << std::string(value);
+    return detail::insert(out, value);
 }
 
 void detail::Text::append(const EnumValue& value)

@@ -50,22 +50,25 @@ void Error::refuse(unsigned char status)
 
 Error::operator std::string() const
 {
-    detail::Text text;
-    text.add(static_cast<unsigned int>(status_));
-    if (value_.getKind() != Number::KIND_UNKNOWN) {
-        text.add(" - ");
-        text.append(value_);
+    return detail::textOf(*this);
+}
+
+void detail::Text::append(const Error& error)
+{
+    add(static_cast<unsigned int>(error.status_));
+    if (error.value_.getKind() != Number::KIND_UNKNOWN) {
+        add(" - ");
+        append(error.value_);
     }
-    if (!message_.empty()) {
-        text.add(" - ");
-        text.add(message_);
+    if (!error.message_.empty()) {
+        add(" - ");
+        add(error.message_);
     }
-    return text.take();
 }
 
 std::ostream& operator<<(std::ostream& out, const Error& error)
 {
-    return out << std::string(error);
+    return detail::insert(out, error);
 }
 
 }  // namespace IC

@@ -449,7 +449,12 @@ bool operator>=(const Number& a, const Number& b)
 
 std::ostream& operator<<(std::ostream& out, const Number& number)
 {
-    return out << std::string(number);
+    if (number.kind_ == Number::KIND_UINT32 && detail::globalLocaleIsClassic()) {  // the most frequent kind
+        char digits[10];
+        const char* const end = detail::writeDecimal(digits, number.load<ZQ::Uint32>());
+        return out << std::string_view(digits, static_cast<std::size_t>(end - digits));
+    }
+    return detail::insert(out, number);
 }
 
 template <class Text>

@@ -50,24 +50,30 @@ bool isLess(const std::vector<Element>& a, const std::vector<Element>& b)
 }
 
 template <class T>
-std::string textOf(const T& object)
+void addObject(detail::Text& text, const T& object)
 {
-    return object;
+    text.append(object);
 }
 
-std::string textOf(const Buffer& bytes)
+void addObject(detail::Text& text, const std::string& content)
 {
-    std::string text(2 * bytes.size() + bytes.size() / 4, ' ');
-    char* out = text.data();
-    const unsigned char* byte = bytes.data();
-    for (std::size_t groups = bytes.size() / 4; groups > 0; --groups) {
-        out = detail::writeHex(detail::writeHex(out, byte[0]), byte[1]);
-        out = detail::writeHex(detail::writeHex(out, byte[2]), byte[3]) + 1;  // over the blank
-        byte += 4;
-    }
-    for (std::size_t rest = bytes.size() % 4; rest > 0; --rest)
-        out = detail::writeHex(out, *byte++);
-    return text;
+    text.add(content);
+}
+
+void addObject(detail::Text& text, const Buffer& bytes)
+{
+    text.write(2 * bytes.size() + bytes.size() / 4, [&bytes](char* out) {
+        const unsigned char* byte = bytes.data();
+        for (std::size_t groups = bytes.size() / 4; groups > 0; --groups) {
+            out = detail::writeHex(detail::writeHex(out, byte[0]), byte[1]);
+            out = detail::writeHex(detail::writeHex(out, byte[2]), byte[3]);
+            *out++ = ' ';
+            byte += 4;
+        }
+        for (std::size_t rest = bytes.size() % 4; rest > 0; --rest)
+            out = detail::writeHex(out, *byte++);
+        return out;
+    });
 }
 
 void addQuoted(detail::Text& text, std::string_view content)
@@ -82,17 +88,11 @@ void addQuoted(detail::Text& text, std::string_view content)
     text.add('"');
 }
 
-std::string textOf(const NumberArray& numbers)
-{
-    return detail::textOf(numbers);
-}
-
-std::string textOf(const StringArray& texts)
+void addObject(detail::Text& text, const StringArray& texts)
 {
     std::size_t length = 2;
     for (const std::string& content : texts)
         length += content.size() + 4;
-    detail::Text text;
     text.reserve(length);
     const char* separator = "{";
     for (const std::string& content : texts) {
@@ -101,7 +101,6 @@ std::string textOf(const StringArray& texts)
         separator = ", ";
     }
     text.add(texts.empty() ? "{}" : "}");
-    return text.take();
 }
 
 }  // namespace
@@ -253,11 +252,19 @@ std::string PropertyValue::toText() const
 {
     if (holds(KIND_NUMBER))
         return object<Number>();
-    if (kind_ == KIND_UNKNOWN)
-        return "unknown";
-    if (value_ == nullptr)
-        return "invalid";
-    return visit(kind_, [this](auto held) { return textOf(object<typename decltype(held)::Type>()); });
+    return detail::textOf(*this);
+}
+
+void detail::Text::append(const PropertyValue& value)
+{
+    if (value.kind_ == PropertyValue::KIND_UNKNOWN)
+        add("unknown");
+    else if (value.value_ == nullptr)
+        add("invalid");
+    else
+        PropertyValue::visit(value.kind_, [this, &value](auto held) {
+            addObject(*this, value.object<typename decltype(held)::Type>());
+        });
 }
 
 bool PropertyValue::equal(const PropertyValue& a, const PropertyValue& b)
@@ -329,7 +336,11 @@ std::string pB(unsigned char byte)
 
 std::ostream& operator<<(std::ostream& out, const PropertyValue& value)
 {
-    return out << std::string(value);
+    if (value.holds(PropertyValue::KIND_STRING))
+        return out << value.object<std::string>();
+    if (value.holds(PropertyValue::KIND_NUMBER))
+        return out << value.object<Number>();
+    return detail::insert(out, value);
 }
 
 std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, PropertyValue>& property)
@@ -337,15 +348,12 @@ std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, Proper
     return out << property.first << " = " << property.second;
 }
 
-// Joins the text between two keys into one piece, because each insertion costs more than joining.
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties)
 {
-    if (!properties.empty())
-        out << '[';
     for (auto property = properties.begin(); property != properties.end();) {
         const auto& [key, value] = *property;
-        const char* const end = ++property == properties.end() ? "]" : "], [";
-        out << key << " = " + std::string(value) + end;
+        const bool last = ++property == properties.end();
+        out << '[' << key << " = " << value << (last ? "]" : "], ");
     }
     return out;
 }

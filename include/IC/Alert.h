@@ -98,6 +98,8 @@ public:
     ///@}
 
 private:
+    friend class detail::Text;
+
     void init(ZQ::DateTime& timeStamp, unsigned char severity, unsigned char alertClass,
               std::vector<std::string> nodePaths, unsigned int status, std::string message);
 

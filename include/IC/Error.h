@@ -82,6 +82,8 @@ public:
     ///@}
 
 private:
+    friend class detail::Text;
+
     inline void initStatus(unsigned char status);
     [[noreturn, gnu::cold]] static void refuse(unsigned char status);
 

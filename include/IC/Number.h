@@ -171,6 +171,7 @@ private:
     friend bool operator<(const Number& a, const Number& b);
     friend bool operator>(const Number& a, const Number& b);
     friend struct std::hash<Number>;
+    friend std::ostream& operator<<(std::ostream& out, const Number& number);
     friend class detail::Text;
     friend struct detail::JsonAccess;
     friend struct detail::Visit;

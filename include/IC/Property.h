@@ -187,7 +187,9 @@ private:
     friend bool operator==(const PropertyValue& a, const PropertyValue& b);
     friend bool operator<(const PropertyValue& a, const PropertyValue& b);
     friend bool operator>(const PropertyValue& a, const PropertyValue& b);
+    friend std::ostream& operator<<(std::ostream& out, const PropertyValue& value);
     friend struct std::hash<PropertyValue>;
+    friend class detail::Text;
     friend struct detail::JsonAccess;
     friend struct detail::Visit;
 

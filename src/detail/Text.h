@@ -15,8 +15,11 @@
 #include "detail/Digits.h"
 
 namespace IC {
+class Alert;
 class EnumValue;
+class Error;
 class Number;
+class PropertyValue;
 }  // namespace IC
 
 namespace IC::detail {
@@ -64,6 +67,9 @@ public:
     void append(const Number& number);
     void append(const std::vector<Number>& numbers);
     void append(const EnumValue& value);
+    void append(const PropertyValue& value);
+    void append(const Error& error);
+    void append(const Alert& alert);
 
     // Adds what the type's own stream insertion writes.
     template <class T>
@@ -75,6 +81,9 @@ public:
         out.exceptions(std::ios_base::badbit);
         out << piece;
     }
+
+    // Good until the next piece is added.
+    std::string_view view() const { return {text_, used_}; }
 
     std::string take()
     {
@@ -151,6 +160,15 @@ std::string textOf(const Value& value)
     Text text;
     text.append(value);
     return text.take();
+}
+
+// Inserts the text form of one value, from where it is composed.
+template <class Value>
+std::ostream& insert(std::ostream& out, const Value& value)
+{
+    Text text;
+    text.append(value);
+    return out << text.view();
 }
 
 }  // namespace IC::detail

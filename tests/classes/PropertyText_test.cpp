@@ -3,6 +3,7 @@
 #include <map>
 #include <sstream>
 #include <stdexcept>
+#include <streambuf>
 #include <string>
 #include <type_traits>
 #include <utility>
@@ -655,6 +656,104 @@ TEST(PropertyStream, WritesAMapWithoutTheReadOnlyMarks)
     std::ostringstream out;
     out << PropertyMap {{1, PropertyValue("a", true)}, {2, PropertyValue("b", false)}};
     EXPECT_EQ(out.str(), "[1 = a], [2 = b]");
+}
+
+// Takes so many characters and fails from then on.
+class Narrow : public std::streambuf {
+public:
+    explicit Narrow(std::size_t room) : room_(room) { }
+
+    std::string taken;
+    int flushes = 0;
+
+protected:
+    int_type overflow(int_type character) override
+    {
+        if (taken.size() == room_)
+            return traits_type::eof();
+        taken += traits_type::to_char_type(character);
+        return character;
+    }
+    int sync() override
+    {
+        ++flushes;
+        return 0;
+    }
+
+private:
+    std::size_t room_;
+};
+
+TEST(PropertyStream, WritesAsMuchOfAMapAsTheStreamTakes)
+{
+    const PropertyMap map {{1, text("abc")}, {22, numbers({Number(1u), Number(-2)})}, {300, text("")}};
+    const std::string whole = "[1 = abc], [22 = {1, -2}], [300 = ]";
+    for (std::size_t room = 0; room < whole.size(); ++room) {
+        SCOPED_TRACE(room);
+        Narrow narrow(room);
+        std::ostream out(&narrow);
+        out << map;
+        EXPECT_EQ(narrow.taken, whole.substr(0, room));
+        // Each piece after the one that the stream could not take fails, too. The last piece is "]".
+        const bool last = room == whole.size() - 1;
+        EXPECT_EQ(out.rdstate(),
+                  last ? std::ios_base::badbit : std::ios_base::badbit | std::ios_base::failbit);
+    }
+    Narrow wide(whole.size());
+    std::ostream out(&wide);
+    out << map;
+    EXPECT_EQ(wide.taken, whole);
+    EXPECT_TRUE(out.good());
+}
+
+TEST(PropertyStream, WritesAMapInFivePiecesForEachProperty)
+{
+    Narrow narrow(100);
+    std::ostream out(&narrow);
+    out << std::unitbuf << PropertyMap {{1, text("abc")}, {2, text("d")}};
+    EXPECT_EQ(narrow.taken, "[1 = abc], [2 = d]");
+    EXPECT_EQ(narrow.flushes, 10);
+}
+
+TEST(PropertyStream, KeepsThePiecesBeforeAValueThatThrows)
+{
+    const Number dateTime(5L, 123);
+    const PropertyMap map {{1, text("abc")}, {4, numbers({Number(7u), dateTime})}};
+    for (int nth = 1; nth <= 10;
+         ++nth) {  // what the text of such a date-time calls: NumberText.OfADateTime...
+        SCOPED_TRACE(nth);
+        observe::reset();
+        observe::throwAt(observe::Call::any, nth);
+        std::ostringstream out;
+        EXPECT_THROW(out << map, observe::Thrown);
+        EXPECT_EQ(out.str(), "[1 = abc], [4 = ");
+        EXPECT_TRUE(out.good());
+
+        observe::reset();
+        observe::throwAt(observe::Call::any, nth);
+        std::ostringstream pair;
+        EXPECT_THROW(pair << *map.rbegin(), observe::Thrown);
+        EXPECT_EQ(pair.str(), "4 = ");
+    }
+    observe::reset();
+    observe::throwAt(observe::Call::any, 11);
+    std::ostringstream out;
+    out << map;
+    EXPECT_EQ(out.str(), "[1 = abc], [4 = {7, 5/3.Conversion failed remainder>0}]");
+}
+
+TEST(PropertyStream, AllocatesNothingForAShortTextOrAHeldOne)
+{
+    std::vector<PropertyValue> values = samples();
+    values.push_back(numbers(NumberArray(20, Number(4294967295u))));
+    values.push_back(text(std::string(1000, 'x')));
+    for (const PropertyValue& value : values) {
+        Narrow narrow(1000);
+        narrow.taken.reserve(1000);
+        std::ostream out(&narrow);
+        EXPECT_EQ(allocation::countOf([&] { out << value; }), 0) << narrow.taken;
+        EXPECT_EQ(narrow.taken, std::string(value));
+    }
 }
 
 TEST(PropertyByteText, IsTwoLowerCaseHexadecimalDigits)
