@@ -505,30 +505,40 @@ void detail::Text::append(const Number& number)
     number.write(*this);
 }
 
-// Writes each run of 32-bit numbers, the most frequent kind, at once.
+// Writes integers and reals in place, with the ends of the text and of its room in registers.
 void detail::Text::append(const std::vector<Number>& numbers)
 {
-    const auto isUint32 = [](const Number& number) { return number.getKind() == Number::KIND_UINT32; };
+    constexpr std::size_t longest = 22;      // 18446744073709551615 and ", "
+    reserve(12 * numbers.size() + longest);  // 4294967295 and ", "; most numbers are shorter
     add('{');
-    const auto end = numbers.end();
-    for (auto number = numbers.begin(); number != end;) {
-        const auto other = std::find_if_not(number, end, isUint32);
-        if (other != number && !locale_) {
-            const std::size_t longest = 12 * static_cast<std::size_t>(other - number);  // 4294967295 and ", "
-            write(longest, [run = number, other](char* out) mutable {
-                for (; run != other; ++run) {
-                    out = writeDecimal(out, run->load<ZQ::Uint32>());
-                    *out++ = ',';
-                    *out++ = ' ';
-                }
-                return out;
-            });
-            number = other;
-        } else {
-            append(*number++);
-            add(", ");
+    const bool plain = !locale_;
+    char* out = text_ + used_;
+    const char* last = text_ + room_ - longest;
+    for (const Number& number : numbers) {
+        if (out > last) {
+            used_ = static_cast<std::size_t>(out - text_);
+            out = room(longest);
+            last = text_ + room_ - longest;
         }
+        const auto kind = plain ? number.kind_ : Number::KIND_UNKNOWN;
+        if (kind == Number::KIND_UINT32) {
+            out = writeDecimal(out, number.load<ZQ::Uint32>());
+        } else if (kind == Number::KIND_REAL) {
+            out = writeReal(out, number.load<ZQ::Real64>());
+        } else if (kind == Number::KIND_INT) {
+            out = writeInteger(out, number.load<int>());
+        } else if (kind == Number::KIND_UINT64) {
+            out = writeDecimal(out, number.load<ZQ::Uint64>());
+        } else {
+            used_ = static_cast<std::size_t>(out - text_);
+            append(number);
+            out = room(longest);
+            last = text_ + room_ - longest;
+        }
+        *out++ = ',';
+        *out++ = ' ';
     }
+    used_ = static_cast<std::size_t>(out - text_);
     if (!numbers.empty())
         remove(2);
     add('}');

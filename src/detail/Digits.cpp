@@ -3,50 +3,98 @@
 #include <algorithm>
 #include <charconv>
 #include <cmath>
+#include <cstdlib>
 
 namespace IC::detail {
 
 namespace {
 
-// Writes a real with six significant digits if one multiplication finds them for certain; otherwise returns null.
+// The powers of ten that a double holds exactly.
+constexpr double powers[] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,  1e7,  1e8,  1e9,  1e10, 1e11,
+                             1e12, 1e13, 1e14, 1e15, 1e16, 1e17, 1e18, 1e19, 1e20, 1e21, 1e22};
+constexpr int largestPower = 22;
+
+// The decimal exponent of 2^exponent, for |exponent| < 1650.
+constexpr int decimalExponent(int exponent)
+{
+    return exponent * 315653 >> 20;
+}
+
+// The six digits of a number, each in a byte, the first in the lowest.
+std::uint64_t sixDigits(std::uint32_t number)
+{
+    const auto pair = [](std::uint32_t two) {
+        const char* const text = digitPairs<10>.data() + 2 * std::size_t {two};
+        return static_cast<std::uint64_t>(text[0]) | static_cast<std::uint64_t>(text[1]) << 8;
+    };
+    const std::uint32_t high = number / 10000;
+    const std::uint32_t low = number % 10000;
+    return pair(high) | pair(low / 100) << 16 | pair(low % 100) << 32;
+}
+
+// Writes all eight bytes, the lowest first.
+void store(char* out, std::uint64_t text)
+{
+    if constexpr (__BYTE_ORDER__ == __ORDER_BIG_ENDIAN__)
+        text = __builtin_bswap64(text);
+    std::memcpy(out, &text, sizeof text);
+}
+
+// Writes a real with six significant digits if one multiplication or division finds them for certain; otherwise
+// returns null.
 //
-// Multiplying by an exact power of ten moves six digits before the point, with an error below 2^-33. If the product
-// is further than that from the middle between two integers, the nearest integer has the digits of the real itself.
+// Scaling by an exact power of ten moves six digits before the point, with an error below 2^-33. If the result is
+// further than that from the middle between two integers, the nearest integer has the digits of the real itself.
 char* writeSixDigits(char* out, double real)
 {
-    static constexpr double smallest[] = {1e5, 1e4, 1e3, 1e2, 1e1, 1e0, 1e-1, 1e-2, 1e-3, 1e-4};
-    static constexpr double power[] = {1e0, 1e1, 1e2, 1e3, 1e4, 1e5, 1e6, 1e7, 1e8, 1e9};
     constexpr double uncertain = 0x1p-30;
+    constexpr int digits = 6;
 
+    std::uint64_t bits = 0;
+    std::memcpy(&bits, &real, sizeof bits);
     const double magnitude = std::fabs(real);
-    if (!(magnitude >= 1e-4 && magnitude < 1e6))
-        return nullptr;
-    int decimals = 0;
-    while (magnitude < smallest[decimals])
-        ++decimals;
-    const double product = magnitude * power[decimals];
-    auto number = static_cast<unsigned int>(product);
-    const double rest = product - number;
+    int exponent = decimalExponent(static_cast<int>(bits >> 52 & 0x7ff) - 1023);
+    const int power = digits - 1 - exponent;
+    if (power > largestPower || power <= -largestPower)
+        return nullptr;  // also infinity, a NaN and 0
+    double scaled = power >= 0 ? magnitude * powers[power] : magnitude / powers[-power];
+    if (scaled >= powers[digits]) {  // 2^exponent is below a power of ten, and the real is not
+        ++exponent;
+        scaled = power > 0 ? magnitude * powers[power - 1] : magnitude / powers[1 - power];
+    }
+    auto number = static_cast<std::uint32_t>(scaled);
+    const double rest = scaled - number;
     if (std::fabs(rest - 0.5) <= uncertain)
         return nullptr;
     number += rest > 0.5 ? 1 : 0;
-    if (number > 999999)
+    if (number < 100000 || number > 999999)
         return nullptr;
 
-    if (real < 0)
-        *out++ = '-';
-    const auto scale = static_cast<unsigned int>(power[decimals]);
-    out = writeUpToEightDigits(out, number / scale);
-    unsigned int fraction = number % scale * static_cast<unsigned int>(power[9 - decimals]);  // nine digits
-    if (fraction == 0)
+    const std::uint64_t text = sixDigits(number);
+    const int length = 8 - __builtin_clzll(text ^ 0x303030303030) / 8;  // without the zeros at the end
+
+    *out = '-';
+    out += bits >> 63;
+    const bool scientific = exponent >= digits || exponent < -4;
+    if (exponent < 0 && !scientific) {
+        std::memcpy(out, "0.000", 5);
+        out += 1 - exponent;
+        store(out, text);
+        return out + length;
+    }
+    const int whole = scientific ? 1 : exponent + 1;
+    store(out, text);
+    out += whole;
+    if (length > whole) {
+        *out++ = '.';
+        store(out, text >> 8 * whole);
+        out += length - whole;
+    }
+    if (!scientific)
         return out;
-    *out++ = '.';
-    *out++ = static_cast<char>('0' + fraction / 100000000);
-    fraction %= 100000000;
-    out = writeFourDigits(writeFourDigits(out, fraction / 10000), fraction % 10000);
-    while (out[-1] == '0')
-        --out;
-    return out;
+    *out++ = 'e';
+    *out++ = exponent < 0 ? '-' : '+';
+    return writeTwoDigits(out, static_cast<std::uint32_t>(std::abs(exponent)));
 }
 
 }  // namespace

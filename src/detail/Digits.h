@@ -3,6 +3,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <cstdlib>
 #include <cstring>
 #include <string>
 #include <string_view>
@@ -69,6 +70,13 @@ inline char* writeDecimal(char* out, std::uint64_t number)
         return writeFourDigits(writeFourDigits(out, low / 10000), low % 10000);
     }
     return writeUpToEightDigits(out, static_cast<std::uint32_t>(number));
+}
+
+inline char* writeInteger(char* out, std::int32_t number)
+{
+    *out = '-';
+    return writeDecimal(out + (number < 0 ? 1 : 0),
+                        static_cast<std::uint64_t>(std::abs(std::int64_t {number})));
 }
 
 // A real with six significant digits; at most `longestReal` characters.

@@ -1,7 +1,7 @@
 #include "detail/Text.h"
 
 #include <algorithm>
-#include <cstdlib>
+#include <limits>
 #include <stdexcept>
 
 namespace IC::detail {
@@ -27,9 +27,8 @@ void Text::add(int number)
         addStreamed(number);
         return;
     }
-    if (number < 0)
-        add('-');
-    add(static_cast<unsigned int>(std::abs(static_cast<long long>(number))));
+    constexpr std::size_t longest = std::numeric_limits<int>::digits10 + 2;
+    write(longest, [number](char* out) { return writeInteger(out, number); });
 }
 
 void Text::add(double number)

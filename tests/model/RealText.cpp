@@ -1,5 +1,5 @@
 // RealText [COUNT]: compares the texts of reals with those that new streams write. First come powers of ten and of two
-// with their neighbours, and denormals; then COUNT reals: random bits, random decimals of up to nine digits, halfway
+// with their neighbours, and denormals; then COUNT reals: random bits, random decimals of up to 17 digits, halfway
 // cases. Exits with 1 at the first difference.
 #include <cmath>
 #include <cstdint>
@@ -58,20 +58,27 @@ double ofRandomBits()
     return real;
 }
 
-// A decimal of up to nine digits with the point anywhere.
+// Moves the point by up to 30 digits.
+double moved(double real)
+{
+    const double power = std::pow(10.0, static_cast<double>(randomBits() % 31));
+    return randomBits() % 2 == 0 ? real * power : real / power;
+}
+
+// A decimal of up to 17 digits.
 double randomDecimal()
 {
-    const auto digits = static_cast<double>(randomBits() % 1000000000);
-    return digits / std::pow(10.0, static_cast<double>(randomBits() % 16));
+    const double longest = std::pow(10.0, static_cast<double>(randomBits() % 17 + 1));
+    return moved(static_cast<double>(randomBits() % static_cast<std::uint64_t>(longest)));
 }
 
 // Six digits and a five: the real nearest to the middle between two texts, or one of its neighbours.
 double halfway()
 {
     const auto digits = static_cast<double>((randomBits() % 1000000) * 10 + 5);
-    const double real = digits / std::pow(10.0, static_cast<double>(randomBits() % 13));
+    const double real = moved(digits);
     const auto choice = randomBits() % 3;
-    return choice == 0 ? real : std::nextafter(real, choice == 1 ? 0.0 : 1e9);
+    return choice == 0 ? real : std::nextafter(real, choice == 1 ? 0.0 : 1e99);
 }
 
 }  // namespace
