@@ -29,10 +29,15 @@ void replace(T& target, const T& source)
 {
     target = source;
 }
-// A vector's own assignment may lose the old elements if copying one throws.
+// A vector's own assignment may lose the old elements if copying one throws. Within the capacity, copying bytes and
+// numbers cannot.
 template <class Element>
 void replace(std::vector<Element>& target, const std::vector<Element>& source)
 {
+    if (std::is_trivially_copyable_v<Element> && source.size() <= target.capacity()) {
+        target = source;
+        return;
+    }
     std::vector<Element> copy(source);
     target.swap(copy);
 }

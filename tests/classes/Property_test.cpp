@@ -688,6 +688,19 @@ TEST(PropertyAssignment, ToItselfAllocatesNothingAndMoveToItselfKeepsTheValue)
     }
 }
 
+TEST(PropertyAssignment, OfBytesAndNumbersUsesTheRoomThatIsThere)
+{
+    const auto expectInPlace = [](PropertyValue longer, const PropertyValue& shorter) {
+        EXPECT_EQ(allocation::countOf([&] { longer = shorter; }), 0);
+        EXPECT_EQ(longer, shorter);
+        EXPECT_TRUE(longer.readOnly());
+    };
+    expectInPlace(PropertyValue(IC::Buffer(64, 1)), PropertyValue(IC::Buffer(64, 2), true));
+    expectInPlace(PropertyValue(IC::Buffer(64, 1)), PropertyValue(IC::Buffer(), true));
+    expectInPlace(PropertyValue(IC::NumberArray(100, Number(1u))),
+                  PropertyValue(IC::NumberArray(99, Number(-0.5)), true));
+}
+
 TEST(PropertyAssignment, KeepsTheOldValueWhenMemoryRunsOut)
 {
     const auto sources = otherSamples(true);
