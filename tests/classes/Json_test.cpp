@@ -676,6 +676,7 @@ TEST(Json, RefusesOtherClassesWithTheirPlace)
         {R"({"-1":{}})", R"(at "/-1": expected a property number as the key)"},
         {R"({"01":{}})", R"(at "/01": expected a property number as the key)"},
         {R"({"1 ":{}})", R"(at "/1 ": expected a property number as the key)"},
+        {R"({"1é":{}})", R"(at "/1é": expected a property number as the key)"},
         {R"({"4294967296":{}})", R"(at "/4294967296": expected a property number as the key)"},
         {R"({"18446744073709551616":{}})",
          R"(at "/18446744073709551616": expected a property number as the key)"},
