@@ -3,7 +3,7 @@
 #include <iostream>
 
 int main()
-{
+try {
     const Fan fan;
     const nlohmann::json document = fan;
     const std::string sent = document.dump();
@@ -16,10 +16,8 @@ int main()
     std::cout << model << (model.readOnly() ? ", read-only\n" : "\n");
 
     received["properties"]["2"]["value"] = "fast";
-    try {
-        const IC::StoredNode wrong(received);
-        std::cout << wrong << '\n';
-    } catch (const nlohmann::json::exception& refusal) {
-        std::cout << refusal.what() << '\n';
-    }
+    const IC::StoredNode refused(received);
+    std::cout << refused << '\n';
+} catch (const nlohmann::json::exception& refusal) {
+    std::cout << refusal.what() << '\n';
 }
