@@ -367,7 +367,7 @@ TEST(Json, ADerivedNodeGivesTheDocumentOfItsBase)
 }
 
 struct OwnFan : Fan {
-    friend void to_json(json& document, const OwnFan& /*fan*/) { document = "own"; }
+    [[maybe_unused]] friend void to_json(json& document, const OwnFan& /*fan*/) { document = "own"; }
 };
 struct OwnValue : PropertyValue {
     using PropertyValue::PropertyValue;
@@ -573,6 +573,8 @@ TEST(Json, RefusesNumbersWithTheirPlace)
          R"(at "/value": expected an integer from -2147483648 to 2147483647)"},
         {R"({"kind":"int","value":-2147483649})",
          R"(at "/value": expected an integer from -2147483648 to 2147483647)"},
+        {R"({"kind":"int","value":4294967301})",
+         R"(at "/value": expected an integer from -2147483648 to 2147483647)"},
         {R"({"kind":"int","value":18446744073709551615})",
          R"(at "/value": expected an integer from -2147483648 to 2147483647)"},
         {R"({"kind":"int","value":5.0})",
@@ -593,6 +595,8 @@ TEST(Json, RefusesNumbersWithTheirPlace)
         {R"({"kind":"real","value":{"bits":"7FF8000000000000"}})",
          R"(at "/value/bits": expected two lower-case hexadecimal digits for each byte)"},
         {R"({"kind":"version","value":2.15})", R"(at "/value": expected an array of 2 elements)"},
+        {R"({"kind":"version","value":{"major":2,"minor":15}})",
+         R"(at "/value": expected an array of 2 elements)"},
         {R"({"kind":"version","value":[2]})", R"(at "/value": expected an array of 2 elements)"},
         {R"({"kind":"version","value":[2,15,0]})", R"(at "/value": expected an array of 2 elements)"},
         {R"({"kind":"version","value":[256,0]})", R"(at "/value/0": expected an integer from 0 to 255)"},
@@ -627,6 +631,9 @@ TEST(Json, RefusesNumbersWithTheirPlace)
         refusal<Number>(json::parse(
             R"({"kind":"dateTime","value":{"seconds":9223372036854775808,"milliseconds":0,"scope":3}})")),
         R"(at "/value/seconds": expected an integer from )" + seconds);
+    EXPECT_EQ(refusal<Number>(
+                  json::parse(R"({"kind":"dateTime","value":{"seconds":0.5,"milliseconds":0,"scope":3}})")),
+              R"(at "/value/seconds": expected an integer from )" + seconds);
 }
 
 TEST(Json, RefusesPropertyValuesWithTheirPlace)
@@ -645,6 +652,8 @@ TEST(Json, RefusesPropertyValuesWithTheirPlace)
         {R"({"kind":"nothing","value":0})", R"(at "/value": expected null)"},
         {R"({"kind":"string","value":5})", R"(at "/value": expected a string)"},
         {R"({"kind":"string","value":{}})", R"(at "/value": the key "hex" is missing)"},
+        {R"({"kind":"string","value":{"hex":"6"}})",
+         R"(at "/value/hex": expected two lower-case hexadecimal digits for each byte)"},
         {R"({"kind":"string","value":{"hex":"6g"}})",
          R"(at "/value/hex": expected two lower-case hexadecimal digits for each byte)"},
         {R"({"kind":"string","value":{"hex":"61","base64":"YQ"}})", R"(at "/value/base64": unknown key)"},

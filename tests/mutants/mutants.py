@@ -132,7 +132,7 @@ class Suite:
         source = tree / file
         if file == HEADERS:
             source = output.with_suffix(".cpp")
-            # These have only templates.
+            # Optional: only programs that use another library compile these.
             optional = {"fmt.h", "format.h", "json.h"}
             names = sorted({header.name for header in (ROOT / HEADERS).glob("*.h")} - optional)
             source.write_text("".join(f'#include "IC/{name}"\n' for name in names))
