@@ -15,6 +15,7 @@ if [ "$command" = compare ]; then
     [ -f "$description" ] || { echo "no description $description; scripts/checks/refresh-abi writes it" >&2; exit 1; }
     described=$PWD/$(basename "$library").abi
     trap 'rm -f "$described"' EXIT
+    trap 'exit 1' HUP INT TERM
 fi
 
 # Programs depend on the types of the public headers alone, not on paths, lines and names of parameters.
