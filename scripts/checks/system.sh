@@ -57,7 +57,7 @@ fetch() {
     # This machine's own archive has its own release; another release comes from the default archive.
     sources=
     # shellcheck source=/dev/null
-    if (. /etc/os-release && [ "$VERSION_CODENAME" = "$suite" ]); then
+    if (. /etc/os-release && [ "${VERSION_CODENAME-}" = "$suite" ]); then
         for file in /etc/apt/sources.list.d/debian.sources /etc/apt/sources.list.d/ubuntu.sources \
             /etc/apt/sources.list; do
             [ ! -f "$file" ] || sources=${sources:-$file}
