@@ -8,8 +8,10 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -35,6 +37,10 @@ void writeRecords()
 std::string standardErrorOf(void (*write)())
 {
     std::FILE* const file = std::tmpfile();
+    if (file == nullptr) {
+        ADD_FAILURE() << "no temporary file: " << std::strerror(errno);
+        return "";
+    }
     const pid_t child = fork();
     if (child == 0) {
         dup2(fileno(file), STDERR_FILENO);

@@ -35,6 +35,10 @@ target_compile_options(test_headers PRIVATE ${quick_options})
 target_link_libraries(test_headers PRIVATE GTest::gmock)
 target_precompile_headers(test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
 
+add_library(full_disk OBJECT ${CMAKE_CURRENT_LIST_DIR}/FullDisk.cpp)
+ic_target_settings(full_disk)
+target_link_libraries(full_disk PRIVATE GTest::gtest)
+
 # The tests that ThreadSanitizer can check.
 add_custom_target(threads_tests)
 set(with_threads SharedNodes FirstUse Fork Cancellation Unload SpdlogSink)
@@ -44,7 +48,7 @@ endif()
 
 # Adds the test NAME_test.cpp, linked with the further arguments.
 function(ic_add_test name)
-    add_executable(${name}_test ${name}_test.cpp)
+    add_executable(${name}_test ${name}_test.cpp $<TARGET_OBJECTS:full_disk>)
     ic_target_settings(${name}_test)
     target_include_directories(${name}_test PRIVATE ${PROJECT_SOURCE_DIR}/tests)
     target_precompile_headers(${name}_test REUSE_FROM test_headers)
