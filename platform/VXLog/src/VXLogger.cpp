@@ -2,13 +2,14 @@
 
 #include <pthread.h>
 
+#include <array>
 #include <cstdio>
 #include <cstdlib>
 #include <memory>
 #include <mutex>
 #include <utility>
 
-#include "Locks.h"
+#include "Striped.h"
 #include "VXLog/Printable.h"
 #include "VXLog/RecordSink.h"
 #include "ZQ/DateTime.h"
@@ -35,36 +36,55 @@ void standardErrorSink(const Record& record)
 
 namespace {
 
-// The sink of the program. Calls in progress share it, so they can finish after it is replaced.
-struct Current {
-    std::shared_ptr<const RecordSink> sink = std::make_shared<const RecordSink>(standardErrorSink);
-};
+// The sink of the program; null for the default sink. Calls in progress share it, so they can finish after it is
+// replaced.
+using Sink = std::shared_ptr<const RecordSink>;
 
 // Initialised before the program's own objects at namespace scope, and destroyed after them.
-[[gnu::init_priority(101)]] Current current;
+[[gnu::init_priority(101)]] Striped<Sink> current;
+[[gnu::init_priority(101)]] const ForkHandlers<current> forkHandlers;
 
-std::shared_ptr<const RecordSink> currentSink()
+// The same sink for each processor, with a count of calls of its own: threads that change one count wait for each other.
+std::array<Sink, Striped<Sink>::count> shares(RecordSink sink)
 {
-    const std::lock_guard<std::mutex> lock(sinkLock);
-    return current.sink;
+    std::array<Sink, Striped<Sink>::count> all;
+    if (!sink)
+        return all;
+    const Sink only = std::make_shared<const RecordSink>(std::move(sink));
+    struct alignas(64) Share {  // a line of the processor's cache
+        Sink sink;
+    };
+    for (Sink& one : all)
+        one = Sink(std::make_shared<const Share>(Share {only}), only.get());
+    return all;
+}
+
+Sink currentSink()
+{
+    return current.withOwn([](const Sink& sink) { return sink; });
 }
 
 void pass(const Record& record)
 {
-    (*currentSink())(record);
+    if (const Sink sink = currentSink())
+        (*sink)(record);
+    else
+        standardErrorSink(record);
 }
 
 }  // namespace
 
 RecordSink setRecordSink(RecordSink sink)
 {
-    auto next = std::make_shared<const RecordSink>(sink ? std::move(sink) : RecordSink(standardErrorSink));
+    auto next = shares(std::move(sink));  // and later the previous ones, which end outside the locks
     for (;;) {
-        const auto before = currentSink();
-        RecordSink copy = *before;  // outside the lock: copying runs the program's code and may throw
-        const std::lock_guard<std::mutex> lock(sinkLock);
-        if (current.sink == before) {
-            current.sink = std::move(next);
+        const Sink before = currentSink();
+        // Outside the locks: copying runs the program's code and may throw.
+        RecordSink copy = before ? *before : RecordSink(standardErrorSink);
+        const std::lock_guard lock(current);
+        if (current.at(0) == before) {  // nobody has replaced it meanwhile
+            for (std::size_t i = 0; i < next.size(); ++i)
+                current.at(i).swap(next.at(i));
             return copy;
         }
     }

@@ -9,7 +9,7 @@
 #include <mutex>
 #include <streambuf>
 
-#include "Locks.h"
+#include "Striped.h"
 
 namespace VXLog {
 
@@ -108,11 +108,12 @@ struct VXMessageBuffer::Composer {
 private:
     // Without a destructor: buffers may still be made and destroyed after Closer has deleted the kept composers.
     struct Kept {
-        std::array<Composer*, 16> composers {};
+        std::array<Composer*, 4> composers {};
         std::size_t count = 0;
         bool isClosed = false;
     };
-    static Kept kept;
+    static Striped<Kept> kept;
+    static const ForkHandlers<kept> forkHandlers;
 
     struct Closer {
         ~Closer();
@@ -120,7 +121,10 @@ private:
     static const Closer closer;
 };
 
-VXMessageBuffer::Composer::Kept VXMessageBuffer::Composer::kept;
+Striped<VXMessageBuffer::Composer::Kept> VXMessageBuffer::Composer::kept;
+
+[[gnu::init_priority(101)]] const ForkHandlers<VXMessageBuffer::Composer::kept>
+    VXMessageBuffer::Composer::forkHandlers;
 
 [[gnu::init_priority(101)]] const VXMessageBuffer::Composer::Closer VXMessageBuffer::Composer::closer;
 
@@ -128,23 +132,30 @@ VXMessageBuffer::Composer::Closer::~Closer()
 {
     while (const Composer* const composer = takeKept())
         delete composer;
-    const std::lock_guard<std::mutex> lock(composersLock);
-    kept.isClosed = true;
+    const std::lock_guard lock(kept);
+    for (std::size_t i = 0; i < kept.count; ++i)
+        kept.at(i).isClosed = true;
 }
 
 VXMessageBuffer::Composer* VXMessageBuffer::Composer::takeKept()
 {
-    const std::lock_guard<std::mutex> lock(composersLock);
-    return kept.count == 0 ? nullptr : kept.composers.at(--kept.count);
+    Composer* taken = nullptr;
+    kept.withAny([&taken](Kept& some) {
+        if (some.count > 0)
+            taken = some.composers.at(--some.count);
+        return taken != nullptr;
+    });
+    return taken;
 }
 
 bool VXMessageBuffer::Composer::keep(Composer* composer)
 {
-    const std::lock_guard<std::mutex> lock(composersLock);
-    if (kept.isClosed || kept.count == kept.composers.size())
-        return false;
-    kept.composers.at(kept.count++) = composer;
-    return true;
+    return kept.withAny([composer](Kept& some) {
+        if (some.isClosed || some.count == some.composers.size())
+            return false;
+        some.composers.at(some.count++) = composer;
+        return true;
+    });
 }
 
 VXMessageBuffer::VXMessageBuffer() : composer_(Composer::takeKept())
