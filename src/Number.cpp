@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <cfloat>
-#include <cmath>
 #include <ctime>
 #include <limits>
 #include <ostream>
@@ -102,19 +101,15 @@ constexpr detail::Source here {"Number", loggerNumber};
 constexpr ZQ::Uint8 largestKind = Number::KIND_NODEREF;
 constexpr ZQ::Uint32 noSensor = 74;
 
-// The real without its fraction. Refuses a result below 0 or not below `limit`; a NaN passes. Each record calls `real`
-// again.
+// Refuses a real that no integer of the type can hold: 0 and above are too large. Each record calls `real` again.
 template <class Real>
-double integralPart(const Real& real, double limit, const detail::Where& where, const char* literal,
-                    const char* tooLarge, const char* negative)
+void refuseUnlessNan(const Real& real, const detail::Where& where, const char* literal, const char* tooLarge,
+                     const char* negative)
 {
-    double integral = 0.0;
-    std::modf(real(), &integral);
-    if (integral >= limit)
+    if (real() >= 0.0)
         detail::fail<std::out_of_range>(where, tooLarge, literal, real);
-    if (integral < 0.0)
+    if (real() < 0.0)
         detail::fail<std::out_of_range>(where, negative, literal, real);
-    return integral;
 }
 
 // The result as a double. The x87 calculates with more digits and keeps them until the result is stored.
@@ -126,13 +121,6 @@ double rounded(double result)
         const volatile double stored = result;
         return stored;
     }
-}
-
-// Converts what integralPart returns. Converting a NaN would be undefined.
-template <class Integer>
-Integer toInteger(double integral, Integer ofNan)
-{
-    return std::isnan(integral) ? ofNan : static_cast<Integer>(integral);
 }
 
 double realOf(const Version2& version)
@@ -257,20 +245,17 @@ bool Number::toBool() const
 // Serves both 32-bit conversions, which differ in their names and in KIND_INT.
 ZQ::Uint32 Number::toUint32(const char* function) const
 {
+    ZQ::Uint32 content = 0;
+    if (get(content))
+        return content;
     switch (kind_) {
-    case KIND_BOOL:
-        return load<ZQ::Uint8>() != 0 ? 1 : 0;
-    case KIND_UINT32:
-        return load<ZQ::Uint32>();
     case KIND_UINT64:
-        if (load<ZQ::Uint64>() > std::numeric_limits<ZQ::Uint32>::max())
-            detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32,
-                                            [this] { return load<ZQ::Uint64>(); });
-        return static_cast<ZQ::Uint32>(load<ZQ::Uint64>());
+        detail::fail<std::out_of_range>(here(function), tooLarge32, outOfRange32,
+                                        [this] { return load<ZQ::Uint64>(); });
     case KIND_REAL:
-        return toInteger<ZQ::Uint32>(integralPart([this] { return load<ZQ::Real64>(); }, 0x1p32,
-                                                  here(function), outOfRange32, tooLarge32, negative32),
-                                     0);
+        refuseUnlessNan([this] { return load<ZQ::Real64>(); }, here(function), outOfRange32, tooLarge32,
+                        negative32);
+        return 0;
     default:
         detail::fail<std::out_of_range>(
             here(function), "Can't return current value as a 32-bit integer",
@@ -280,16 +265,14 @@ ZQ::Uint32 Number::toUint32(const char* function) const
 
 ZQ::Uint64 Number::toUint64() const
 {
+    ZQ::Uint64 content = 0;
+    if (get(content))
+        return content;
     switch (kind_) {
-    case KIND_BOOL:
-        return load<ZQ::Uint8>() != 0 ? 1 : 0;
-    case KIND_UINT32:
-        return load<ZQ::Uint32>();
     case KIND_REAL:
-        // A power of two, because the largest 64-bit integer is no double.
-        return toInteger(integralPart([this] { return load<ZQ::Real64>(); }, 0x1p64,
-                                      here("operator ZQ::Uint64"), outOfRange64, tooLarge64, negative64),
-                         ZQ::Uint64 {1} << 63);
+        refuseUnlessNan([this] { return load<ZQ::Real64>(); }, here("operator ZQ::Uint64"), outOfRange64,
+                        tooLarge64, negative64);
+        return ZQ::Uint64 {1} << 63;
     default:
         detail::fail<std::out_of_range>(
             here("operator ZQ::Uint64"), "Can't return current value as a 64-bit integer",
@@ -299,13 +282,10 @@ ZQ::Uint64 Number::toUint64() const
 
 ZQ::Real64 Number::toReal() const
 {
+    ZQ::Real64 content = 0.0;
+    if (get(content))
+        return content;
     switch (kind_) {
-    case KIND_BOOL:
-        return load<ZQ::Uint8>() != 0 ? 1.0 : 0.0;
-    case KIND_UINT32:
-        return load<ZQ::Uint32>();
-    case KIND_UINT64:
-        return static_cast<ZQ::Real64>(load<ZQ::Uint64>());
     case KIND_NAN:
         return std::numeric_limits<ZQ::Real64>::quiet_NaN();
     case KIND_INFINITY:

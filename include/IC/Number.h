@@ -196,7 +196,14 @@ private:
     inline void store(const T& content) noexcept;
     inline void storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uint8 scope) noexcept;
 
-    // The conversions from the less frequent kinds.
+    // What an integer or a real can hold of any content, without a refusal; false for other content.
+    inline bool get(ZQ::Uint32& out) const noexcept;
+    inline bool get(ZQ::Uint64& out) const noexcept;
+    inline bool get(ZQ::Real64& out) const noexcept;
+    template <class Integer>
+    inline bool getReal(Integer& out, ZQ::Real64 limit) const noexcept;
+
+    // The other conversions. They accept what `get` accepts too: programs that were compiled before `get` call them.
     bool toBool() const;
     inline int toInt() const;
     ZQ::Uint32 toUint32(const char* function) const;

@@ -28,6 +28,14 @@
 #include "support/GroupingLocale.h"
 #include "support/SensorNames.h"
 
+// What programs that were compiled with an older header call, for these kinds too.
+namespace older {
+ZQ::Uint32 toUint32(const IC::Number* number, const char* function) asm("_ZNK2IC6Number8toUint32EPKc");
+ZQ::Uint64 toUint64(const IC::Number* number) asm("_ZNK2IC6Number8toUint64Ev");
+ZQ::Real64 toReal(const IC::Number* number) asm("_ZNK2IC6Number6toRealEv");
+bool equal(const IC::Number& a, const IC::Number& b) asm("_ZN2IC6Number5equalERKS0_S2_");
+}  // namespace older
+
 namespace {
 
 using IC::Number;
@@ -1106,6 +1114,22 @@ TEST(NumberToNodeRef, GivesBackTypeAndId)
         SCOPED_TRACE(reference.type);
         EXPECT_EQ(parts(to<sNodeRef>(Number(reference))), parts(reference));
     }
+}
+
+TEST(NumberConversion, IsTheSameInProgramsThatWereCompiledWithAnOlderHeader)
+{
+    const Number numbers[] = {Number(true), Number(7u), Number(7ull), Number(7.5)};
+    for (const Number& number : numbers) {
+        EXPECT_EQ(older::toUint32(&number, "operator int"), number.operator unsigned int()) << number;
+        EXPECT_EQ(older::toUint64(&number), number.operator unsigned long long()) << number;
+        EXPECT_EQ(older::toReal(&number), number.operator double()) << number;
+    }
+}
+
+TEST(NumberComparison, IsTheSameInProgramsThatWereCompiledWithAnOlderHeader)
+{
+    EXPECT_FALSE(older::equal(Number(7u), Number(7ull)));
+    EXPECT_TRUE(older::equal(Number(7ull), Number(7ull)));
 }
 
 TEST(NumberConversion, NeedsNoMemory)

@@ -21,6 +21,12 @@
 #include "support/Hexadecimal.h"
 #include "support/PropertySamples.h"
 
+// What programs that were compiled with an older header call, also for different kinds.
+namespace older {
+bool equal(const IC::PropertyValue& a,
+           const IC::PropertyValue& b) asm("_ZN2IC13PropertyValue5equalERKS0_S2_");
+}  // namespace older
+
 namespace {
 
 using IC::Buffer;
@@ -93,6 +99,12 @@ TEST(PropertyComparison, OfKindUnknownIsEqual)
 {
     expectOrder(PropertyValue(PropertyValue::KIND_UNKNOWN), PropertyValue(PropertyValue::KIND_UNKNOWN),
                 equal);
+}
+
+TEST(PropertyComparison, IsTheSameInProgramsThatWereCompiledWithAnOlderHeader)
+{
+    EXPECT_FALSE(older::equal(PropertyValue("7"), PropertyValue(Number(7u))));
+    EXPECT_TRUE(older::equal(PropertyValue(EnumValue(7u)), PropertyValue(EnumValue(7u))));
 }
 
 TEST(PropertyComparison, OfNumbersIsThatOfTheNumbers)

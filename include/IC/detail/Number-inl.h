@@ -67,22 +67,34 @@ inline Number::operator bool() const
 
 inline Number::operator int() const
 {
-    return detail::likely(kind_ == KIND_INT) ? load<int>() : toInt();
+    if (detail::likely(kind_ == KIND_INT))
+        return load<int>();
+    ZQ::Uint32 content = 0;
+    return get(content) ? static_cast<int>(content) : toInt();
 }
 
 inline Number::operator unsigned int() const
 {
-    return detail::likely(kind_ == KIND_UINT32) ? load<ZQ::Uint32>() : toUint32("operator ZQ::Uint32");
+    if (detail::likely(kind_ == KIND_UINT32))
+        return load<ZQ::Uint32>();
+    ZQ::Uint32 content = 0;
+    return get(content) ? content : toUint32("operator ZQ::Uint32");
 }
 
 inline Number::operator unsigned long long() const
 {
-    return detail::likely(kind_ == KIND_UINT64) ? load<ZQ::Uint64>() : toUint64();
+    if (detail::likely(kind_ == KIND_UINT64))
+        return load<ZQ::Uint64>();
+    ZQ::Uint64 content = 0;
+    return get(content) ? content : toUint64();
 }
 
 inline Number::operator double() const
 {
-    return detail::likely(kind_ == KIND_REAL) ? load<ZQ::Real64>() : toReal();
+    if (detail::likely(kind_ == KIND_REAL))
+        return load<ZQ::Real64>();
+    ZQ::Real64 content = 0.0;
+    return get(content) ? content : toReal();
 }
 
 inline Number::operator Version2() const
@@ -126,6 +138,72 @@ inline void Number::storeDateTime(long seconds, ZQ::Uint16 milliseconds, ZQ::Uin
     store(DateTimeFields {seconds, milliseconds, scope, {}});
 }
 
+inline bool Number::get(ZQ::Uint32& out) const noexcept
+{
+    if (detail::likely(kind_ == KIND_UINT32)) {
+        out = load<ZQ::Uint32>();
+        return true;
+    }
+    if (kind_ == KIND_BOOL) {
+        out = load<ZQ::Uint8>() != 0 ? 1 : 0;
+        return true;
+    }
+    if (kind_ == KIND_UINT64) {
+        out = static_cast<ZQ::Uint32>(load<ZQ::Uint64>());
+        return out == load<ZQ::Uint64>();
+    }
+    return kind_ == KIND_REAL && getReal(out, 0x1p32);
+}
+
+inline bool Number::get(ZQ::Uint64& out) const noexcept
+{
+    if (detail::likely(kind_ == KIND_UINT64)) {
+        out = load<ZQ::Uint64>();
+        return true;
+    }
+    if (kind_ == KIND_UINT32) {
+        out = load<ZQ::Uint32>();
+        return true;
+    }
+    if (kind_ == KIND_BOOL) {
+        out = load<ZQ::Uint8>() != 0 ? 1 : 0;
+        return true;
+    }
+    return kind_ == KIND_REAL && getReal(out, 0x1p64);
+}
+
+inline bool Number::get(ZQ::Real64& out) const noexcept
+{
+    if (detail::likely(kind_ == KIND_REAL)) {
+        out = load<ZQ::Real64>();
+        return true;
+    }
+    if (kind_ == KIND_UINT32) {
+        out = load<ZQ::Uint32>();
+        return true;
+    }
+    if (kind_ == KIND_UINT64) {
+        out = static_cast<ZQ::Real64>(load<ZQ::Uint64>());
+        return true;
+    }
+    if (kind_ == KIND_BOOL) {
+        out = load<ZQ::Uint8>() != 0 ? 1.0 : 0.0;
+        return true;
+    }
+    return false;
+}
+
+// Cuts the real toward zero. A NaN is left to the functions that are not inline, like what is refused.
+template <class Integer>
+inline bool Number::getReal(Integer& out, ZQ::Real64 limit) const noexcept
+{
+    const auto real = load<ZQ::Real64>();
+    if (!(real > -1.0 && real < limit))
+        return false;
+    out = static_cast<Integer>(real);
+    return true;
+}
+
 // Differs from the unsigned conversion only in its name in the records.
 inline int Number::toInt() const
 {
@@ -139,6 +217,8 @@ inline bool Number::both(KindType kind, const Number& a, const Number& b) noexce
 
 inline bool operator==(const Number& a, const Number& b)
 {
+    if (a.kind_ != b.kind_)
+        return false;
     if (Number::both(Number::KIND_UINT32, a, b))
         return a.load<ZQ::Uint32>() == b.load<ZQ::Uint32>();
     if (Number::both(Number::KIND_REAL, a, b))

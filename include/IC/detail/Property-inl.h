@@ -255,6 +255,8 @@ inline void PropertyValue::release() noexcept
 inline bool operator==(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
+    if (a.kind_ != b.kind_)
+        return false;
     if (Value::bothHold(Value::KIND_NUMBER, a, b))
         return a.object<Number>() == b.object<Number>();
     if (Value::bothHold(Value::KIND_STRING, a, b))
