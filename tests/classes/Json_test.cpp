@@ -562,6 +562,7 @@ TEST(Json, RefusesNumbersWithTheirPlace)
         {R"({"kind":"int","value":5,"colour":1})", R"(at "/colour": unknown key)"},
         {R"({"kind":"int","value":5,"a/b~c":1})", R"(at "/a~1b~0c": unknown key)"},
         {R"({"kind":"int","value":5,"":1})", R"(at "/": unknown key)"},
+        {R"({"kind":"int","value":5,"a\u0000b\"\n":1})", R"(at "/a\u0000b\"\n": unknown key)"},
         {R"({"kind":"int","value":5,"readOnly":true})", R"(at "/readOnly": unknown key)"},
         {R"({"kind":"unknown","value":0})", R"(at "/value": expected null)"},
         {R"({"kind":"nan","value":"nan"})", R"(at "/value": expected null)"},
@@ -738,6 +739,13 @@ TEST(Json, RefusesOtherClassesWithTheirPlace)
         EXPECT_EQ(refusal<IC::StoredNode>(document), text);
         EXPECT_THAT(observe::records(), testing::IsEmpty());
     }
+}
+
+// CBOR may have a key that is not UTF-8.
+TEST(Json, ThePlaceOfAnyKeyIsUtf8)
+{
+    EXPECT_EQ(refusal<Properties>(json {{"a\xff", 1}}),
+              "at \"/a\uFFFD\": expected a property number as the key");
 }
 
 TEST(Json, InAVectorThePlaceIsRelativeToTheElement)

@@ -151,7 +151,10 @@ public:
 
     [[noreturn]] void fail(const std::string& sentence) const
     {
-        throw Json::type_error::create(302, "at \"" + pointer().to_string() + "\": " + sentence, nullptr);
+        // As a JSON string: a key can have bytes that end or garble the text of an exception.
+        const std::string place =
+            Json(pointer().to_string()).dump(-1, ' ', false, Json::error_handler_t::replace);
+        throw Json::type_error::create(302, "at " + place + ": " + sentence, nullptr);
     }
 
     const Json& json() const noexcept { return json_; }
