@@ -8,6 +8,7 @@
 
 #include <gtest/gtest.h>
 
+#include "IC/Alert.h"
 #include "IC/EnumValue.h"
 #include "IC/ICException.h"
 #include "IC/Number.h"
@@ -385,6 +386,36 @@ TEST(PropertyConversion, AfterARefusedSetKindIsRefusedAsForAnotherKind)
                                     "invalid", "invalid", "invalid"};
     for (const PropertyValue& value : values)
         EXPECT_EQ(value.operator std::string(), expected[value.getKind()]);
+}
+
+// The compilers warn with -Wextra.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wmissing-field-initializers"
+template <class Value>
+IC::NodeRef inBraces(const Value& value)
+{
+    return IC::NodeRef {value};
+}
+#pragma GCC diagnostic pop
+
+template <class Value>
+void expectFirstField(const Value& value, unsigned int type)
+{
+    const IC::NodeRef reference = inBraces(value);
+    EXPECT_EQ(reference.type, type);
+    EXPECT_EQ(reference.id, 0u);
+}
+
+TEST(NodeReferenceInBraces, TakesTheValueForItsFirstField)
+{
+    expectFirstField(Number(7u), 7);
+    expectFirstField(EnumValue(7u), 7);
+    expectFirstField(PropertyValue(Number(7u)), 7);
+    expectFirstField(IC::Alert(2, 1, {}, 5, "Fan failed"), 5);  // the status
+    const Number number(IC::NodeRef {20, 7});
+    EXPECT_THROW(inBraces(number), std::out_of_range);
+    const IC::NodeRef reference = number;
+    EXPECT_EQ(reference.id, 7u);
 }
 
 }  // namespace
