@@ -447,7 +447,7 @@ TEST(PropertyText, OfManyIntNumbersIsComplete)
     NumberArray all;
     std::string expected = "{";
     for (int i = 0; i < 1000; ++i) {
-        all.push_back(Number(i));  // signed: only unsigned 32-bit numbers are written in runs
+        all.push_back(Number(i));
         expected.append(i == 0 ? "" : ", ").append(std::to_string(i));
     }
     EXPECT_EQ(numbers(all).operator std::string(), expected.append("}"));
@@ -455,23 +455,22 @@ TEST(PropertyText, OfManyIntNumbersIsComplete)
 
 TEST(PropertyText, OfTheLongestNumbersIsCompleteAtEveryPosition)
 {
-    const NumberArray longest {Number(4294967295u), Number(18446744073709551615ull), Number(-2147483647 - 1),
-                               Number(-1.23457e-308), Number(-123456.4)};
-    const std::string texts[] = {"4294967295", "18446744073709551615", "-2147483648", "-1.23457e-308",
-                                 "-123456"};
-    for (std::size_t i = 0; i < longest.size(); ++i) {
-        // "1, " has three characters and "10, " has four, so together they give every length of text before the number.
-        for (std::size_t tens = 0; tens < 3; ++tens) {
-            NumberArray numbers(tens, Number(10));
-            std::string expected = "{";
-            for (std::size_t ten = 0; ten < tens; ++ten)
-                expected += "10, ";
-            for (int ones = 0; ones < 400; ++ones) {
-                numbers.push_back(longest[i]);
-                ASSERT_EQ(PropertyValue(numbers).operator std::string(), expected + texts[i] + '}');
-                numbers.back() = Number(1);  // signed: only unsigned 32-bit numbers are written in runs
-                expected += "1, ";
-            }
+    const std::pair<Number, std::string> rows[] = {
+        {Number(4294967295u), "4294967295"},
+        {Number(18446744073709551615ull), "18446744073709551615"},
+        {Number(-2147483647 - 1), "-2147483648"},
+        {Number(-1.23457e-308), "-1.23457e-308"},
+        {Number(-123456.4), "-123456"},
+        {Number(IC::sNodeRef {73, 4294967295}), "LAN End Point:4294967295"}};
+    for (const auto& [longest, text] : rows) {
+        // Each short number before the long ones moves them against the end of the room, which all together exceed.
+        for (std::size_t before = 0; before < 26; ++before) {
+            NumberArray numbers(before, Number(1));
+            numbers.insert(numbers.end(), 100, longest);
+            std::string expected;
+            for (std::size_t i = 0; i < numbers.size(); ++i)
+                expected.append(i == 0 ? "{" : ", ").append(i < before ? "1" : text);
+            ASSERT_EQ(PropertyValue(numbers).operator std::string(), expected + '}');
         }
     }
 }
