@@ -42,8 +42,10 @@ def seen(program):
     """Yields the same, as texts, for each refusal that a test of the program expected."""
     with tempfile.TemporaryDirectory(dir=".") as folder:
         report = pathlib.Path(folder) / "report.xml"
-        subprocess.run([program, "--gtest_brief=1", f"--gtest_output=xml:{report}"], check=True,
-                       stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)  # fmt: skip
+        run = subprocess.run([program, "--gtest_brief=1", f"--gtest_output=xml:{report}"], text=True, errors="replace",
+                             stdout=subprocess.PIPE, stderr=subprocess.STDOUT)  # fmt: skip
+        if run.returncode != 0:
+            sys.exit(f"{program} fails:\n{run.stdout}")
         for refusal in xml.etree.ElementTree.parse(report).iter("property"):
             file, function, level, record = refusal.get("name").split("|", 3)
             mangled, _, sentence = refusal.get("value").partition("|")
