@@ -699,6 +699,9 @@ TEST(PropertyStream, WritesAsMuchOfAMapAsTheStreamTakes)
 {
     const PropertyMap map {{1, text("abc")}, {22, numbers({Number(1u), Number(-2)})}, {300, text("")}};
     const std::string whole = "[1 = abc], [22 = {1, -2}], [300 = ]";
+    Narrow full(0);
+    std::ostream refusing(&full);
+    refusing << "]";  // libc++ sets failbit, too
     for (std::size_t room = 0; room < whole.size(); ++room) {
         SCOPED_TRACE(room);
         Narrow narrow(room);
@@ -707,8 +710,7 @@ TEST(PropertyStream, WritesAsMuchOfAMapAsTheStreamTakes)
         EXPECT_EQ(narrow.taken, whole.substr(0, room));
         // Each piece after the one that the stream could not take fails, too. The last piece is "]".
         const bool last = room == whole.size() - 1;
-        EXPECT_EQ(out.rdstate(),
-                  last ? std::ios_base::badbit : std::ios_base::badbit | std::ios_base::failbit);
+        EXPECT_EQ(out.rdstate(), last ? refusing.rdstate() : std::ios_base::badbit | std::ios_base::failbit);
     }
     Narrow wide(whole.size());
     std::ostream out(&wide);
