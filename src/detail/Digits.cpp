@@ -9,10 +9,16 @@ namespace IC::detail {
 
 namespace {
 
-// The powers of ten that a double holds exactly.
-constexpr double powers[] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,  1e7,  1e8,  1e9,  1e10, 1e11,
-                             1e12, 1e13, 1e14, 1e15, 1e16, 1e17, 1e18, 1e19, 1e20, 1e21, 1e22};
-constexpr int largestPower = 22;
+// Powers of ten. A double holds those from 1e0 on exactly, and the others with an error below 2^-53 of them.
+constexpr double powers[] = {1e-15, 1e-14, 1e-13, 1e-12, 1e-11, 1e-10, 1e-9, 1e-8, 1e-7, 1e-6, 1e-5,
+                             1e-4,  1e-3,  1e-2,  1e-1,  1e0,   1e1,   1e2,  1e3,  1e4,  1e5,  1e6,
+                             1e7,   1e8,   1e9,   1e10,  1e11,  1e12,  1e13, 1e14, 1e15};
+constexpr int largestPower = 15;
+
+constexpr double powerOfTen(int exponent)
+{
+    return powers[exponent + largestPower];
+}
 
 // The decimal exponent of 2^exponent, for |exponent| < 1650.
 constexpr int decimalExponent(int exponent)
@@ -40,27 +46,35 @@ void store(char* out, std::uint64_t text)
     std::memcpy(out, &text, sizeof text);
 }
 
-// Writes a real with six significant digits if one multiplication or division finds them for certain; otherwise
-// returns null.
+// Writes a real with six significant digits if up to three multiplications find them for certain; otherwise returns
+// null.
 //
-// Scaling by an exact power of ten moves six digits before the point, with an error below 2^-33. If the result is
-// further than that from the middle between two integers, the nearest integer has the digits of the real itself.
+// Scaling by powers of ten moves six digits before the point. Each multiplication has an error below 2^-32, or 2^-31
+// where the rounding mode is not to the nearest. If the result is further than three of these from the middle between
+// two integers, the nearest integer has the digits of the real itself.
 char* writeSixDigits(char* out, double real)
 {
-    constexpr double uncertain = 0x1p-30;
+    constexpr double uncertain = 0x1p-29;
     constexpr int digits = 6;
 
     std::uint64_t bits = 0;
     std::memcpy(&bits, &real, sizeof bits);
-    const double magnitude = std::fabs(real);
+    double scaled = std::fabs(real);
     int exponent = decimalExponent(static_cast<int>(bits >> 52 & 0x7ff) - 1023);
-    const int power = digits - 1 - exponent;
-    if (power > largestPower || power <= -largestPower)
+    int power = digits - 1 - exponent;
+    if (power > largestPower) {
+        scaled *= powerOfTen(largestPower);
+        power -= largestPower;
+    } else if (power < -largestPower) {
+        scaled *= powerOfTen(-largestPower);
+        power += largestPower;
+    }
+    if (power > largestPower || power < -largestPower)
         return nullptr;  // also infinity, a NaN and 0
-    double scaled = power >= 0 ? magnitude * powers[power] : magnitude / powers[-power];
-    if (scaled >= powers[digits]) {  // 2^exponent is below a power of ten, and the real is not
+    scaled *= powerOfTen(power);
+    if (scaled >= powerOfTen(digits)) {  // 2^exponent is below a power of ten, and the real is not
         ++exponent;
-        scaled = power > 0 ? magnitude * powers[power - 1] : magnitude / powers[1 - power];
+        scaled *= powerOfTen(-1);
     }
     auto number = static_cast<std::uint32_t>(scaled);
     const double rest = scaled - number;

@@ -58,10 +58,10 @@ double ofRandomBits()
     return real;
 }
 
-// Moves the point by up to 30 digits.
+// Moves the point by up to 45 digits.
 double moved(double real)
 {
-    const double power = std::pow(10.0, static_cast<double>(randomBits() % 31));
+    const double power = std::pow(10.0, static_cast<double>(randomBits() % 46));
     return randomBits() % 2 == 0 ? real * power : real / power;
 }
 
