@@ -31,6 +31,17 @@ void Text::add(int number)
     write(longest, [number](char* out) { return writeInteger(out, number); });
 }
 
+// Not inline: the digits of an integer are 1 KB of instructions.
+void Text::add(unsigned int number)
+{
+    addInteger(number);
+}
+
+void Text::add(unsigned long long number)
+{
+    addInteger(number);
+}
+
 void Text::add(double number)
 {
     if (locale_) {

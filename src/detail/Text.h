@@ -58,8 +58,8 @@ public:
     void remove(std::size_t length) { used_ -= length; }
 
     void add(int number);
-    void add(unsigned int number) { addInteger(number); }
-    void add(unsigned long long number) { addInteger(number); }
+    void add(unsigned int number);
+    void add(unsigned long long number);
     void add(double number);
 
     // Adds the text form of a value; the sources of the values define these. Not named `add`, because Number and
