@@ -13,6 +13,7 @@
 #include "Agreement.h"
 #include "IC/json.h"
 #include "Pairs.h"
+#include "support/Cbor.h"
 
 namespace {
 
@@ -198,11 +199,11 @@ int main(int argc, char** argv)
         const ValuePair pair = values.next();
         agreement::takeLoggerCalls();
         const json document = pair.actual;
-        const auto packed = json::to_cbor(document);
+        const std::string packed = cborOf(document);
         const bool isQuiet = agreement::takeLoggerCalls().empty();
         if (!comesBack("JSON", json::parse(document.dump()), pair)
             || !comesBack("CBOR", json::from_cbor(packed), pair)
-            || json::to_cbor(json(json::from_cbor(packed).get<IC::PropertyValue>())) != packed || !isQuiet)
+            || cborOf(json::from_cbor(packed).get<IC::PropertyValue>()) != packed || !isQuiet)
             return EXIT_FAILURE;
     }
     std::cout << count << " values come back from JSON and CBOR\n";
