@@ -89,6 +89,7 @@ void timeSet(benchmark::State& state)
         const bool found = Contender::set(*node, key, value);
         benchmark::DoNotOptimize(found);
     }
+    state.SetItemsProcessed(state.iterations());
 }
 
 template <class Contender>
@@ -153,9 +154,12 @@ void timeMakeNode(benchmark::State& state)
 }
 
 template <class Contender>
-std::vector<std::unique_ptr<typename Contender::Node>> makeNodes(std::size_t count)
+using Nodes = std::vector<std::unique_ptr<typename Contender::Node>>;
+
+template <class Contender>
+Nodes<Contender> makeNodes(std::size_t count)
 {
-    std::vector<std::unique_ptr<typename Contender::Node>> nodes;
+    Nodes<Contender> nodes;
     nodes.reserve(count);
     for (std::size_t i = 0; i < count; ++i)
         nodes.push_back(Contender::make(fewProperties));
@@ -181,20 +185,35 @@ void timeMakeNodes(benchmark::State& state, std::size_t count)
 }
 
 template <class Contender>
-void timeReadNodes(benchmark::State& state, std::size_t count)
+void timeReadNodes(benchmark::State& state, const Nodes<Contender>& nodes)
 {
-    tidyHeap();
-    const auto nodes = makeNodes<Contender>(count);
     auto value = Contender::makeEmpty();
     if (!Contender::get(*nodes.back(), fewPropertiesNumber, value))
         state.SkipWithError("the property is missing");
     beforeTiming();
-    while (state.KeepRunningBatch(static_cast<benchmark::IterationCount>(count)))
+    while (state.KeepRunningBatch(static_cast<benchmark::IterationCount>(nodes.size())))
         for (const auto& node : nodes) {
             const bool found = Contender::get(*node, fewPropertiesNumber, value);
             benchmark::DoNotOptimize(found);
             benchmark::DoNotOptimize(value);
         }
+}
+
+template <class Contender>
+void timeReadNodesInOrder(benchmark::State& state, std::size_t count)
+{
+    tidyHeap();
+    timeReadNodes<Contender>(state, makeNodes<Contender>(count));
+}
+
+// In random order.
+template <class Contender>
+void timeReadShuffledNodes(benchmark::State& state, std::size_t count)
+{
+    tidyHeap();
+    auto nodes = makeNodes<Contender>(count);
+    shuffle(nodes);
+    timeReadNodes<Contender>(state, nodes);
 }
 
 // The node that two threads share. It lives until the program ends.
@@ -215,6 +234,7 @@ void timeSharedGet(benchmark::State& state)
         const bool found = Contender::get(node, aNumber, value);
         benchmark::DoNotOptimize(found);
     }
+    state.SetItemsProcessed(state.iterations());
 }
 
 template <class Contender>
@@ -227,22 +247,16 @@ void timeSharedSet(benchmark::State& state)
         const bool found = Contender::set(node, aNumber, value);
         benchmark::DoNotOptimize(found);
     }
-}
-
-template <class Contender>
-void addShared(const std::string& row, void (*function)(benchmark::State&))
-{
-    benchmark::RegisterBenchmark(benchmarkName("two-threads/" + row, Contender::name).c_str(), function)
-        ->Threads(2)
-        ->UseRealTime();
+    state.SetItemsProcessed(state.iterations());
 }
 
 // Times `total` nodes, and each node at least once. The number of rounds is fixed: the first rounds fill the caches, so
 // a slower contender, which Google Benchmark would give fewer rounds, would look slower than it is.
 template <class Contender, class Function>
-void addNodes(const std::string& row, std::size_t total, Function function)
+void addNodes(const std::string& row, std::size_t total, std::initializer_list<std::size_t> counts,
+              Function function)
 {
-    for (const auto count : std::initializer_list<std::size_t> {1000, 30000, 1000000}) {
+    for (const auto count : counts) {
         const auto name = benchmarkName("nodes/" + row + '/' + std::to_string(count), Contender::name);
         benchmark::RegisterBenchmark(name.c_str(), [function, count](benchmark::State& state) {
             function(state, count);
@@ -256,7 +270,8 @@ bool addNodeWorkloads()
     add<Contender>("node/set-number", timeSet<Contender, Subject::number>);
     add<Contender>("node/set-real", timeSet<Contender, Subject::real>);
     add<Contender>("node/set-missing", timeSetMissing<Contender>);
-    addShared<Contender>("set-number", timeSharedSet<Contender>);
+    addThreads<Contender>("set-number", timeSharedSet<Contender>);
+    addThreads<Contender>("set-own-number", timeSet<Contender, Subject::number>);
     if constexpr (!Contender::onlySets) {
         add<Contender>("node/get-same-kind", timeGetSameKind<Contender>);
         add<Contender>("node/get-and-read", timeGetAndRead<Contender>);
@@ -265,9 +280,10 @@ bool addNodeWorkloads()
         add<Contender>("node/status", timeStatus<Contender>);
         add<Contender>("node/text", timeNodeText<Contender>);
         add<Contender>("node/make", timeMakeNode<Contender>);
-        addShared<Contender>("get-number", timeSharedGet<Contender>);
-        addNodes<Contender>("make", 30000, timeMakeNodes<Contender>);
-        addNodes<Contender>("read", 990000, timeReadNodes<Contender>);
+        addThreads<Contender>("get-number", timeSharedGet<Contender>);
+        addNodes<Contender>("make", 30000, {1000, 30000, 1000000}, timeMakeNodes<Contender>);
+        addNodes<Contender>("read", 990000, {1000, 30000, 1000000}, timeReadNodesInOrder<Contender>);
+        addNodes<Contender>("read-shuffled", 990000, {1000, 30000}, timeReadShuffledNodes<Contender>);
         addBytes<Contender>("node", [](std::size_t) { return Contender::make(fewProperties); });
     }
     return true;

@@ -2,6 +2,7 @@
 
 #include <map>
 #include <ostream>
+#include <utility>
 #include <vector>
 
 #include "Samples.h"
@@ -48,13 +49,35 @@ constexpr unsigned int noProperty = 1000;  // no property has this key
 template <class Contender>
 using PropertyMap = std::map<unsigned int, typename Contender::Value>;
 
+constexpr unsigned int farApart = 134217689;  // the largest key is 4160748359
+
+// The keys are multiples of `spacing`.
 template <class Contender>
-PropertyMap<Contender> properties()
+PropertyMap<Contender> properties(unsigned int spacing = 1)
 {
     PropertyMap<Contender> map;
     for (unsigned int key = 0; key < propertyCount; ++key)
-        map.emplace(key, makeProperty<Contender>(key));
+        map.emplace(key * spacing, makeProperty<Contender>(key));
     return map;
+}
+
+// Puts the elements in a random order, in every run the same.
+template <class Element>
+void shuffle(std::vector<Element>& elements)
+{
+    for (std::size_t left = elements.size(); left > 1; --left)
+        std::swap(elements[left - 1], elements[scattered(left) % left]);
+}
+
+// The keys of the numbers of such a map.
+inline std::vector<unsigned int> shuffledNumberKeys(unsigned int spacing)
+{
+    std::vector<unsigned int> keys;
+    for (unsigned int key = 0; key < propertyCount; ++key)
+        if (key % 8 == 0 || key % 8 == 2 || key % 8 == 4 || key % 8 == 7)
+            keys.push_back(key * spacing);
+    shuffle(keys);
+    return keys;
 }
 
 // Prints a map for a contender whose library prints no maps.

@@ -47,6 +47,15 @@ void add(const std::string& row, Function function)
     benchmark::RegisterBenchmark(benchmarkName(row, Contender::name).c_str(), function);
 }
 
+// Times the work in one thread and in two at once. `function` sets the number of items processed.
+template <class Contender>
+void addThreads(const std::string& row, void (*function)(benchmark::State&))
+{
+    benchmark::RegisterBenchmark(benchmarkName("two-threads/" + row, Contender::name).c_str(), function)
+        ->ThreadRange(1, 2)
+        ->UseRealTime();
+}
+
 template <class Contender, class Make>
 void addBytes(const std::string& row, Make make)
 {

@@ -21,6 +21,7 @@
 //   make(native)          a value
 //   read<S>(value)        the content, as the contender's users read it
 //   same(read, content)   whether both are the same content
+//   convert<T>(value)     a number as a T
 //   refused(value)        reads a text as a number; whether that was refused
 //   equal, less           compare two values
 //   text(value)           the text form
@@ -30,13 +31,19 @@
 //   libraryForm           whether its texts have to equal those of the library
 namespace benchmarks {
 
-enum class Operation { make, copy, move, assign, read, refuse, equal, less, text, stream };
+enum class Operation { make, copy, move, assign, read, convert, refuse, equal, less, text, stream };
+
+// Of numbers of all lengths there are so many that the processor does not learn which follows.
+constexpr std::size_t countOf(Subject subject)
+{
+    return subject == Subject::anyNumber || subject == Subject::anyReal ? 1024 : batchSize;
+}
 
 template <class Contender, Subject S>
 auto natives(std::size_t first = 0)
 {
     std::vector<std::decay_t<decltype(Contender::native(content<S>(0)))>> all;
-    for (std::size_t i = 0; i < batchSize; ++i)
+    for (std::size_t i = 0; i < countOf(S); ++i)
         all.push_back(Contender::native(content<S>(first + i)));
     return all;
 }
@@ -45,7 +52,7 @@ template <class Contender, Subject S>
 auto values(std::size_t first = 0)
 {
     std::vector<typename Contender::Value> all;
-    all.reserve(batchSize);
+    all.reserve(countOf(S));
     for (const auto& native : natives<Contender, S>(first))
         all.push_back(Contender::make(native));
     return all;
@@ -156,6 +163,20 @@ void timeRead(benchmark::State& state)
         }
 }
 
+template <class Contender, Subject S, class T>
+void timeConvert(benchmark::State& state)
+{
+    const auto sources = values<Contender, S>();
+    if (Contender::template convert<T>(sources.back()) != static_cast<T>(content<S>(batchSize - 1)))
+        state.SkipWithError("the number read differs from the number stored");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (const auto& source : sources) {
+            const auto number = Contender::template convert<T>(source);
+            benchmark::DoNotOptimize(number);
+        }
+}
+
 template <class Contender>
 void timeRefusedRead(benchmark::State& state)
 {
@@ -168,6 +189,7 @@ void timeRefusedRead(benchmark::State& state)
             const bool refused = Contender::refused(source);
             benchmark::DoNotOptimize(refused);
         }
+    state.SetItemsProcessed(state.iterations());
 }
 
 template <class Contender, Subject S>
@@ -177,6 +199,22 @@ void timeEqual(benchmark::State& state)
     const auto right = values<Contender, S>();
     if (!Contender::equal(left[0], right[0]) || Contender::equal(left[0], right[1]))
         state.SkipWithError("the equality is wrong");
+    beforeTiming();
+    while (state.KeepRunningBatch(batchSize))
+        for (std::size_t i = 0; i < batchSize; ++i) {
+            const bool equal = Contender::equal(left[i], right[i]);
+            benchmark::DoNotOptimize(equal);
+        }
+}
+
+// A number with a value of another kind.
+template <class Contender, Subject Other>
+void timeUnequal(benchmark::State& state)
+{
+    const auto left = values<Contender, Subject::number>();
+    const auto right = values<Contender, Other>();
+    if (Contender::equal(left[0], right[0]))
+        state.SkipWithError("values of different kinds are equal");
     beforeTiming();
     while (state.KeepRunningBatch(batchSize))
         for (std::size_t i = 0; i < batchSize; ++i) {
@@ -210,7 +248,7 @@ void timeText(benchmark::State& state)
         if (Contender::text(sources[0]) != textOf(content<S>(0)))
             state.SkipWithError("the text is not the library's");
     beforeTiming();
-    while (state.KeepRunningBatch(batchSize))
+    while (state.KeepRunningBatch(countOf(S)))
         for (const auto& source : sources) {
             auto text = Contender::text(source);
             benchmark::DoNotOptimize(text);
@@ -226,7 +264,7 @@ void timeStream(benchmark::State& state)
     if (target.isEmpty())
         state.SkipWithError("nothing was written");
     beforeTiming();
-    while (state.KeepRunningBatch(batchSize)) {
+    while (state.KeepRunningBatch(countOf(S))) {
         std::ostream& out = target.fromTheStart();
         for (const auto& source : sources)
             Contender::stream(out, source);
@@ -259,6 +297,21 @@ void timeMapFindAndRead(benchmark::State& state)
 }
 
 template <class Contender>
+void timeSparseMapFindAndRead(benchmark::State& state)
+{
+    auto map = properties<Contender>(farApart);
+    auto keys = shuffledNumberKeys(farApart);
+    benchmark::DoNotOptimize(map);
+    beforeTiming();
+    while (state.KeepRunningBatch(static_cast<benchmark::IterationCount>(keys.size())))
+        for (auto& key : keys) {
+            benchmark::DoNotOptimize(key);
+            const auto number = Contender::template read<Subject::number>(map.find(key)->second);
+            benchmark::DoNotOptimize(number);
+        }
+}
+
+template <class Contender>
 void timeMapReplace(benchmark::State& state)
 {
     auto map = properties<Contender>();
@@ -273,9 +326,9 @@ void timeMapReplace(benchmark::State& state)
 }
 
 template <class Contender>
-void timeMapPrint(benchmark::State& state)
+void timeMapPrint(benchmark::State& state, unsigned int spacing)
 {
-    const auto map = properties<Contender>();
+    const auto map = properties<Contender>(spacing);
     Target target;
     beforeTiming();
     for (auto _ : state)
@@ -307,6 +360,16 @@ void timeLargeText(benchmark::State& state, const Native& native)
 }
 
 template <class Contender, Subject S>
+void addTexts()
+{
+    const std::string subject = std::string("/") + nameOf(S);
+    if constexpr (Contender::has(Operation::text, S))
+        add<Contender>("text" + subject, timeText<Contender, S>);
+    if constexpr (Contender::has(Operation::stream, S))
+        add<Contender>("stream" + subject, timeStream<Contender, S>);
+}
+
+template <class Contender, Subject S>
 void addSubject()
 {
     const std::string subject = std::string("/") + nameOf(S);
@@ -326,16 +389,27 @@ void addSubject()
     }
     if constexpr (Contender::has(Operation::read, S))
         add<Contender>("read" + subject, timeRead<Contender, S>);
-    if constexpr (S == Subject::text12 && Contender::has(Operation::refuse, S))
+    if constexpr (S == Subject::text12 && Contender::has(Operation::refuse, S)) {
         add<Contender>("refused-read" + subject, timeRefusedRead<Contender>);
+        addThreads<Contender>("refused-read", timeRefusedRead<Contender>);
+    }
     if constexpr (Contender::has(Operation::equal, S))
         add<Contender>("equal" + subject, timeEqual<Contender, S>);
     if constexpr (Contender::has(Operation::less, S))
         add<Contender>("less" + subject, timeLess<Contender, S>);
-    if constexpr (Contender::has(Operation::text, S))
-        add<Contender>("text" + subject, timeText<Contender, S>);
-    if constexpr (Contender::has(Operation::stream, S))
-        add<Contender>("stream" + subject, timeStream<Contender, S>);
+    addTexts<Contender, S>();
+}
+
+template <class Contender>
+void addOtherKinds()
+{
+    if constexpr (Contender::has(Operation::convert, Subject::number)) {
+        add<Contender>("convert/number-to-uint64", timeConvert<Contender, Subject::number, std::uint64_t>);
+        add<Contender>("convert/number-to-real", timeConvert<Contender, Subject::number, double>);
+        add<Contender>("convert/real-to-uint32", timeConvert<Contender, Subject::wholeReal, std::uint32_t>);
+    }
+    add<Contender>("equal-other/number-real", timeUnequal<Contender, Subject::real>);
+    add<Contender>("equal-other/number-text", timeUnequal<Contender, Subject::text12>);
 }
 
 template <class Contender>
@@ -355,6 +429,9 @@ void addGrowth()
         add<Contender>("grow/text-texts" + size, [length](benchmark::State& state) {
             timeLargeText<Contender>(state, textsOfLength(length, 0));
         });
+        add<Contender>("grow/text-reals" + size, [length](benchmark::State& state) {
+            timeLargeText<Contender>(state, realsOfLength(length, 0));
+        });
     }
 }
 
@@ -372,9 +449,20 @@ bool addValueWorkloads()
     add<Contender>("map32/copy", timeMapCopy<Contender>);
     add<Contender>("map32/find-and-read", timeMapFindAndRead<Contender>);
     add<Contender>("map32/replace", timeMapReplace<Contender>);
-    add<Contender>("map32/print", timeMapPrint<Contender>);
+    add<Contender>("map32/print", [](benchmark::State& state) { timeMapPrint<Contender>(state, 1); });
     addBytes<Contender>("map32", [](std::size_t) { return properties<Contender>(); });
     addGrowth<Contender>();
+
+    addTexts<Contender, Subject::anyNumber>();
+    addTexts<Contender, Subject::anyReal>();
+    addTexts<Contender, Subject::anyNumbers100>();
+    addTexts<Contender, Subject::reals100>();
+    addTexts<Contender, Subject::mixed100>();
+    addTexts<Contender, Subject::quotedTexts100>();
+    addOtherKinds<Contender>();
+    add<Contender>("sparse-map32/find-and-read", timeSparseMapFindAndRead<Contender>);
+    add<Contender>("sparse-map32/print",
+                   [](benchmark::State& state) { timeMapPrint<Contender>(state, farApart); });
     return true;
 }
 

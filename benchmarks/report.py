@@ -23,8 +23,9 @@ PEERS = ["std::variant", RECORDS, "nlohmann::json", "boost::json", "Poco::Var", 
 SHARING = {"QVariant", "GVariant"}  # a copy is a further reference to the same content
 COLUMNS = [LIBRARY, LIMIT] + PEERS
 PRIMITIVE = "primitive"
+ONE_THREAD = ", one thread"  # what a contender of a row of two threads does in one
 NODE_PANELS = {"node", "two-threads", "nodes"}
-WITHOUT_PEERS = {"bytes", "visit"}
+WITHOUT_PEERS = {"bytes", "visit", "compile", "load"}
 
 BEGIN = "<!-- measured: begin (written by scripts/run-benchmarks --update-docs) -->"
 END = "<!-- measured: end -->"
@@ -83,16 +84,35 @@ def read_process(path):
             sys.exit(f"{run['name']}: {run['error_message']}")
         row, contender = run["name"].split("|")
         contender = contender.split("/")[0]  # without the runner's suffix, such as the number of threads
+        if row.startswith("two-threads/") and run["threads"] == 1:
+            contender += ONE_THREAD
         if "bytes" in run:
             sample = run["bytes"]
+        elif row.startswith("two-threads/"):
+            # Real time, since threads also wait.
+            sample = 1e9 / run["items_per_second"]
         else:
-            # CPU time, which other processes disturb least; for two threads real time, since they also wait.
-            sample = run["real_time" if run.get("threads", 1) > 1 else "cpu_time"]
+            # CPU time, which other processes disturb least.
+            sample = run["cpu_time"]
         samples.setdefault(row, {}).setdefault(contender, []).append(sample)
     return file["context"], {
         row: {contender: statistics.median(values) for contender, values in contenders.items()}
         for row, contenders in samples.items()
     }
+
+
+def read_commands(paths):
+    """The results of hyperfine: for each row the CPU time of each contender, in nanoseconds."""
+    rows = {}
+    for path in paths:
+        for result in json.loads(path.read_text(encoding="utf-8"))["results"]:
+            row, contender = result["command"].split("|")
+            rows.setdefault(row, {})[contender] = 1e9 * (result["user"] + result["system"])
+    shared = {row: rows.pop(row) for row in list(rows) if row.endswith("/*")}
+    for pattern, contenders in shared.items():
+        for row in fnmatch.filter(rows, pattern):
+            rows[row].update(contenders)
+    return rows
 
 
 class Row(dict):
@@ -112,10 +132,13 @@ class Row(dict):
 def read_results(paths):
     """The context, and the rows by their names."""
     processes = {}
+    commands = [path for path in paths if path.name.startswith("start-")]
     for path in paths:
-        context, rows = read_process(path)
-        for row, contenders in rows.items():
-            processes.setdefault(row, []).append(contenders)
+        if path not in commands:
+            context, rows = read_process(path)
+            for row, contenders in rows.items():
+                processes.setdefault(row, []).append(contenders)
+    processes.update((row, [contenders]) for row, contenders in read_commands(commands).items())
     kinds = list(dict.fromkeys(kind(row) for row in processes))
     # Rows of one kind stand together; sizes and primitives come last.
     rows = sorted(processes, key=lambda row: (kind(row) in {"bytes", PRIMITIVE}, kinds.index(kind(row))))
@@ -207,6 +230,20 @@ def lacking(results, columns):
     return lines
 
 
+def throughputs(results):
+    """For each row of two threads, how many times the work of one thread each contender does in two."""
+    lines = []
+    for row, medians in results.items():
+        factors = [
+            f"{contender} {medians.ratio(contender + ONE_THREAD, contender):.2f}"
+            for contender in COLUMNS
+            if contender + ONE_THREAD in medians
+        ]
+        if factors:
+            lines.append(f"Two threads do so many times the work of one in {row}: {', '.join(factors)}.")
+    return lines
+
+
 def processor():
     for line in pathlib.Path("/proc/cpuinfo").read_text(encoding="utf-8").splitlines():
         if line.startswith("model name"):
@@ -248,6 +285,7 @@ def report(context, results, bars):
         "",
         "\\* A copy shares its content with its source; the ratios do not count this peer.",
         "",
+        *(line for throughput in throughputs(results) for line in (throughput, "")),
         "What the operations are made of: "
         + ", ".join(
             f"{row.split('/')[1]} {quantity(medians[PRIMITIVE], row)}"
@@ -385,7 +423,8 @@ def update(page, lines):
 
 def main():
     parser = argparse.ArgumentParser(description=__doc__.splitlines()[0])
-    parser.add_argument("results", type=pathlib.Path, nargs="+", help="the JSON files that the benchmark wrote")
+    parser.add_argument("results", type=pathlib.Path, nargs="+",
+                        help="the JSON files of the benchmark, and those of hyperfine, named start-*.json")
     parser.add_argument("--bars", type=pathlib.Path, default=pathlib.Path(__file__).with_name("bars.txt"))
     parser.add_argument("--svg", type=pathlib.Path, help="the file for the figure")
     parser.add_argument("--update", type=pathlib.Path, help="the page whose report is replaced")

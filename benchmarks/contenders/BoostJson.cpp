@@ -28,6 +28,14 @@ struct BoostJson {
     static Value make(std::uint32_t number) { return number; }
     static Value make(double real) { return real; }
     static Value make(const std::string& text) { return Value(text); }
+    static Value make(const MixedNumbers& numbers)
+    {
+        boost::json::array array;
+        array.reserve(numbers.size());
+        for (const auto& number : numbers)
+            std::visit([&array](auto plain) { array.emplace_back(plain); }, number);
+        return array;
+    }
     template <class Element>
     static Value make(const std::vector<Element>& elements)
     {
@@ -51,6 +59,12 @@ struct BoostJson {
     static bool same(const Content& read, const Content& content)
     {
         return read == content;
+    }
+
+    template <class T>
+    static T convert(const Value& value)
+    {
+        return value.to_number<T>();
     }
 
     static bool refused(const Value& text)

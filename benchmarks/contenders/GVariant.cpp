@@ -41,12 +41,13 @@ struct Glib {
     static constexpr bool libraryForm = false;
     using Value = Handle;
 
-    // It has no order of containers.
+    // It has neither an order of containers nor conversions.
     static constexpr bool has(Operation operation, Subject subject)
     {
-        return operation != Operation::less
-            || (subject != Subject::bytes64 && subject != Subject::numbers100
-                && subject != Subject::texts100);
+        return operation != Operation::convert
+            && (operation != Operation::less
+                || (subject != Subject::bytes64 && subject != Subject::numbers100
+                    && subject != Subject::texts100));
     }
 
     template <class Content>
@@ -57,11 +58,15 @@ struct Glib {
 
     static Value make(std::uint32_t number) { return Value(g_variant_new_uint32(number)); }
     static Value make(double real) { return Value(g_variant_new_double(real)); }
+    static Value make(std::int32_t number) { return Value(g_variant_new_int32(number)); }
+    static Value make(unsigned long long number) { return Value(g_variant_new_uint64(number)); }
     static Value make(const std::string& text) { return Value(g_variant_new_string(text.c_str())); }
     template <class Element>
     static Value make(const std::vector<Element>& elements)
     {
-        const auto* type = sizeof(Element) == 1 ? G_VARIANT_TYPE_BYTE : G_VARIANT_TYPE_UINT32;
+        const auto* type = sizeof(Element) == 1 ? G_VARIANT_TYPE_BYTE
+            : sizeof(Element) == 8              ? G_VARIANT_TYPE_DOUBLE
+                                                : G_VARIANT_TYPE_UINT32;
         return Value(g_variant_new_fixed_array(type, elements.data(), elements.size(), sizeof(Element)));
     }
     static Value make(const Texts& texts)
@@ -70,6 +75,16 @@ struct Glib {
         g_variant_builder_init(&builder, G_VARIANT_TYPE_STRING_ARRAY);
         for (const auto& text : texts)
             g_variant_builder_add_value(&builder, g_variant_new_string(text.c_str()));
+        return Value(g_variant_builder_end(&builder));
+    }
+
+    static Value make(const MixedNumbers& numbers)
+    {
+        GVariantBuilder builder;
+        g_variant_builder_init(&builder, G_VARIANT_TYPE("av"));
+        for (const auto& number : numbers)
+            g_variant_builder_add(&builder, "v",
+                                  std::visit([](auto plain) { return make(plain); }, number).get());
         return Value(g_variant_builder_end(&builder));
     }
 

@@ -22,6 +22,14 @@ struct Ic {
     static IC::Number native(std::uint32_t number) { return number; }
     static IC::Number native(double real) { return real; }
     static IC::NumberArray native(const Numbers& numbers) { return {numbers.begin(), numbers.end()}; }
+    static IC::NumberArray native(const Reals& reals) { return {reals.begin(), reals.end()}; }
+    static IC::NumberArray native(const MixedNumbers& mixed)
+    {
+        IC::NumberArray numbers;
+        for (const auto& number : mixed)
+            std::visit([&numbers](auto plain) { numbers.emplace_back(plain); }, number);
+        return numbers;
+    }
     template <class Content>
     static const Content& native(const Content& content)
     {
@@ -57,6 +65,15 @@ struct Ic {
         return read == content;
     }
     static bool same(const IC::NumberArray& read, const Numbers& content) { return read == native(content); }
+
+    template <class T>
+    static T convert(const Value& value)
+    {
+        if constexpr (std::is_same_v<T, std::uint64_t>)
+            return value.operator unsigned long long();
+        else
+            return value.operator T();
+    }
 
     static bool refused(const Value& text)
     {

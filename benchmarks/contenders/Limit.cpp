@@ -19,6 +19,14 @@ struct Limit {
     static limit::Number native(std::uint32_t number) { return number; }
     static limit::Number native(double real) { return real; }
     static limit::Numbers native(const Numbers& numbers) { return {numbers.begin(), numbers.end()}; }
+    static limit::Numbers native(const Reals& reals) { return {reals.begin(), reals.end()}; }
+    static limit::Numbers native(const MixedNumbers& mixed)
+    {
+        limit::Numbers numbers;
+        for (const auto& number : mixed)
+            std::visit([&numbers](auto plain) { numbers.emplace_back(plain); }, number);
+        return numbers;
+    }
     template <class Content>
     static const Content& native(const Content& content)
     {
@@ -55,6 +63,17 @@ struct Limit {
     }
     static bool same(const limit::Numbers& read, const Numbers& content) { return read == native(content); }
 
+    template <class T>
+    static T convert(const Value& value)
+    {
+        if constexpr (std::is_same_v<T, std::uint64_t>)
+            return value.toUnsigned64();
+        else if constexpr (std::is_same_v<T, double>)
+            return value.toReal();
+        else
+            return value.toUnsigned32();
+    }
+
     static bool refused(const Value& text)
     {
         try {
@@ -70,9 +89,14 @@ struct Limit {
     static bool less(const Value& a, const Value& b) { return a < b; }
     static std::string text(const Value& value) { return value.text(); }
     static void stream(std::ostream& out, const Value& value) { out << value; }
+    // In the pieces that the library documents.
     static void streamMap(std::ostream& out, const PropertyMap<Limit>& map)
     {
-        streamEachProperty<Limit>(out, map);
+        for (auto property = map.begin(); property != map.end();) {
+            const auto& [key, value] = *property;
+            const bool last = ++property == map.end();
+            out << '[' << key << " = " << value << (last ? "]" : "], ");
+        }
     }
 };
 

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <algorithm>
-#include <charconv>
 #include <cstdint>
 #include <cstring>
 #include <map>
@@ -13,35 +12,13 @@
 #include <utility>
 #include <vector>
 
+#include "detail/Digits.h"
+
 // The limit of the design: the library's representation (one heap object for each value, an ordered map, a re-entrant
-// mutex) in the shortest code that does the work. Everything is inline but the functions that throw. No records are
-// written, and the locale is ignored. Texts are written in place.
+// mutex) in the shortest code that does the work. Everything is inline but the functions that throw and the digits of
+// reals. No records are written, and the locale is ignored. Digits come from the library's own functions: the limit
+// shows what the library does around them.
 namespace limit {
-
-// The two hexadecimal digits of each byte.
-class HexDigits {
-public:
-    constexpr HexDigits()
-    {
-        constexpr char digits[] = "0123456789abcdef";
-        for (std::size_t byte = 0; byte < 256; ++byte) {
-            pairs_[2 * byte] = digits[byte / 16];
-            pairs_[2 * byte + 1] = digits[byte % 16];
-        }
-    }
-
-    // Returns the end of the digits.
-    char* write(char* first, unsigned char byte) const
-    {
-        std::memcpy(first, pairs_ + 2 * std::size_t {byte}, 2);
-        return first + 2;
-    }
-
-private:
-    char pairs_[512] = {};
-};
-
-inline constexpr HexDigits hexDigits;
 
 struct NodeReference {
     std::uint32_t type;
@@ -53,14 +30,31 @@ public:
     enum class Kind : std::uint32_t { unknown, flag, signedInteger, unsigned32, unsigned64, real };
 
     Number() noexcept = default;
+    Number(std::int32_t value) noexcept : kind_(Kind::signedInteger) { store(value); }
     Number(std::uint32_t value) noexcept : kind_(Kind::unsigned32) { store(value); }
+    Number(unsigned long long value) noexcept : kind_(Kind::unsigned64) { store(std::uint64_t {value}); }
     Number(double value) noexcept : kind_(Kind::real) { store(value); }
 
     std::uint32_t toUnsigned32() const
     {
+        if (kind_ == Kind::unsigned32)
+            return load<std::uint32_t>();
+        if (kind_ == Kind::real && load<double>() >= 0.0 && load<double>() < 0x1p32)
+            return static_cast<std::uint32_t>(load<double>());
+        return refuse();
+    }
+    std::uint64_t toUnsigned64() const
+    {
+        if (kind_ == Kind::unsigned64)
+            return load<std::uint64_t>();
         return kind_ == Kind::unsigned32 ? load<std::uint32_t>() : refuse();
     }
-    double toReal() const { return kind_ == Kind::real ? load<double>() : refuse(); }
+    double toReal() const
+    {
+        if (kind_ == Kind::real)
+            return load<double>();
+        return kind_ == Kind::unsigned32 ? load<std::uint32_t>() : refuse();
+    }
 
     friend bool operator==(const Number& a, const Number& b)
     {
@@ -99,16 +93,15 @@ public:
     // Returns the end of the text.
     char* write(char* first) const
     {
-        char* const last = first + longestText;
         switch (kind_) {
         case Kind::signedInteger:
-            return std::to_chars(first, last, load<std::int32_t>()).ptr;
+            return IC::detail::writeInteger(first, load<std::int32_t>());
         case Kind::unsigned32:
-            return std::to_chars(first, last, load<std::uint32_t>()).ptr;
+            return IC::detail::writeDecimal(first, load<std::uint32_t>());
         case Kind::unsigned64:
-            return std::to_chars(first, last, load<std::uint64_t>()).ptr;
+            return IC::detail::writeDecimal(first, load<std::uint64_t>());
         case Kind::real:
-            return std::to_chars(first, last, load<double>(), std::chars_format::general, 6).ptr;
+            return IC::detail::writeReal(first, load<double>());
         default:
             return first;
         }
@@ -116,25 +109,10 @@ public:
 
     std::string text() const
     {
-        switch (kind_) {
-        case Kind::signedInteger:
-            return std::to_string(load<std::int32_t>());
-        case Kind::unsigned32:
-            return std::to_string(load<std::uint32_t>());
-        case Kind::unsigned64:
-            return std::to_string(load<std::uint64_t>());
-        case Kind::real: {
-            // In place: the text fits into the string's own buffer.
-            std::string text(15, ' ');
-            char* const first = text.data();
-            char* const end =
-                std::to_chars(first, first + 15, load<double>(), std::chars_format::general, 6).ptr;
-            text.resize(static_cast<std::size_t>(end - first));
-            return text;
-        }
-        default:
-            return "unknown";
-        }
+        if (kind_ == Kind::unsigned32)
+            return IC::detail::decimalText(load<std::uint32_t>());
+        char buffer[longestText];
+        return std::string(buffer, write(buffer));
     }
 
 private:
@@ -243,6 +221,7 @@ public:
     bool readOnly() const noexcept { return readOnly_; }
 
     std::uint32_t toUnsigned32() const { return checked<Number>(Kind::number).toUnsigned32(); }
+    std::uint64_t toUnsigned64() const { return checked<Number>(Kind::number).toUnsigned64(); }
     double toReal() const { return checked<Number>(Kind::number).toReal(); }
     const std::string& asText() const { return checked<std::string>(Kind::text); }
     const Bytes& asBytes() const { return checked<Bytes>(Kind::bytes); }
@@ -399,11 +378,11 @@ private:
         std::size_t i = 0;
         for (; i + 4 <= bytes.size(); i += 4) {
             for (std::size_t j = 0; j < 4; ++j)
-                next = hexDigits.write(next, bytes[i + j]);
+                next = IC::detail::writeHex(next, bytes[i + j]);
             ++next;
         }
         for (; i < bytes.size(); ++i)
-            next = hexDigits.write(next, bytes[i]);
+            next = IC::detail::writeHex(next, bytes[i]);
         return text;
     }
 
@@ -411,6 +390,7 @@ private:
     static std::string textOf(const Numbers& numbers)
     {
         std::string text;
+        text.reserve(12 * numbers.size());
         char buffer[1024];
         const char* const almostFull = buffer + sizeof buffer - Number::longestText - 2;
         char* next = buffer;
@@ -525,11 +505,11 @@ public:
         std::string text(5 + 2 * path_.size(), ' ');
         char* next = std::copy_n("Node ", 5, text.data());
         for (const char character : path_)
-            next = hexDigits.write(next, static_cast<unsigned char>(character));
+            next = IC::detail::writeHex(next, static_cast<unsigned char>(character));
         char rest[48] = " : ";
-        char* end = std::to_chars(rest + 3, rest + sizeof rest, sensor_).ptr;
+        char* end = IC::detail::writeDecimal(rest + 3, sensor_);
         end = std::copy(beforeStatus.begin(), beforeStatus.end(), end);
-        end = std::to_chars(end, rest + sizeof rest, statusTwiceLocked()).ptr;
+        end = IC::detail::writeDecimal(end, statusTwiceLocked());
         text.append(rest, end);
         return text;
     }

@@ -27,6 +27,13 @@ struct NlohmannJson {
     }
 
     static Value make(const Bytes& bytes) { return Value::binary(bytes); }
+    static Value make(const MixedNumbers& numbers)
+    {
+        auto array = Value::array();
+        for (const auto& number : numbers)
+            std::visit([&array](auto plain) { array.push_back(plain); }, number);
+        return array;
+    }
     template <class Native>
     static Value make(const Native& native)
     {
@@ -46,6 +53,12 @@ struct NlohmannJson {
     static bool same(const Content& read, const Content& content)
     {
         return read == content;
+    }
+
+    template <class T>
+    static T convert(const Value& value)
+    {
+        return value.get<T>();
     }
 
     static bool refused(const Value& text)

@@ -27,6 +27,13 @@ struct PocoVar {
     {
         return content;
     }
+    static std::vector<Value> native(const MixedNumbers& numbers)
+    {
+        std::vector<Value> all;
+        for (const auto& number : numbers)
+            std::visit([&all](auto plain) { all.push_back(of(plain)); }, number);
+        return all;
+    }
 
     template <class Native>
     static Value make(const Native& native)
@@ -44,6 +51,12 @@ struct PocoVar {
     static bool same(const Content& read, const Content& content)
     {
         return read == content;
+    }
+
+    template <class T>
+    static T convert(const Value& value)
+    {
+        return value.convert<T>();
     }
 
     static bool refused(const Value& text)
@@ -80,6 +93,14 @@ struct PocoVar {
     }
 
 private:
+    // It knows the integers of 64 bits under one type.
+    template <class Plain>
+    static Value of(Plain plain)
+    {
+        return plain;
+    }
+    static Value of(unsigned long long plain) { return Poco::UInt64 {plain}; }
+
     static void writeHex(std::ostream& out, const Value& value)
     {
         const auto& bytes = value.extract<Bytes>();

@@ -30,12 +30,17 @@ struct Qt {
     {
         return QByteArray::fromStdString(std::string(bytes.begin(), bytes.end()));
     }
-    static QVariantList native(const Numbers& numbers)
+    template <class Number>
+    static QVariantList native(const std::vector<Number>& numbers)
     {
         QVariantList list;
-        for (const auto number : numbers)
-            list.append(number);
+        for (const auto& number : numbers)
+            list.append(QVariant(native(number)));
         return list;
+    }
+    static QVariant native(const MixedNumber& number)
+    {
+        return std::visit([](auto plain) { return QVariant(plain); }, number);
     }
     static QStringList native(const Texts& texts)
     {
@@ -72,6 +77,17 @@ struct Qt {
     static bool same(const Read& read, const Content& content)
     {
         return read == native(content);
+    }
+
+    template <class T>
+    static T convert(const Value& value)
+    {
+        if constexpr (std::is_same_v<T, std::uint64_t>)
+            return value.toULongLong();
+        else if constexpr (std::is_same_v<T, double>)
+            return value.toDouble();
+        else
+            return value.toUInt();
     }
 
     // Qt reports the refusal with a flag, not with an exception.

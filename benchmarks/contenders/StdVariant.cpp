@@ -3,7 +3,9 @@
 
 #include <cstdint>
 #include <cstdio>
+#include <limits>
 #include <mutex>
+#include <stdexcept>
 #include <type_traits>
 #include <variant>
 
@@ -17,8 +19,9 @@ namespace benchmarks {
 namespace {
 
 // The basic types of the bus, and those arrays of them that the workloads need.
-using Variant = std::variant<bool, std::uint8_t, std::int16_t, std::uint16_t, std::int32_t, std::uint32_t,
-                             std::int64_t, std::uint64_t, double, std::string, Bytes, Numbers, Texts>;
+using Variant =
+    std::variant<bool, std::uint8_t, std::int16_t, std::uint16_t, std::int32_t, std::uint32_t, std::int64_t,
+                 std::uint64_t, double, std::string, Bytes, Numbers, Texts, Reals, MixedNumbers>;
 
 // Writes to a stream with standard means: a visitor, manipulators, a loop.
 struct Print {
@@ -44,12 +47,15 @@ struct Print {
         out.fill(fill);
         out.flags(flags);
     }
-    void operator()(const Numbers& numbers) const
+    void operator()(const MixedNumber& number) const { std::visit(*this, number); }
+    template <class Number>
+    void operator()(const std::vector<Number>& numbers) const
     {
         out << '{';
         const char* separator = "";
-        for (const auto number : numbers) {
-            out << separator << number;
+        for (const auto& number : numbers) {
+            out << separator;
+            (*this)(number);
             separator = ", ";
         }
         out << '}';
@@ -94,6 +100,24 @@ struct ToText {
     }
 };
 
+// Converts a number as far as the other type reaches.
+template <class To>
+struct ToNumber {
+    template <class From>
+    To operator()(const From& from) const
+    {
+        if constexpr (std::is_arithmetic_v<From>) {
+            constexpr auto limit = static_cast<double>(std::numeric_limits<To>::max()) + 1;
+            if constexpr (std::is_floating_point_v<From> && std::is_integral_v<To>)
+                if (!(from >= 0 && from < limit))
+                    throw std::out_of_range("the real is no such integer");
+            return static_cast<To>(from);
+        } else {
+            throw std::bad_variant_access();
+        }
+    }
+};
+
 struct StdVariant {
     static constexpr const char* name = "std::variant";
     static constexpr bool libraryForm = true;
@@ -123,6 +147,12 @@ struct StdVariant {
     static bool same(const Content& read, const Content& content)
     {
         return read == content;
+    }
+
+    template <class T>
+    static T convert(const Value& value)
+    {
+        return std::visit(ToNumber<T> {}, value);
     }
 
     static bool refused(const Value& text)
