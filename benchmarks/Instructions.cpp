@@ -4,13 +4,18 @@
 #include <functional>
 #include <iostream>
 #include <map>
+#include <sstream>
 #include <string>
+#include <vector>
 
 #include "IC/Node.h"
+#include "Samples.h"
 #include "VXLog/RecordSink.h"
 
 namespace {
 
+using benchmarks::content;
+using benchmarks::Subject;
 using IC::Number;
 using IC::PropertyValue;
 
@@ -26,6 +31,101 @@ void repeat(long count, Operation operation)
 {
     for (; count > 0; --count)
         operation();
+}
+
+template <class Content>
+PropertyValue valueOf(const Content& content)
+{
+    return PropertyValue(content);
+}
+PropertyValue valueOf(std::uint32_t number)
+{
+    return PropertyValue(Number(number));
+}
+PropertyValue valueOf(double real)
+{
+    return PropertyValue(Number(real));
+}
+template <class Element>
+IC::NumberArray numberArray(const std::vector<Element>& elements)
+{
+    return {elements.begin(), elements.end()};
+}
+PropertyValue valueOf(const benchmarks::Numbers& numbers)
+{
+    return PropertyValue(numberArray(numbers));
+}
+PropertyValue valueOf(const benchmarks::Reals& reals)
+{
+    return PropertyValue(numberArray(reals));
+}
+PropertyValue valueOf(const benchmarks::MixedNumbers& mixed)
+{
+    IC::NumberArray numbers;
+    for (const auto& number : mixed)
+        std::visit([&numbers](auto plain) { numbers.emplace_back(plain); }, number);
+    return PropertyValue(numbers);
+}
+
+// Repeats the operation on 100 values in turn. The numbers of repetitions are multiples of 100.
+template <Subject S, class Operation>
+void repeatOnEach(long count, Operation operation)
+{
+    std::vector<PropertyValue> values;
+    for (std::size_t i = 0; i < 100; ++i)
+        values.push_back(valueOf(content<S>(i)));
+    for (; count > 0; count -= 100)
+        for (PropertyValue& value : values) {
+            use(value);
+            operation(value);
+        }
+}
+
+template <Subject S>
+void makeTexts(long count)
+{
+    repeatOnEach<S>(count, [](const PropertyValue& value) {
+        std::string text = value;
+        use(text);
+    });
+}
+
+template <Subject S>
+void print(long count)
+{
+    std::ostringstream out;
+    repeatOnEach<S>(count, [&out](const PropertyValue& value) {
+        out.seekp(0);
+        out << value;
+    });
+}
+
+template <Subject S>
+void assign(long count)
+{
+    auto target = valueOf(content<S>(0));
+    repeatOnEach<S>(count, [&target](const PropertyValue& value) {
+        target = value;
+        use(target);
+    });
+}
+
+template <Subject S, class T>
+void read(long count)
+{
+    repeatOnEach<S>(count, [](const PropertyValue& value) {
+        T native = value.operator T();
+        use(native);
+    });
+}
+
+template <Subject S, Subject Other>
+void compare(long count)
+{
+    repeatOnEach<S>(count, [other = valueOf(content<Other>(0))](const PropertyValue& value) {
+        bool equal = value == other;
+        use(equal);
+    });
 }
 
 class Fan : public IC::Node {
@@ -112,6 +212,59 @@ const std::map<std::string, std::function<void(long)>> operations = {
              use(error);
              unsigned int number = value;
              use(number);
+         });
+     }},
+    {"text-of-any-real", makeTexts<Subject::anyReal>},
+    {"text-of-reals", makeTexts<Subject::reals100>},
+    {"text-of-mixed", makeTexts<Subject::mixed100>},
+    {"print-number", print<Subject::number>},
+    {"print-any-real", print<Subject::anyReal>},
+    {"print-text12", print<Subject::text12>},
+    {"print-text40", print<Subject::text40>},
+    {"print-map",
+     [](long count) {
+         std::map<unsigned int, PropertyValue> properties;
+         for (unsigned int i = 0; i < 32; ++i)
+             properties.emplace(134217689 * i,
+                                i % 2 == 0 ? valueOf(content<Subject::anyNumber>(i))
+                                           : valueOf(content<Subject::text12>(i)));
+         std::ostringstream out;
+         repeat(count, [&properties, &out] {
+             out.seekp(0);
+             out << properties;
+         });
+     }},
+    {"assign-bytes", assign<Subject::bytes64>},
+    {"assign-numbers", assign<Subject::numbers100>},
+    {"read-as-uint64", read<Subject::anyNumber, unsigned long long>},
+    {"read-as-real", read<Subject::anyNumber, double>},
+    {"read-real-as-uint32", read<Subject::wholeReal, unsigned int>},
+    {"unequal-kinds", compare<Subject::anyNumber, Subject::anyReal>},
+    {"equal-numbers", compare<Subject::numbers100, Subject::numbers100>},
+    {"get-same-kind",
+     [](long count) {
+         const Fan fan;
+         PropertyValue value(Number(0u));
+         repeat(count, [&fan, &value] {
+             IC::Error error = fan.getProperty(16, value);
+             use(error);
+         });
+     }},
+    {"get-missing",
+     [](long count) {
+         const Fan fan;
+         PropertyValue value(Number(0u));
+         repeat(count, [&fan, &value] {
+             IC::Error error = fan.getProperty(1000, value);
+             use(error);
+         });
+     }},
+    {"status",
+     [](long count) {
+         const Fan fan;
+         repeat(count, [&fan] {
+             auto status = fan.getStatus();
+             use(status);
          });
      }},
     {"set-number",

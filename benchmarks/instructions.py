@@ -1,12 +1,15 @@
 #!/usr/bin/env python3
 """Counts the instructions that the most common operations execute in the library, the stand-ins and their caller.
 
-Instructions of the C and C++ libraries do not count, because those choose their code by the processor. The counts are
-compared with a table of earlier ones; with --update they replace it.
+Instructions of the C and C++ libraries do not count, because those choose their code by the processor. Counts also what
+a program executes to load the three libraries, then in the C library too, and the bytes of libIC.so's instructions and
+constants. The counts are compared with a table of earlier ones; with --update they replace it.
 """
 
 import argparse
+import concurrent.futures
 import math
+import os
 import pathlib
 import re
 import subprocess
@@ -15,6 +18,8 @@ import tempfile
 
 TOLERANCE = 0.03
 RUNS = (1000, 2000)  # the difference leaves out what the program does besides the operation
+LOAD = "load-libraries"
+SIZE = "size-of-libIC.so"
 OURS = re.compile(r"/(libIC|libZQ|libVXLog)\.so[.\d]*$|/instructions$")
 
 
@@ -44,6 +49,23 @@ def executed(program, operation, count):
                     total += int(match[1])
                 called = False
         return total
+
+
+def loading(libraries):
+    """The number of instructions that a program executes to load the libraries."""
+    with tempfile.TemporaryDirectory() as folder:
+        profile = pathlib.Path(folder, "profile")
+        subprocess.run(
+            ["valgrind", "--tool=callgrind", f"--callgrind-out-file={profile}", "/bin/true"],
+            env=os.environ | {"LD_PRELOAD": ":".join(map(str, libraries))},
+            check=True, stderr=subprocess.DEVNULL)
+        return int(re.search(r"^totals: (\d+)$", profile.read_text(), re.MULTILINE)[1])
+
+
+def text_size(library):
+    """The size of the library's instructions and constants in bytes."""
+    output = subprocess.run(["size", library], check=True, stdout=subprocess.PIPE, text=True).stdout
+    return int(output.splitlines()[1].split()[0])
 
 
 def operations_of(program):
@@ -79,20 +101,32 @@ def main():
         sys.exit(f"{options.table} has the counts of {compiler}, and each compiler has its own; this is "
                  f"{options.compiler}. To compare a change here, first make a table without it, with --update")
 
-    operations = operations_of(options.program)
+    build = pathlib.Path(options.program).resolve().parents[1]
+    library = build / "libIC.so"
+    operations = [*operations_of(options.program), LOAD, SIZE]
     if set(operations) != set(table) and not options.update:
         sys.exit(f"{options.table} and the program differ in these operations: "
                  f"{', '.join(sorted(set(operations) ^ set(table)))}")
 
+    def count(operation):
+        if operation == LOAD:
+            platform = [build / "platform/libZQ.so", build / "platform/libVXLog.so"]
+            return loading([library, *platform]) - loading(["libstdc++.so.6"])
+        if operation == SIZE:
+            return text_size(library)
+        first, second = (executed(options.program, operation, runs) for runs in RUNS)
+        return (second - first) / (RUNS[1] - RUNS[0])
+
+    operations.sort(key=[*table, *operations].index)  # the new ones last
+    with concurrent.futures.ThreadPoolExecutor(os.cpu_count()) as executor:
+        counts = dict(zip(operations, executor.map(count, operations)))
+
     exceeded = []
-    counts = {}
-    print(f"{'operation':16} {'now':>9} {'table':>9} {'ratio':>6}")
-    for operation in sorted(operations, key=[*table, *operations].index):  # the new ones last
+    print(f"{'operation':19} {'now':>9} {'table':>9} {'ratio':>6}")
+    for operation, now in counts.items():
         before = table.get(operation, math.nan)
-        first, second = (executed(options.program, operation, count) for count in RUNS)
-        now = counts[operation] = (second - first) / (RUNS[1] - RUNS[0])
         ratio = now / before
-        print(f"{operation:16} {now:9.1f} {before:9.1f} {ratio:6.3f}")
+        print(f"{operation:19} {now:9.1f} {before:9.1f} {ratio:6.3f}")
         if not 1 - TOLERANCE <= ratio <= 1 + TOLERANCE:
             exceeded.append(operation)
 
