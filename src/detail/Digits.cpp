@@ -91,7 +91,7 @@ char* writeSixDigits(char* out, double real)
     out += bits >> 63;
     const bool scientific = exponent >= digits || exponent < -4;
     if (exponent < 0 && !scientific) {
-        std::memcpy(out, "0.000", 5);
+        std::copy_n("0.000", 5, out);
         out += 1 - exponent;
         store(out, text);
         return out + length;
