@@ -339,10 +339,9 @@ sNodeRef Number::refuseNodeRef() const
 
 Number::operator std::string() const
 {
-    if ((kind_ == KIND_UINT32 || kind_ == KIND_REAL)
-        && detail::globalLocaleIsClassic()) {  // the most frequent kinds
-        if (kind_ == KIND_UINT32)
-            return detail::decimalText(load<ZQ::Uint32>());
+    if (kind_ == KIND_UINT32 && detail::globalLocaleIsClassic())  // the most frequent kinds
+        return detail::decimalText(load<ZQ::Uint32>());
+    if (kind_ == KIND_REAL && detail::globalLocaleIsClassic()) {
         char digits[detail::longestReal];
         return std::string(digits, detail::writeReal(digits, load<ZQ::Real64>()));
     }
@@ -434,12 +433,14 @@ bool operator>=(const Number& a, const Number& b)
 
 std::ostream& operator<<(std::ostream& out, const Number& number)
 {
-    const auto kind = number.kind_;
-    if ((kind == Number::KIND_UINT32 || kind == Number::KIND_REAL) && detail::globalLocaleIsClassic()) {
+    if (number.kind_ == Number::KIND_UINT32 && detail::globalLocaleIsClassic()) {  // the most frequent kinds
+        char digits[10];
+        const char* const end = detail::writeDecimal(digits, number.load<ZQ::Uint32>());
+        return out << std::string_view(digits, static_cast<std::size_t>(end - digits));
+    }
+    if (number.kind_ == Number::KIND_REAL && detail::globalLocaleIsClassic()) {
         char digits[detail::longestReal];
-        const char* const end = kind == Number::KIND_UINT32
-            ? detail::writeDecimal(digits, number.load<ZQ::Uint32>())
-            : detail::writeReal(digits, number.load<ZQ::Real64>());
+        const char* const end = detail::writeReal(digits, number.load<ZQ::Real64>());
         return out << std::string_view(digits, static_cast<std::size_t>(end - digits));
     }
     return detail::insert(out, number);
