@@ -1573,6 +1573,13 @@ TEST(NumberText, OfARealHasSixSignificantDigitsInEveryDecade)
         EXPECT_EQ(std::string(Number(-among)), std::string("-") + texts[1]);
         EXPECT_EQ(std::string(Number(last)), texts[2]);
     }
+    for (int exponent = 6; exponent <= 307; ++exponent) {
+        const std::string power = (exponent < 10 ? "0" : "") + std::to_string(exponent);
+        for (const char* digits : {"1e-", "1e+", "1.23457e-", "1.23457e+", "-9.99999e-", "-9.99999e+"}) {
+            const std::string text = digits + power;
+            EXPECT_EQ(std::string(Number(std::stod(text))), text);
+        }
+    }
     // These are rounded up to the next decade.
     EXPECT_EQ(std::string(Number(999999.6)), "1e+06");
     EXPECT_EQ(std::string(Number(99.99996)), "100");
