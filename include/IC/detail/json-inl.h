@@ -4,9 +4,9 @@
 
 #include <algorithm>
 #include <array>
-#include <charconv>
 #include <cstddef>
 #include <cstdint>
+#include <cstdlib>
 #include <cstring>
 #include <initializer_list>
 #include <limits>
@@ -653,11 +653,8 @@ PropertyMap read(const JsonPlace<Json>& place, Wanted<PropertyMap>)
 {
     PropertyMap properties;
     place.forEachMember([&properties](const std::string& key, const JsonPlace<Json>& value) {
-        unsigned int number = 0;
-        // Digits alone: libstdc++ 12 converts the sign of other bytes, which -fsanitize=implicit-conversion reports.
-        if (key.find_first_not_of("0123456789") == std::string::npos)
-            std::from_chars(key.data(), key.data() + key.size(), number);
-        if (std::to_string(number) != key)
+        const auto number = static_cast<unsigned int>(std::strtoul(key.c_str(), nullptr, 10));
+        if (std::to_string(number) != key)  // as for "+7", " 7" and 2^32 + 7
             value.fail("expected a property number as the key");
         properties.emplace(number, read(value, Wanted<PropertyValue>()));
     });
