@@ -82,7 +82,7 @@ void detail::Text::append(const Alert& alert)
     add("; ");
     add(static_cast<unsigned int>(alert.status_));
     add("; ");
-    add(alert.message_);
+    append(alert.message_);
     add("; ");
     addStreamed(alert.timeStamp_);
     add("; { ");

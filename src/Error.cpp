@@ -62,7 +62,7 @@ void detail::Text::append(const Error& error)
     }
     if (!error.message_.empty()) {
         add(" - ");
-        add(error.message_);
+        append(error.message_);
     }
 }
 

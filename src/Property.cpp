@@ -60,11 +60,6 @@ void addObject(detail::Text& text, const T& object)
     text.append(object);
 }
 
-void addObject(detail::Text& text, const std::string& content)
-{
-    text.add(content);
-}
-
 void addObject(detail::Text& text, const Buffer& bytes)
 {
     text.write(2 * bytes.size() + bytes.size() / 4, [&bytes](char* out) {

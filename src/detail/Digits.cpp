@@ -81,7 +81,7 @@ char* writeSixDigits(char* out, double real)
     if (std::fabs(rest - 0.5) <= uncertain)
         return nullptr;
     number += rest > 0.5 ? 1 : 0;
-    if (number < 100000 || number > 999999)
+    if (number > 999999)
         return nullptr;
 
     const std::uint64_t text = sixDigits(number);

@@ -64,6 +64,7 @@ public:
 
     // Adds the text form of a value; the sources of the values define these. Not named `add`, because Number and
     // std::string_view both take a literal.
+    void append(const std::string& text) { add(text); }
     void append(const Number& number);
     void append(const std::vector<Number>& numbers);
     void append(const EnumValue& value);
