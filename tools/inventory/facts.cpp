@@ -80,6 +80,7 @@ const struct FactRow {
     {"DeviceLocation", KEY_LOCATION, asText},
     {"Slot", KEY_LOCATION, asText},
     {"Type", KEY_CHASSIS_TYPE, asCode},
+    {"HostName", KEY_HOST_NAME, asText},
     {"hwlocVersion", KEY_SOURCE_VERSION, as<IC::Number, version>},
     {"FrequencyMaxMHz", KEY_FREQUENCY, as<IC::Number, realNumber>},
     {"LinuxCapacity", KEY_CAPACITY, asCount},

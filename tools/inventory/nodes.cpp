@@ -4,7 +4,6 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
-#include <iterator>
 
 #include "mapping.h"
 #include "values.h"
@@ -14,20 +13,76 @@ namespace inventory {
 namespace {
 
 // clang-format off
-const char* const keyNames[] = {
-    "this node", "parent node", "name", "label (the operator's own)", "number given by the system",
-    "the system may use it", "subtype", "other facts", "read at", "version of the source", "maker", "model",
-    "revision", "version", "released", "serial number", "asset tag", "part number", "UUID", "location",
-    "chassis type (as DMI counts: 17 main server, 23 rack mount)", "CPUs", "cores", "hardware threads",
-    "numbers of the hardware threads", "frequency, at most, MHz", "capacity (1024: fastest core)",
-    "size in bytes", "level", "cache kind (0 unified, 1 data, 2 instructions)", "line size in bytes",
-    "ways (-1: fully associative)", "inclusive", "page sizes in bytes", "numbers of pages", "PCI address",
-    "PCI class", "PCI maker and device", "link speed, GB/s", "sector size in bytes", "device number",
-    "address", "port", "port state (as InfiniBand counts: 4 active)", "port local id", "port global id",
-    "node GUID", "reading", "unit", "lower limit", "lower critical limit", "upper limit",
-    "upper critical limit", "alarm", "fault", "chip"};
+constexpr KeyInfo keys[] = {
+    {KEY_SELF, "self", "this node", ""},
+    {KEY_PARENT, "parent", "parent node", ""},
+    {KEY_NAME, "name", "name", ""},
+    {KEY_LABEL, "label", "label (the operator's own)", ""},
+    {KEY_INDEX, "index", "number given by the system", ""},
+    {KEY_USABLE, "usable", "the system may use it", ""},
+    {KEY_SUBTYPE, "subtype", "subtype", ""},
+    {KEY_OTHER_FACTS, "otherFacts", "other facts", ""},
+    {KEY_READ_AT, "readAt", "read at", ""},
+    {KEY_SOURCE_VERSION, "sourceVersion", "version of the source", ""},
+    {KEY_MAKER, "maker", "maker", ""},
+    {KEY_MODEL, "model", "model", ""},
+    {KEY_REVISION, "revision", "revision", ""},
+    {KEY_VERSION, "version", "version", ""},
+    {KEY_RELEASED, "released", "released", ""},
+    {KEY_SERIAL_NUMBER, "serialNumber", "serial number", ""},
+    {KEY_ASSET_TAG, "assetTag", "asset tag", ""},
+    {KEY_PART_NUMBER, "partNumber", "part number", ""},
+    {KEY_UUID, "uuid", "UUID", ""},
+    {KEY_LOCATION, "location", "location", ""},
+    {KEY_CHASSIS_TYPE, "chassisType", "chassis type", ""},
+    {KEY_CPUS, "cpus", "CPUs", ""},
+    {KEY_CORES, "cores", "cores", ""},
+    {KEY_THREADS, "threads", "hardware threads", ""},
+    {KEY_CPU_SET, "cpuSet", "numbers of the hardware threads", ""},
+    {KEY_FREQUENCY, "maximumFrequency", "maximum frequency", "MHz"},
+    {KEY_CAPACITY, "capacity", "capacity (1024: fastest core)", ""},
+    {KEY_SIZE, "size", "size", "bytes"},
+    {KEY_LEVEL, "level", "level", ""},
+    {KEY_CACHE_KIND, "cacheKind", "cache kind", ""},
+    {KEY_LINE_SIZE, "lineSize", "line size", "bytes"},
+    {KEY_WAYS, "ways", "ways (-1: fully associative)", ""},
+    {KEY_INCLUSIVE, "inclusive", "inclusive", ""},
+    {KEY_PAGE_SIZES, "pageSizes", "page sizes", "bytes"},
+    {KEY_PAGE_COUNTS, "pageCounts", "numbers of pages", ""},
+    {KEY_PCI_ADDRESS, "pciAddress", "PCI address", ""},
+    {KEY_PCI_CLASS, "pciClass", "PCI class", ""},
+    {KEY_PCI_DEVICE, "pciDevice", "PCI maker and device", ""},
+    {KEY_LINK_SPEED, "linkSpeed", "link speed", "GB/s"},
+    {KEY_SECTOR_SIZE, "sectorSize", "sector size", "bytes"},
+    {KEY_DEVICE_NUMBER, "deviceNumber", "device number", ""},
+    {KEY_ADDRESS, "address", "address", ""},
+    {KEY_PORT, "port", "port", ""},
+    {KEY_PORT_STATE, "portState", "port state", ""},
+    {KEY_PORT_LID, "portLid", "port local id", ""},
+    {KEY_PORT_GID, "portGid", "port global id", ""},
+    {KEY_NODE_GUID, "nodeGuid", "node GUID", ""},
+    {KEY_READING, "reading", "reading", ""},
+    {KEY_UNIT, "unit", "unit", ""},
+    {KEY_LOWER_LIMIT, "lowerLimit", "lower limit", ""},
+    {KEY_LOWER_CRITICAL, "lowerCritical", "lower critical limit", ""},
+    {KEY_UPPER_LIMIT, "upperLimit", "upper limit", ""},
+    {KEY_UPPER_CRITICAL, "upperCritical", "upper critical limit", ""},
+    {KEY_ALARM, "alarm", "alarm", ""},
+    {KEY_FAULT, "fault", "fault", ""},
+    {KEY_CHIP, "chip", "chip", ""},
+    {KEY_HOST_NAME, "hostName", "host name", ""},
+};
 // clang-format on
-static_assert(std::size(keyNames) == KEY_LAST);
+
+constexpr bool areInOrder()
+{
+    unsigned int key = 0;
+    for (const KeyInfo& info : keys)
+        if (info.key != ++key)
+            return false;
+    return key == KEY_LAST;
+}
+static_assert(areInOrder());
 
 // IC::Number takes unsigned long long; on some machines hwloc's 64-bit type is another type.
 IC::Number number64(hwloc_uint64_t number)
@@ -48,9 +103,17 @@ IC::Number now()
 
 }  // namespace
 
-const char* nameOf(unsigned int key)
+const KeyInfo* infoOf(unsigned int key)
 {
-    return key >= 1 && key <= KEY_LAST ? keyNames[key - 1] : "";
+    return key >= 1 && key <= KEY_LAST ? &keys[key - 1] : nullptr;
+}
+
+std::string nameOf(unsigned int key)
+{
+    const KeyInfo* info = infoOf(key);
+    if (info == nullptr)
+        return "";
+    return *info->unit == '\0' ? info->caption : std::string(info->caption) + " in " + info->unit;
 }
 
 Component::Component(const Site& site) : Node(site.sensor)

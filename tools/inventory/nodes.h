@@ -15,28 +15,89 @@ namespace inventory {
 
 using Nodes = std::vector<std::unique_ptr<IC::Node>>;
 
-// The numbers of the properties, from 1. The table of their names, in nodes.cpp, says what each holds.
-// clang-format off
+// The numbers of the properties, from 1. A number never changes its meaning: a new property is appended. The table of
+// the properties, in nodes.cpp, says what each holds.
 enum Key : unsigned int {
-    KEY_SELF = 1, KEY_PARENT, KEY_NAME, KEY_LABEL, KEY_INDEX, KEY_USABLE, KEY_SUBTYPE, KEY_OTHER_FACTS,
-    KEY_READ_AT, KEY_SOURCE_VERSION, KEY_MAKER, KEY_MODEL, KEY_REVISION, KEY_VERSION, KEY_RELEASED,
-    KEY_SERIAL_NUMBER, KEY_ASSET_TAG, KEY_PART_NUMBER, KEY_UUID, KEY_LOCATION, KEY_CHASSIS_TYPE, KEY_CPUS,
-    KEY_CORES, KEY_THREADS, KEY_CPU_SET, KEY_FREQUENCY, KEY_CAPACITY, KEY_SIZE, KEY_LEVEL, KEY_CACHE_KIND,
-    KEY_LINE_SIZE, KEY_WAYS, KEY_INCLUSIVE, KEY_PAGE_SIZES, KEY_PAGE_COUNTS, KEY_PCI_ADDRESS,
-    KEY_PCI_CLASS, KEY_PCI_DEVICE, KEY_LINK_SPEED, KEY_SECTOR_SIZE, KEY_DEVICE_NUMBER, KEY_ADDRESS,
-    KEY_PORT, KEY_PORT_STATE, KEY_PORT_LID, KEY_PORT_GID, KEY_NODE_GUID, KEY_READING, KEY_UNIT,
-    KEY_LOWER_LIMIT, KEY_LOWER_CRITICAL, KEY_UPPER_LIMIT, KEY_UPPER_CRITICAL, KEY_ALARM, KEY_FAULT,
-    KEY_CHIP, KEY_LAST = KEY_CHIP
+    KEY_SELF = 1,
+    KEY_PARENT,
+    KEY_NAME,
+    KEY_LABEL,
+    KEY_INDEX,
+    KEY_USABLE,
+    KEY_SUBTYPE,
+    KEY_OTHER_FACTS,
+    KEY_READ_AT,
+    KEY_SOURCE_VERSION,
+    KEY_MAKER,
+    KEY_MODEL,
+    KEY_REVISION,
+    KEY_VERSION,
+    KEY_RELEASED,
+    KEY_SERIAL_NUMBER,
+    KEY_ASSET_TAG,
+    KEY_PART_NUMBER,
+    KEY_UUID,
+    KEY_LOCATION,
+    KEY_CHASSIS_TYPE,
+    KEY_CPUS,
+    KEY_CORES,
+    KEY_THREADS,
+    KEY_CPU_SET,
+    KEY_FREQUENCY,
+    KEY_CAPACITY,
+    KEY_SIZE,
+    KEY_LEVEL,
+    KEY_CACHE_KIND,
+    KEY_LINE_SIZE,
+    KEY_WAYS,
+    KEY_INCLUSIVE,
+    KEY_PAGE_SIZES,
+    KEY_PAGE_COUNTS,
+    KEY_PCI_ADDRESS,
+    KEY_PCI_CLASS,
+    KEY_PCI_DEVICE,
+    KEY_LINK_SPEED,
+    KEY_SECTOR_SIZE,
+    KEY_DEVICE_NUMBER,
+    KEY_ADDRESS,
+    KEY_PORT,
+    KEY_PORT_STATE,
+    KEY_PORT_LID,
+    KEY_PORT_GID,
+    KEY_NODE_GUID,
+    KEY_READING,
+    KEY_UNIT,
+    KEY_LOWER_LIMIT,
+    KEY_LOWER_CRITICAL,
+    KEY_UPPER_LIMIT,
+    KEY_UPPER_CRITICAL,
+    KEY_ALARM,
+    KEY_FAULT,
+    KEY_CHIP,
+    KEY_HOST_NAME,
+    KEY_END,  // behind the last number
+    KEY_LAST = KEY_END - 1
 };
 
 // The status of a node; above 0 something is wrong.
+// clang-format off
 enum Status : unsigned int {
     STATUS_FINE, STATUS_NOT_USABLE, STATUS_PARTLY_USABLE, STATUS_SIZE_UNKNOWN, STATUS_OUTSIDE_LIMITS,
     STATUS_ALARM, STATUS_FAULT
 };
 // clang-format on
 
-const char* nameOf(unsigned int key);
+// What is the same for each property with this number.
+struct KeyInfo {
+    Key key;
+    const char* identifier;  // in JSON: ^[a-z][A-Za-z0-9]*$
+    const char* caption;
+    const char* unit;  // of the number that the property holds, "" if there is none
+};
+// Null if no property has this number.
+const KeyInfo* infoOf(unsigned int key);
+// The caption and, if there is one, the unit: "size in bytes". "" if no property has this number.
+std::string nameOf(unsigned int key);
 
 // The data from which a node is built.
 struct Site {
