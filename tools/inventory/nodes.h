@@ -91,6 +91,8 @@ enum Status : unsigned int {
 struct KeyInfo {
     Key key;
     const char* identifier;  // in JSON: ^[a-z][A-Za-z0-9]*$
+    const char*
+        kind;  // what kindName() says of its values; a value of the kind "real" may also be NaN or infinite
     const char* caption;
     const char* unit;  // of the number that the property holds, "" if there is none
 };

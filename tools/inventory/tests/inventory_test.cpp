@@ -200,6 +200,9 @@ void expectSound(const Inventory& inventory)
         }
         for (const auto& [key, value] : node->getProperties()) {
             SCOPED_TRACE(nameOf(key));
+            ASSERT_NE(infoOf(key), nullptr) << key;
+            const std::string kind = kindName(value) == "nan" ? "real" : kindName(value);
+            EXPECT_EQ(kind, infoOf(key)->kind);
             IC::PropertyValue read("");
             EXPECT_EQ(node->getProperty(key, read).getStatus(), IC::Error::STATUS_SUCCESS);
             expectSame(read, value);
