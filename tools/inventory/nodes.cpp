@@ -84,6 +84,72 @@ constexpr bool areInOrder()
 }
 static_assert(areInOrder());
 
+constexpr const char* cacheKinds[] = {"unified", "data", "instructions"};
+constexpr const char* portStates[] = {"no change", "down",   "initialized",
+                                      "armed",     "active", "active, deferred"};
+// As DMI counts.
+constexpr const char* chassisTypes[] = {"",
+                                        "other",
+                                        "unknown",
+                                        "desktop",
+                                        "low-profile desktop",
+                                        "pizza box",
+                                        "mini tower",
+                                        "tower",
+                                        "portable",
+                                        "laptop",
+                                        "notebook",
+                                        "hand-held",
+                                        "docking station",
+                                        "all in one",
+                                        "sub-notebook",
+                                        "space-saving",
+                                        "lunch box",
+                                        "main server chassis",
+                                        "expansion chassis",
+                                        "sub-chassis",
+                                        "bus expansion chassis",
+                                        "peripheral chassis",
+                                        "RAID chassis",
+                                        "rack mount chassis",
+                                        "sealed-case PC",
+                                        "multi-system chassis",
+                                        "compact PCI",
+                                        "advanced TCA",
+                                        "blade",
+                                        "blade enclosure",
+                                        "tablet",
+                                        "convertible",
+                                        "detachable",
+                                        "IoT gateway",
+                                        "embedded PC",
+                                        "mini PC",
+                                        "stick PC"};
+
+template <std::size_t size>
+std::string entry(const char* const (&names)[size], unsigned int code)
+{
+    return code < size ? names[code] : "";
+}
+
+// As hwloc names it.
+std::string nameOfPciClass(unsigned int code)
+{
+    hwloc_obj_attr_u attributes {};
+    attributes.pcidev.class_id = static_cast<unsigned short>(code);
+    hwloc_obj device {};
+    device.type = HWLOC_OBJ_PCI_DEVICE;
+    device.attr = &attributes;
+    char text[128] = "";  // "busid=0000:00:00.0 id=0000:0000 class=0302(3D)"
+    hwloc_obj_attr_snprintf(text, sizeof text, &device, " ", 1);
+    const std::string words = text;
+    const auto begin = words.find('(');
+    const auto end = words.find(')', begin);
+    return code > 0xFFFF || begin == std::string::npos || end == std::string::npos
+        ? ""
+        : words.substr(begin + 1, end - begin - 1);
+}
+
 // IC::Number takes unsigned long long; on some machines hwloc's 64-bit type is another type.
 IC::Number number64(hwloc_uint64_t number)
 {
@@ -114,6 +180,22 @@ std::string nameOf(unsigned int key)
     if (info == nullptr)
         return "";
     return *info->unit == '\0' ? info->caption : std::string(info->caption) + " in " + info->unit;
+}
+
+std::string nameOfCode(unsigned int key, unsigned int code)
+{
+    switch (key) {
+    case KEY_CACHE_KIND:
+        return entry(cacheKinds, code);
+    case KEY_PORT_STATE:
+        return entry(portStates, code);
+    case KEY_CHASSIS_TYPE:
+        return entry(chassisTypes, code);
+    case KEY_PCI_CLASS:
+        return nameOfPciClass(code);
+    default:
+        return "";
+    }
 }
 
 Component::Component(const Site& site) : Node(site.sensor)

@@ -101,6 +101,9 @@ const KeyInfo* infoOf(unsigned int key);
 // The caption and, if there is one, the unit: "size in bytes". "" if no property has this number.
 std::string nameOf(unsigned int key);
 
+// The name of a code that a property holds: "data" for the cache kind 1. "" if the code has none.
+std::string nameOfCode(unsigned int key, unsigned int code);
+
 // The data from which a node is built.
 struct Site {
     IC::Node::SensorType sensor = IC::Node::SENSOR_UNKNOWN;

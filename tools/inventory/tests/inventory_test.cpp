@@ -349,6 +349,19 @@ TEST(InventoryPaths, AreUniqueWhateverTheNames)
     expectSound(inventory);
 }
 
+TEST(InventoryProperties, NameTheirCodes)
+{
+    EXPECT_EQ(nameOfCode(KEY_CACHE_KIND, 1), "data");
+    EXPECT_EQ(nameOfCode(KEY_CACHE_KIND, 3), "");
+    EXPECT_EQ(nameOfCode(KEY_PORT_STATE, 4), "active");
+    EXPECT_EQ(nameOfCode(KEY_CHASSIS_TYPE, 23), "rack mount chassis");
+    EXPECT_EQ(nameOfCode(KEY_CHASSIS_TYPE, 36), "stick PC");
+    EXPECT_EQ(nameOfCode(KEY_CHASSIS_TYPE, 37), "");
+    EXPECT_EQ(nameOfCode(KEY_PCI_CLASS, 0x0302), "3D");
+    EXPECT_EQ(nameOfCode(KEY_PCI_CLASS, 0x10302), "");
+    EXPECT_EQ(nameOfCode(KEY_MODEL, 1), "");
+}
+
 TEST(InventoryNodes, HoldEveryKindOfValue)
 {
     const std::string address20 = "80:00:00:48:fe:80:00:00:00:00:00:00:00:02:c9:03:00:f9:bf:a1";
