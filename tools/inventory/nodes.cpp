@@ -71,6 +71,11 @@ constexpr KeyInfo keys[] = {
     {KEY_FAULT, "fault", "bool", "fault", ""},
     {KEY_CHIP, "chip", "string", "chip", ""},
     {KEY_HOST_NAME, "hostName", "string", "host name", ""},
+    {KEY_VIEWS, "views", "strings", "names in the system", ""},
+    {KEY_UNUSABLE_THREADS, "unusableThreads", "uint32", "hardware threads that the system may not use", ""},
+    {KEY_UNUSABLE_CORES, "unusableCores", "uint32", "cores that the system may not use", ""},
+    {KEY_UNUSABLE_CPUS, "unusableCpus", "uint32", "CPUs that the system may not use", ""},
+    {KEY_UNUSABLE_MEMORY_ARRAYS, "unusableMemoryArrays", "uint32", "memory arrays that the system may not use", ""},
 };
 // clang-format on
 

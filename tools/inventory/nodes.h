@@ -75,6 +75,11 @@ enum Key : unsigned int {
     KEY_FAULT,
     KEY_CHIP,
     KEY_HOST_NAME,
+    KEY_VIEWS,
+    KEY_UNUSABLE_THREADS,
+    KEY_UNUSABLE_CORES,
+    KEY_UNUSABLE_CPUS,
+    KEY_UNUSABLE_MEMORY_ARRAYS,
     KEY_END,  // behind the last number
     KEY_LAST = KEY_END - 1
 };

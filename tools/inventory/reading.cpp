@@ -2,18 +2,23 @@
 #include "reading.h"
 
 #include <fcntl.h>
+#include <poll.h>
 #include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
-#include <cstdio>
+#include <csignal>
 #include <set>
+#include <sstream>
 #include <string_view>
 #include <system_error>
 
+#include "alerts.h"
 #include "mapping.h"
 #include "values.h"
+#include "writing.h"
 
 namespace inventory {
 
@@ -42,29 +47,76 @@ Topology load(const std::string* xml)
     return topology;
 }
 
-// Some damaged exports crash hwloc or make it loop for ever. So a child process loads each export first; if the child
-// fails, this process does not load the export.
-bool survives(const std::string& xml)
+// What an export may take. Damaged exports crash hwloc, make it loop for ever or fill the memory.
+constexpr unsigned int secondsAtMost = 10;
+constexpr rlim_t bytesAtMost = rlim_t {2} << 30;
+
+// A sanitizer reserves terabytes of addresses.
+#if defined(__has_feature)
+#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer) || __has_feature(memory_sanitizer)
+#define INVENTORY_SANITIZED
+#endif
+#endif
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#define INVENTORY_SANITIZED
+#endif
+
+void limit(decltype(RLIMIT_AS) resource, rlim_t most)
 {
-    constexpr unsigned int secondsAtMost = 60;
+    rlimit limits {};
+    getrlimit(resource, &limits);
+    limits.rlim_cur = std::min(limits.rlim_cur, most);
+    setrlimit(resource, &limits);
+}
+
+Inventory readFrom(const Topology& topology);
+
+// In the child process. The status tells whether the memory was enough.
+enum Trial : unsigned char { TRIAL_DONE, TRIAL_REFUSED, TRIAL_NO_MEMORY };
+[[noreturn]] void describeForTrial(const std::string& xml)
+{
+    limit(RLIMIT_CORE, 0);
+    limit(RLIMIT_CPU, secondsAtMost);
+#ifndef INVENTORY_SANITIZED
+    limit(RLIMIT_AS, bytesAtMost);
+#endif
+    dup2(open("/dev/null", O_WRONLY), STDERR_FILENO);
+    std::signal(SIGALRM, SIG_DFL);
+    alarm(secondsAtMost);
+    try {
+        const Inventory inventory = readFrom(load(&xml));
+        std::ostringstream text;
+        writeTree(text, inventory.nodes, {false, true});
+        writeAlerts(text, alertsOf(inventory.nodes));
+        _exit(text ? TRIAL_DONE : TRIAL_NO_MEMORY);
+    } catch (const std::bad_alloc&) {
+        _exit(TRIAL_NO_MEMORY);
+    } catch (...) {
+        _exit(errno == ENOMEM ? TRIAL_NO_MEMORY : TRIAL_REFUSED);
+    }
+}
+
+// A child process describes the export first. Throws BadInput if it fails; then this process does not load the export.
+void tryFirst(const std::string& xml)
+{
     const pid_t child = fork();
     if (child < 0)
-        return true;  // not tested: no process is available
-    if (child == 0) {
-        const rlimit noCore {0, 0};
-        setrlimit(RLIMIT_CORE, &noCore);
-        dup2(open("/dev/null", O_WRONLY), STDERR_FILENO);
-        alarm(secondsAtMost);
-        try {
-            load(&xml);
-            _exit(0);
-        } catch (...) {
-            _exit(1);
-        }
-    }
+        return;  // not tried: no process is available
+    if (child == 0)
+        describeForTrial(xml);
     int status = 0;
-    while (waitpid(child, &status, 0) < 0 && errno == EINTR) { }
-    return status == 0;
+    rusage usage {};
+    while (wait4(child, &status, 0, &usage) < 0 && errno == EINTR) { }
+    if (status == 0)
+        return;
+    const int signal = WIFSIGNALED(status) ? WTERMSIG(status) : 0;
+    if (signal == SIGALRM || signal == SIGXCPU)
+        throw BadInput("takes more than " + std::to_string(secondsAtMost) + " s");
+    // hwloc may crash where it gets no memory; then the child had filled most of what it may take.
+    const bool wasFull = signal != 0 && static_cast<rlim_t>(usage.ru_maxrss) > bytesAtMost / 1024 / 4 * 3;
+    if (wasFull || (signal == 0 && WEXITSTATUS(status) == TRIAL_NO_MEMORY))
+        throw BadInput("takes more than " + std::to_string(bytesAtMost >> 30) + " GiB");
+    throw unreadable();
 }
 
 class Reader {
@@ -82,9 +134,11 @@ public:
             inventory_.machine = parent;
         for (unsigned int i = 0; object->type == HWLOC_OBJ_MACHINE && i < object->infos_count; ++i)
             readPart(object, factOf(object->infos[i]).part, object->infos[i].value);
-        for (hwloc_obj_t child = nullptr;
-             (child = hwloc_get_next_child(topology_, object, child)) != nullptr;)
-            read(child, parent);
+        // Not hwloc_get_next_child: in hwloc 2.9 it begins again after a memory-side cache.
+        for (hwloc_obj_t first : {object->first_child, object->memory_first_child, object->io_first_child,
+                                  object->misc_first_child})
+            for (hwloc_obj_t child = first; child != nullptr; child = child->next_sibling)
+                read(child, parent);
     }
 
 private:
@@ -175,27 +229,34 @@ Inventory readThisMachine()
 
 Inventory readExport(const std::string& xml)
 {
-    if (!survives(xml))
-        throw unreadable();
+    tryFirst(xml);
     return readFrom(load(&xml));
 }
 
 std::string readFile(const std::string& name)
 {
     constexpr std::size_t largest = 64 << 20;
-    errno = 0;
-    // Not decltype(&std::fclose): g++ 14 warns that a template argument drops the function's attributes.
-    const std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(name.c_str(), "rb"), std::fclose);
+    const auto failed = [] { return BadInput(std::generic_category().message(errno)); };
+    // Opening a pipe waits for a writer otherwise.
+    const int file = open(name.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+    if (file < 0)
+        throw failed();
+    const std::unique_ptr<const int, void (*)(const int*)> closer(&file, [](const int* it) { close(*it); });
     std::string content;
-    char piece[4096];
-    for (std::size_t length = 1; file && length != 0 && content.size() <= largest;
-         content.append(piece, length))
-        length = std::fread(piece, 1, sizeof piece, file.get());
-    if (!file || std::ferror(file.get()) != 0)
-        throw BadInput(std::generic_category().message(errno));
-    if (content.size() > largest)
-        throw BadInput("too large for a machine");
-    return content;
+    char piece[1 << 16];
+    while (content.size() <= largest) {
+        pollfd ready {file, POLLIN, 0};
+        const int count = poll(&ready, 1, secondsAtMost * 1000);
+        if (count == 0)
+            throw BadInput("nobody wrote to it for " + std::to_string(secondsAtMost) + " s");
+        const ssize_t length = count < 0 ? -1 : read(file, piece, sizeof piece);
+        if (length < 0 && errno != EINTR && errno != EAGAIN)
+            throw failed();
+        if (length == 0)
+            return content;
+        content.append(piece, length < 0 ? 0 : static_cast<std::size_t>(length));
+    }
+    throw BadInput("too large for a machine");
 }
 
 }  // namespace inventory

@@ -265,12 +265,9 @@ TEST_F(InventoryDiff, ExitsWith2OnFailure)
 
 TEST_F(InventoryDiff, FindsTheDifferencesOfRealMachines)
 {
-    if (std::string(IC_TEST_TOPOLOGIES).empty())
-        GTEST_SKIP() << "no folder with exports of real machines (CMake variable IC_TEST_TOPOLOGIES)";
-    std::vector<std::string> files;
-    for (const auto& file : std::filesystem::directory_iterator(IC_TEST_TOPOLOGIES))
-        if (file.path().extension() == ".xml")
-            files.push_back(file.path());
+    const auto files = realMachines();
+    if (files.empty())
+        GTEST_SKIP() << whyNoMachines;
     ASSERT_GE(files.size(), 2u);
     for (std::size_t i = 0; i < files.size(); ++i) {
         SCOPED_TRACE(files[i]);

@@ -40,18 +40,6 @@ std::string readByPython(const std::string& program, const std::string& file)
     return outcome.out;
 }
 
-constexpr bool noRealMachines = std::string_view(IC_TEST_TOPOLOGIES).empty();
-constexpr const char* whyNone = "no folder with exports of real machines (CMake variable IC_TEST_TOPOLOGIES)";
-
-std::vector<std::string> realMachines()
-{
-    std::vector<std::string> files;
-    for (const auto& file : std::filesystem::directory_iterator(IC_TEST_TOPOLOGIES))
-        if (file.path().extension() == ".xml")
-            files.push_back(file.path());
-    return files;
-}
-
 class InventoryOutput : public testing::Test {
 protected:
     // With hwloc's parser that accepts characters that XML forbids.
@@ -273,8 +261,8 @@ constexpr const char* countNodes =
 
 TEST_F(InventoryOutput, IsValidJsonForEveryMachine)
 {
-    if (noRealMachines)
-        GTEST_SKIP() << whyNone;
+    if (realMachines().empty())
+        GTEST_SKIP() << whyNoMachines;
     for (const std::string& machine : realMachines()) {
         SCOPED_TRACE(machine);
         const Outcome outcome = run({"--json", machine});
@@ -414,8 +402,8 @@ rect { stroke: #555 } .page { stroke: none } .trouble { stroke: #c00; stroke-wid
 
 TEST_F(InventoryDrawing, IsValidAndLegibleForEveryMachine)
 {
-    if (noRealMachines)
-        GTEST_SKIP() << whyNone;
+    if (realMachines().empty())
+        GTEST_SKIP() << whyNoMachines;
     for (const std::string& machine : realMachines()) {
         SCOPED_TRACE(machine);
         std::string nodes;

@@ -5,6 +5,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <filesystem>
@@ -109,3 +110,30 @@ inline std::vector<std::string> linesOf(const std::string& text)
         lines.push_back(line);
     return lines;
 }
+
+#ifdef IC_TEST_TOPOLOGIES
+constexpr const char* whyNoMachines =
+    "no folder with exports of real machines (CMake variable IC_TEST_TOPOLOGIES)";
+
+// The files with exports of real machines; empty if there is no folder of them.
+inline std::vector<std::string> realMachines()
+{
+    std::vector<std::string> files;
+    std::istringstream folders(IC_TEST_TOPOLOGIES);
+    for (std::string folder; std::getline(folders, folder, ':');)
+        for (const auto& file : std::filesystem::directory_iterator(folder))
+            if (file.path().extension() == ".xml")
+                files.push_back(file.path());
+    std::sort(files.begin(), files.end());
+    return files;
+}
+
+// The file of one machine. Throws if there is none.
+inline std::string realMachine(const std::string& name)
+{
+    for (const std::string& file : realMachines())
+        if (std::filesystem::path(file).stem() == name)
+            return file;
+    throw std::runtime_error("no machine " + name);
+}
+#endif

@@ -610,13 +610,13 @@ class InventoryOfRealMachines : public testing::Test {
 protected:
     void SetUp() override
     {
-        if (std::string(IC_TEST_TOPOLOGIES).empty())
-            GTEST_SKIP() << "no folder with exports of real machines (CMake variable IC_TEST_TOPOLOGIES)";
+        if (realMachines().empty())
+            GTEST_SKIP() << whyNoMachines;
     }
 
     static Inventory read(const std::string& name)
     {
-        return readExport(readFile(std::string(IC_TEST_TOPOLOGIES) + "/" + name + ".xml"));
+        return readExport(readFile(realMachine(name)));
     }
 
     static constexpr const char* names[] = {"x86-2socket-dimms-nvme-infiniband",
