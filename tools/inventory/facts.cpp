@@ -20,7 +20,7 @@ const struct Prefix {
                 {"DMIChassis", IC::Node::SENSOR_CHASSIS},
                 {"DMIBIOS", IC::Node::SENSOR_BIOS},
                 {"OS", IC::Node::SENSOR_OS},
-                {"CPU"},
+                {"CPU", IC::Node::SENSOR_CPU},
                 {"PCI"},
                 {"GPU"},
                 {"NVIDIA"},
@@ -97,6 +97,13 @@ const struct FactRow {
     {"NodeGUID", KEY_NODE_GUID, asBytes},
 };
 
+bool saysNothing(Key key, const char* text)
+{
+    const bool identifies =
+        key == KEY_SERIAL_NUMBER || key == KEY_ASSET_TAG || key == KEY_PART_NUMBER || key == KEY_UUID;
+    return (identifies ? toldIdentity(text) : told(text)).empty();
+}
+
 }  // namespace
 
 Fact factOf(const hwloc_info_s& info)
@@ -106,11 +113,14 @@ Fact factOf(const hwloc_info_s& info)
         for (const FactRow& row : factRows)
             if (name.substr(0, prefix.text.size()) == prefix.text
                 && name.substr(std::min(name.size(), prefix.text.size())) == row.name) {
+                if (saysNothing(row.key, info.value))
+                    return {};
                 IC::PropertyValue value = row.read(info.value);
                 const bool fits = value.getKind() != IC::PropertyValue::KIND_UNKNOWN;
-                return {fits ? row.key : KEY_OTHER_FACTS, std::move(value), prefix.part};
+                return {fits ? row.key : KEY_OTHER_FACTS, std::move(value), prefix.part,
+                        prefix.text == "CPU"};
             }
-    return {KEY_OTHER_FACTS, IC::PropertyValue(IC::PropertyValue::KIND_UNKNOWN), IC::Node::SENSOR_COMPUTER};
+    return {saysNothing(KEY_OTHER_FACTS, info.value) ? KEY_NONE : KEY_OTHER_FACTS};
 }
 
 }  // namespace inventory

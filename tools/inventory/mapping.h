@@ -21,9 +21,11 @@ struct Row {
 const Row* findRow(hwloc_obj_t object, IC::Node::SensorType part = IC::Node::SENSOR_UNKNOWN);
 
 struct Fact {
-    Key key;  // KEY_OTHER_FACTS if the fact has no property of its own or cannot be parsed
-    IC::PropertyValue value;
-    IC::Node::SensorType part;  // the part of the machine that the fact is about
+    // KEY_OTHER_FACTS if the fact has no property of its own or cannot be parsed, KEY_NONE if it says nothing.
+    Key key = KEY_NONE;
+    IC::PropertyValue value {IC::PropertyValue::KIND_UNKNOWN};
+    IC::Node::SensorType part = IC::Node::SENSOR_COMPUTER;  // the part of the machine that the fact is about
+    bool ofProcessor = false;
 };
 Fact factOf(const hwloc_info_s& info);
 

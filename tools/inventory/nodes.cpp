@@ -76,6 +76,48 @@ constexpr KeyInfo keys[] = {
     {KEY_UNUSABLE_CORES, "unusableCores", "uint32", "cores that the system may not use", ""},
     {KEY_UNUSABLE_CPUS, "unusableCpus", "uint32", "CPUs that the system may not use", ""},
     {KEY_UNUSABLE_MEMORY_ARRAYS, "unusableMemoryArrays", "uint32", "memory arrays that the system may not use", ""},
+    {KEY_CPU_MAKER, "cpuMaker", "string", "maker of the processors", ""},
+    {KEY_CPU_MODEL, "cpuModel", "string", "model of the processors", ""},
+    {KEY_AVERAGE, "average", "real", "average", ""},
+    {KEY_LOWEST, "lowest", "real", "lowest reading", ""},
+    {KEY_HIGHEST, "highest", "real", "highest reading", ""},
+    {KEY_AVERAGE_LOWEST, "averageLowest", "real", "lowest average", ""},
+    {KEY_AVERAGE_HIGHEST, "averageHighest", "real", "highest average", ""},
+    {KEY_AVERAGE_INTERVAL, "averageInterval", "real", "time of the average", "s"},
+    {KEY_EMERGENCY_LIMIT, "emergencyLimit", "real", "emergency limit", ""},
+    {KEY_CAP, "cap", "real", "cap", ""},
+    {KEY_RATED_MINIMUM, "ratedMinimum", "real", "rated minimum", ""},
+    {KEY_RATED_MAXIMUM, "ratedMaximum", "real", "rated maximum", ""},
+    {KEY_LOWER_LIMIT_HYSTERESIS, "lowerLimitHysteresis", "real", "lower limit, hysteresis", ""},
+    {KEY_LOWER_CRITICAL_HYSTERESIS, "lowerCriticalHysteresis", "real", "lower critical limit, hysteresis", ""},
+    {KEY_UPPER_LIMIT_HYSTERESIS, "upperLimitHysteresis", "real", "upper limit, hysteresis", ""},
+    {KEY_UPPER_CRITICAL_HYSTERESIS, "upperCriticalHysteresis", "real", "upper critical limit, hysteresis", ""},
+    {KEY_EMERGENCY_HYSTERESIS, "emergencyHysteresis", "real", "emergency limit, hysteresis", ""},
+    {KEY_CAP_HYSTERESIS, "capHysteresis", "real", "cap, hysteresis", ""},
+    {KEY_MIN_ALARM, "minAlarm", "bool", "alarm of the lower limit", ""},
+    {KEY_LCRIT_ALARM, "lcritAlarm", "bool", "alarm of the lower critical limit", ""},
+    {KEY_MAX_ALARM, "maxAlarm", "bool", "alarm of the upper limit", ""},
+    {KEY_CRIT_ALARM, "critAlarm", "bool", "alarm of the upper critical limit", ""},
+    {KEY_EMERGENCY_ALARM, "emergencyAlarm", "bool", "alarm of the emergency limit", ""},
+    {KEY_CAP_ALARM, "capAlarm", "bool", "alarm of the cap", ""},
+    {KEY_BEEP, "beep", "bool", "an alarm beeps", ""},
+    {KEY_OFFSET, "offset", "real", "offset", ""},
+    {KEY_SENSOR_KIND, "sensorKind", "enum", "kind of temperature sensor", ""},
+    {KEY_FAN_DIVISOR, "fanDivisor", "real", "divisor of the fan", ""},
+    {KEY_FAN_PULSES, "fanPulses", "real", "pulses a turn of the fan", ""},
+    {KEY_BANK, "bank", "string", "bank", ""},
+    {KEY_MEMORY_TYPE, "memoryType", "string", "memory type", ""},
+    {KEY_MEMORY_DETAIL, "memoryDetail", "string", "detail of the memory type", ""},
+    {KEY_FORM_FACTOR, "formFactor", "string", "form factor", ""},
+    {KEY_SPEED, "speed", "uint32", "speed", "MT/s"},
+    {KEY_CONFIGURED_SPEED, "configuredSpeed", "uint32", "configured speed", "MT/s"},
+    {KEY_RANK, "rank", "uint32", "rank", ""},
+    {KEY_DATA_WIDTH, "dataWidth", "uint32", "data width", "bits"},
+    {KEY_TOTAL_WIDTH, "totalWidth", "uint32", "total width", "bits"},
+    {KEY_CONFIGURED_VOLTAGE, "configuredVoltage", "real", "configured voltage", "V"},
+    {KEY_SYSTEM_MEMORY, "systemMemory", "uint64", "memory that the system has", "bytes"},
+    {KEY_MEMORY_SLOTS, "memorySlots", "uint32", "memory slots", ""},
+    {KEY_ERROR_CORRECTION, "errorCorrection", "string", "error correction of the memory", ""},
 };
 // clang-format on
 
@@ -251,9 +293,13 @@ void Component::addFacts(const hwloc_info_s* facts, unsigned int number, bool of
     if (const auto found = properties.find(KEY_OTHER_FACTS); found != properties.end())
         others = found->second;
     for (unsigned int i = 0; i < number; ++i) {
-        const Fact fact = factOf(facts[i]);
-        if (ofMachine && fact.part != getSensor())
+        Fact fact = factOf(facts[i]);
+        if (fact.key == KEY_NONE || (ofMachine && fact.part != getSensor()))
             continue;
+        if (ofMachine && fact.ofProcessor)  // of the processors of a machine without packages
+            fact.key = fact.key == KEY_MAKER ? KEY_CPU_MAKER
+                : fact.key == KEY_MODEL      ? KEY_CPU_MODEL
+                                             : KEY_OTHER_FACTS;
         // A fact that occurs again is one of the others.
         if (fact.key == KEY_OTHER_FACTS || !properties.insert({fact.key, fact.value}).second)
             others.push_back(std::string(facts[i].name) + '=' + facts[i].value);

@@ -1,14 +1,21 @@
 // Parses numbers, sizes, versions, dates and addresses, and writes values as text.
 #include "values.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <cstdio>
 #include <ctime>
+#include <iterator>
 
 namespace inventory {
 
 namespace {
+
+bool isDigit(char character)
+{
+    return character >= '0' && character <= '9';
+}
 
 std::string_view trimmed(std::string_view text)
 {
@@ -29,6 +36,67 @@ std::optional<T> take(std::string_view& text, int base = 10)
         return {};
     text.remove_prefix(static_cast<std::size_t>(end - digits.data()));
     return number;
+}
+
+// What firmware says where its maker has given no fact, as lettersOf() writes it.
+// clang-format off
+constexpr std::string_view placeholders[] = {
+    "", "0123456789",
+    // There is none.
+    "badindex", "dimmunknown", "empty", "invalid", "manufacturerunknown", "modulenotinstalled", "na", "nil", "noasset",
+    "noassetinformation", "nodimm", "nodimminstalled", "nodimmpresent", "nomodule", "nomoduleinstalled", "none",
+    "noserial", "noserialnumber", "notapplicable", "notassigned", "notavailable", "notdefined", "notinstalled",
+    "notpopulated", "notpresent", "notprovided", "notset", "notspecified", "null", "other", "outofspec", "tba", "tbd",
+    "undefined", "unk", "unknow", "unknown", "unknownmanufacturer", "unknownserial", "unknownserialnumber",
+    "unknownvendor", "unspecified",
+    // Nobody has filled it in.
+    "byoem", "default", "defaultstring", "filledbyoem", "fillbyoem", "oem", "oemdefaultstring", "oemstring",
+    "tobefilled", "tobefilledbymanufacturer", "tobefilledbyoem", "tobefilledbyvendor", "tobefilledinbyoem",
+    "tobesetbyoem",
+    // It says only what it is.
+    "baseboardmanufacturer", "baseboardproductname", "baseboardserialnumber", "baseboardversion", "biosversion",
+    "boardmanufacturer", "boardproductname", "boardserialnumber", "boardversion", "chassismanufacture",
+    "chassismanufacturer", "chassisserialnumber", "chassisversion", "family", "manufacturer", "manufacturername",
+    "modulemanufacturer", "moduleserialnumber", "oemchassismanufacturer", "partno", "partnumber", "productname",
+    "productversion", "serial", "serialno", "serialnumber", "sku", "skunumber", "systemfamily", "systemmanufacturer",
+    "systemname", "systemproductname", "systemserialnumber", "systemsku", "systemskunumber", "systemuuid",
+    "systemversion", "vendor", "version"};
+
+// The same, but for digits: "SerNum0", "Array1_PartNumber3", "Type2 - Board Version", "Default string000".
+constexpr std::string_view numberedPlaceholders[] = {
+    "amanufacturer", "apartnum", "arraypartnumber", "asernum", "defaultstring", "modulepartnumber",
+    "oemdefaultstring", "partnum", "sernum", "serialnum", "tobefilledbyoem", "typeboardmanufacturer",
+    "typeboardproductname", "typeboardserialnumber", "typeboardversion"};
+
+// Digits in a row are no number of a part, but may be a size.
+constexpr std::string_view countedDigits[] = {
+    "1234567890", "1234", "12345", "123456", "1234567", "12345678", "123456789", "01234567", "012345678", "987654321", "9876543210",
+    "01234567890123456789", "012345678901234567890123456789"};
+// clang-format on
+
+// The letters, in lower case, and the digits, so that "To Be Filled By O.E.M." and "To be filled by OEM" are the same.
+// A byte that is not ASCII counts as a letter.
+std::string lettersOf(std::string_view text)
+{
+    std::string letters;
+    for (const char character : text)
+        if (character >= 'A' && character <= 'Z')
+            letters += static_cast<char>(character - 'A' + 'a');
+        else if ((character >= 'a' && character <= 'z') || isDigit(character) || (character & '\x80') != 0)
+            letters += character;
+    return letters;
+}
+
+std::string withoutDigits(std::string text)
+{
+    text.erase(std::remove_if(text.begin(), text.end(), isDigit), text.end());
+    return text;
+}
+
+template <class Table>
+bool isIn(const Table& table, const std::string& word)
+{
+    return std::find(std::begin(table), std::end(table), word) != std::end(table);
 }
 
 }  // namespace
@@ -104,9 +172,22 @@ std::optional<IC::Buffer> address(std::string_view text)
 
 std::string told(std::string_view text)
 {
-    text = trimmed(text);
-    const bool nothing = text == "N/A" || text == "None" || text == "NONE";
-    return nothing ? std::string() : std::string(text);
+    const std::string letters = lettersOf(text);
+    const bool isPlaceholder = isIn(placeholders, letters)
+        || isIn(numberedPlaceholders, withoutDigits(letters))
+        || letters.find("assettag") != std::string::npos;  // "P1-DIMMA1_AssetTag (date:19/02)"
+    return isPlaceholder ? std::string() : std::string(trimmed(text));
+}
+
+std::string toldIdentity(std::string_view text)
+{
+    // Firmware fills a number that it does not know: "0", "00000000", "FFFFFFFF", "xxxx".
+    const std::string letters = lettersOf(text);
+    const auto isAll = [&letters](char filling) {
+        return letters.find_first_not_of(filling) == std::string::npos;
+    };
+    const bool isFilled = isAll('0') || (letters.size() > 3 && (isAll('f') || isAll('x')));
+    return isFilled || isIn(countedDigits, letters) ? std::string() : told(text);
 }
 
 std::string sizeInWords(ZQ::Uint64 bytes)
@@ -117,7 +198,7 @@ std::string sizeInWords(ZQ::Uint64 bytes)
     for (; size >= 1024; ++unit)
         size /= 1024;
     char text[32];
-    std::snprintf(text, sizeof text, "%.4g %s", size, units[unit]);
+    std::snprintf(text, sizeof text, "%.4g %s", size, bytes == 1 ? "byte" : units[unit]);
     return text;
 }
 

@@ -17,8 +17,11 @@ std::optional<IC::Version2> version(std::string_view text);    // "6.17", whatev
 std::optional<ZQ::DateTime> date(const std::string& text);     // "08/06/2025"
 std::optional<IC::Buffer> address(std::string_view text);      // "84:8f:69:fe:cc:41", "0002:c903:00f9:bfa0"
 
-// The text without blanks at its ends; empty for "N/A" and "None".
+// What the text says, without blanks at its ends; empty if it says nothing. Firmware has many ways to say nothing:
+// "N/A", "To Be Filled By O.E.M.", "Default string", "System manufacturer".
 std::string told(std::string_view text);
+// The same for a text that identifies a part, such as a serial number: "00000000" says nothing either.
+std::string toldIdentity(std::string_view text);
 
 // "20 MiB", "119.7 GiB".
 std::string sizeInWords(ZQ::Uint64 bytes);

@@ -21,9 +21,12 @@
 namespace {
 
 using namespace inventory;
+using testing::AllOf;
+using testing::Contains;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Not;
+using testing::StartsWith;
 
 // The export of a synthetic machine.
 std::string synthetic(const std::string& description)
@@ -294,12 +297,57 @@ TEST(InventoryValues, AddressesAreBytes)
         EXPECT_EQ(address(text), std::nullopt) << text;
 }
 
+TEST(InventoryValues, PlaceholdersSayNothing)
+{
+    for (const char* nothing : {"",
+                                "   ",
+                                "N/A",
+                                "n.a.",
+                                "None",
+                                "NONE ",
+                                "--",
+                                "To Be Filled By O.E.M.",
+                                "to be filled by o.e.m",
+                                "To be filled by OEM",
+                                "Default string",
+                                "Default string000",
+                                "Not Specified",
+                                "NOT SPECIFIED",
+                                "0123456789",
+                                "System manufacturer",
+                                "System Product Name",
+                                "Base Board Serial Number",
+                                "Unknown",
+                                "<BAD INDEX>",
+                                "<OUT OF SPEC>",
+                                "NO DIMM",
+                                "[Empty]",
+                                "No Module Installed",
+                                "Not Available",
+                                "O.E.M.",
+                                "Undefined",
+                                "SerNum0",
+                                "A1_AssetTag0",
+                                "P1-DIMMA1_AssetTag (date:19/02)",
+                                "Array1_PartNumber3",
+                                "Type2 - Board Version"})
+        EXPECT_EQ(told(nothing), "") << nothing;
+    for (const char* nothing : {"0", "00000000", "0000-0000", "FFFFFFFF", "xxxxxxxx", "123456789", "Unknown",
+                                "00000000-0000-0000-0000-000000000000"})
+        EXPECT_EQ(toldIdentity(nothing), "") << nothing;
+    for (const char* something : {"0", "00000000", "Nanya", "Noname", "Samsung", "Version 2", "\xe6\x97\xa5",
+                                  "NA1234", "System x3650", "123456789"})
+        EXPECT_EQ(told(something), something);
+    for (const char* something : {"1", "00000001", "48AAE639", "F", "01", "S0000000"})
+        EXPECT_EQ(toldIdentity(something), something);
+}
+
 TEST(InventoryValues, TextsAreTrimmedAndSizesHaveUnits)
 {
     EXPECT_EQ(told(" DIMM_A1 "), "DIMM_A1");
-    for (const char* nothing : {"", "   ", "N/A", "None", "NONE "})
-        EXPECT_EQ(told(nothing), "") << nothing;
+    EXPECT_EQ(toldIdentity(" 48AAE639 "), "48AAE639");
     EXPECT_EQ(sizeInWords(0), "0 bytes");
+    EXPECT_EQ(sizeInWords(1), "1 byte");
     EXPECT_EQ(sizeInWords(1023), "1023 bytes");
     EXPECT_EQ(sizeInWords(20971520), "20 MiB");
     EXPECT_EQ(sizeInWords(128520671232), "119.7 GiB");
@@ -362,6 +410,36 @@ TEST(InventoryProperties, NameTheirCodes)
     EXPECT_EQ(nameOfCode(KEY_MODEL, 1), "");
 }
 
+TEST(InventoryNodes, HoldNoPlaceholder)
+{
+    const Inventory inventory = readExport(machineWith(
+        info("DMIProductName", "System Product Name") + info("DMIProductVersion", "0123456789")
+            + info("DMISysVendor", "To Be Filled By O.E.M.") + info("DMIBoardName", "0W6W6G")
+            + info("DMIBoardSerial", "00000000") + info("DMIChassisVendor", "Default string")
+            + info("DMIChassisSerial", "0000") + info("Something", "Not Specified") + info("Another", "0"),
+        ""));
+    const IC::Node& machine = nodeAt(inventory, "/machine");
+    for (const Key key : {KEY_MODEL, KEY_REVISION, KEY_MAKER})
+        EXPECT_FALSE(has(machine, key)) << nameOf(key);
+    const IC::StringArray others = property(machine, KEY_OTHER_FACTS);
+    EXPECT_THAT(others, AllOf(Contains("Another=0"), Not(Contains(StartsWith("Something")))));
+    EXPECT_FALSE(has(nodeAt(inventory, "/machine/planar"), KEY_SERIAL_NUMBER));
+    for (const auto& node : inventory.nodes)
+        EXPECT_NE(node->getPath(), "/machine/chassis");
+}
+
+TEST(InventoryNodes, AProcessorsMakerIsNotTheMachines)
+{
+    const Inventory inventory = readExport(machineWith(
+        info("CPUVendor", "Vexilon") + info("CPUModel", "V9") + info("CPUFamilyNumber", "6"), ""));
+    const IC::Node& machine = nodeAt(inventory, "/machine");
+    EXPECT_FALSE(has(machine, KEY_MAKER));
+    EXPECT_FALSE(has(machine, KEY_MODEL));
+    EXPECT_EQ(std::string(property(machine, KEY_CPU_MAKER)), "Vexilon");
+    EXPECT_EQ(std::string(property(machine, KEY_CPU_MODEL)), "V9");
+    EXPECT_THAT(property(machine, KEY_OTHER_FACTS).operator IC::StringArray(), Contains("CPUFamilyNumber=6"));
+}
+
 TEST(InventoryNodes, HoldEveryKindOfValue)
 {
     const std::string address20 = "80:00:00:48:fe:80:00:00:00:00:00:00:00:02:c9:03:00:f9:bf:a1";
@@ -389,14 +467,14 @@ TEST(InventoryNodes, HoldEveryKindOfValue)
     const IC::Node& machine = nodeAt(inventory, "/machine");
     EXPECT_EQ(machine.getSensor(), IC::Node::SENSOR_COMPUTER);
     EXPECT_EQ(std::string(property(machine, KEY_MODEL)), "DCS8000Z");
-    EXPECT_EQ(std::string(property(machine, KEY_REVISION)), "");
+    EXPECT_FALSE(has(machine, KEY_REVISION));
     const ZQ::DateTime readAt = IC::Number(property(machine, KEY_READ_AT));
     EXPECT_NEAR(static_cast<double>(static_cast<long>(readAt)),
                 static_cast<double>(static_cast<long>(ZQ::DateTime::now())), 60);
     EXPECT_EQ(std::string(property(machine, KEY_HOST_NAME)), "here");
     EXPECT_EQ(property(machine, KEY_USABLE), IC::PropertyValue(IC::Number(true)));
 
-    EXPECT_EQ(std::string(property(nodeAt(inventory, "/machine/planar"), KEY_ASSET_TAG)), "N/A");
+    EXPECT_FALSE(has(nodeAt(inventory, "/machine/planar"), KEY_ASSET_TAG));
     EXPECT_EQ(property(nodeAt(inventory, "/machine/chassis"), KEY_CHASSIS_TYPE).operator IC::EnumValue(),
               IC::EnumValue(23u));
     const IC::Node& bios = nodeAt(inventory, "/machine/bios");
@@ -731,8 +809,8 @@ TEST_F(InventoryOfRealMachines, KeepsTheirValuesUnchanged)
     EXPECT_EQ(std::string(property(module, KEY_PART_NUMBER)), "HMT351R7CFR8C-PB  ");
     EXPECT_EQ(module.getStatus(), STATUS_SIZE_UNKNOWN);
     EXPECT_EQ(alertsOf(machine.nodes).size(), 8u);
-    EXPECT_EQ(std::string(property(nodeAt(machine, "/machine"), KEY_REVISION)), "");
-    EXPECT_EQ(std::string(property(nodeAt(machine, "/machine/chassis"), KEY_REVISION)), "N/A");
+    EXPECT_FALSE(has(nodeAt(machine, "/machine"), KEY_REVISION));
+    EXPECT_FALSE(has(nodeAt(machine, "/machine/chassis"), KEY_REVISION));
     EXPECT_EQ(property(nodeAt(machine, "/machine/cpu0/memory0"), KEY_SIZE).operator unsigned long long(),
               17149054976u);
     EXPECT_EQ(property(nodeAt(machine, "/machine/cpu0/memory0"), KEY_PAGE_COUNTS).operator IC::NumberArray(),
