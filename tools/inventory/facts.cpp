@@ -20,7 +20,7 @@ const struct Prefix {
                 {"DMIChassis", IC::Node::SENSOR_CHASSIS},
                 {"DMIBIOS", IC::Node::SENSOR_BIOS},
                 {"OS", IC::Node::SENSOR_OS},
-                {"CPU", IC::Node::SENSOR_CPU},
+                {"CPU"},
                 {"PCI"},
                 {"GPU"},
                 {"NVIDIA"},
