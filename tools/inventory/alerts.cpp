@@ -1,20 +1,124 @@
 // The table of troubles, and the alerts.
 #include "alerts.h"
 
+#include <algorithm>
 #include <map>
+#include <optional>
 
 namespace inventory {
 
 namespace {
 
+constexpr auto all = IC::Node::SENSOR_UNKNOWN;
+constexpr auto fan = IC::Node::SENSOR_FAN;
+constexpr auto voltage = IC::Node::SENSOR_VOLTAGE_SENSOR;
+constexpr auto intrusion = IC::Node::SENSOR_INTRUSION;
+
+// The worst first. A row for a sensor type replaces the row for all.
+// clang-format off
 constexpr Trouble troubles[] = {
-    {STATUS_NOT_USABLE, 2, CLASS_CONFIGURATION, "the system may not use it"},
-    {STATUS_PARTLY_USABLE, 1, CLASS_CONFIGURATION, "the system may not use all of it"},
-    {STATUS_SIZE_UNKNOWN, 1, CLASS_CONFIGURATION, "its size is unknown"},
-    {STATUS_OUTSIDE_LIMITS, 3, CLASS_ENVIRONMENT, "it is outside its limits"},
-    {STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises an alarm"},
-    {STATUS_FAULT, 2, CLASS_ENVIRONMENT, "it cannot be read"},
+    {Trouble::ABOVE, KEY_EMERGENCY_LIMIT, all, STATUS_OUTSIDE_LIMITS, 3, CLASS_ENVIRONMENT, "it is above its emergency limit"},
+    {Trouble::FLAG_SET, KEY_EMERGENCY_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises the alarm of its emergency limit"},
+    {Trouble::ABOVE, KEY_UPPER_CRITICAL, all, STATUS_OUTSIDE_LIMITS, 3, CLASS_ENVIRONMENT, "it is above its upper critical limit"},
+    {Trouble::FLAG_SET, KEY_CRIT_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises the alarm of its upper critical limit"},
+    {Trouble::BELOW, KEY_LOWER_CRITICAL, all, STATUS_OUTSIDE_LIMITS, 3, CLASS_ENVIRONMENT, "it is below its lower critical limit"},
+    {Trouble::FLAG_SET, KEY_LCRIT_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises the alarm of its lower critical limit"},
+    {Trouble::IN_STATUS, STATUS_NOT_USABLE, all, STATUS_NOT_USABLE, 2, CLASS_CONFIGURATION, "the system may not use it"},
+    {Trouble::FLAG_SET, KEY_FAULT, all, STATUS_FAULT, 2, CLASS_ENVIRONMENT, "it reports a fault"},
+    {Trouble::FLAG_SET, KEY_ALARM, all, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises an alarm"},
+    {Trouble::BELOW, KEY_LOWER_LIMIT, fan, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is below its lower limit"},
+    {Trouble::FLAG_SET, KEY_MIN_ALARM, fan, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises the alarm of its lower limit"},
+    {Trouble::BELOW, KEY_LOWER_LIMIT, voltage, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is below its lower limit"},
+    {Trouble::FLAG_SET, KEY_MIN_ALARM, voltage, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises the alarm of its lower limit"},
+    {Trouble::ABOVE, KEY_UPPER_LIMIT, voltage, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is above its upper limit"},
+    {Trouble::FLAG_SET, KEY_MAX_ALARM, voltage, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises the alarm of its upper limit"},
+    {Trouble::ABOVE, KEY_UPPER_LIMIT, all, STATUS_OUTSIDE_LIMITS, 1, CLASS_ENVIRONMENT, "it is above its upper limit"},
+    {Trouble::FLAG_SET, KEY_MAX_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises the alarm of its upper limit"},
+    {Trouble::BELOW, KEY_LOWER_LIMIT, all, STATUS_OUTSIDE_LIMITS, 1, CLASS_ENVIRONMENT, "it is below its lower limit"},
+    {Trouble::FLAG_SET, KEY_MIN_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises the alarm of its lower limit"},
+    {Trouble::ABOVE, KEY_CAP, all, STATUS_OUTSIDE_LIMITS, 1, CLASS_ENVIRONMENT, "it is above its cap"},
+    {Trouble::FLAG_SET, KEY_CAP_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises the alarm of its cap"},
+    {Trouble::FLAG_SET, KEY_ALARM, intrusion, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "the chassis has been opened"},
+    {Trouble::NO_READING, KEY_READING, all, STATUS_UNREAD, 1, CLASS_ENVIRONMENT, "it cannot be read"},
+    {Trouble::IN_STATUS, STATUS_PARTLY_USABLE, all, STATUS_PARTLY_USABLE, 1, CLASS_CONFIGURATION, "the system may not use all of it"},
+    {Trouble::IN_STATUS, STATUS_SIZE_UNKNOWN, all, STATUS_SIZE_UNKNOWN, 1, CLASS_CONFIGURATION, "its size is unknown"},
 };
+// clang-format on
+
+constexpr bool isWorstFirst()
+{
+    unsigned int severity = 3;
+    for (const Trouble& trouble : troubles) {
+        if (trouble.severity > severity)
+            return false;
+        severity = trouble.severity;
+    }
+    return true;
+}
+static_assert(isWorstFirst());
+
+using Properties = std::map<unsigned int, IC::PropertyValue>;
+
+// The property, or nothing unless it holds a number of this kind.
+std::optional<IC::Number> numberIn(const Properties& properties, unsigned int key, IC::Number::KindType kind)
+{
+    const auto found = properties.find(key);
+    if (found == properties.end() || found->second.getKind() != IC::PropertyValue::KIND_NUMBER)
+        return {};
+    const IC::Number number(found->second);
+    return number.getKind() == kind ? std::optional(number) : std::nullopt;
+}
+
+bool isSet(const Properties& properties, unsigned int key)
+{
+    const auto flag = numberIn(properties, key, IC::Number::KIND_BOOL);
+    return flag && flag->operator bool();
+}
+
+// An upper limit of 0 means that none is set. Where there is a fault, the reading says nothing.
+bool isBeyond(const Properties& properties, unsigned int key, bool above)
+{
+    const auto reading = numberIn(properties, KEY_READING, IC::Number::KIND_REAL);
+    const auto limit = numberIn(properties, key, IC::Number::KIND_REAL);
+    if (!reading || !limit || isSet(properties, KEY_FAULT))
+        return false;
+    return above ? limit->operator double() != 0 && *reading > *limit : *reading < *limit;
+}
+
+bool isSeen(const Trouble& trouble, unsigned int status, const Properties& properties)
+{
+    switch (trouble.sign) {
+    case Trouble::IN_STATUS:
+        return status == trouble.number;
+    case Trouble::FLAG_SET:
+        return isSet(properties, trouble.number);
+    case Trouble::ABOVE:
+    case Trouble::BELOW:
+        return isBeyond(properties, trouble.number, trouble.sign == Trouble::ABOVE);
+    case Trouble::NO_READING:
+        return numberIn(properties, trouble.number, IC::Number::KIND_NAN) && !isSet(properties, KEY_FAULT);
+    }
+    return false;
+}
+
+bool concerns(const Trouble& trouble, const IC::Node& node)
+{
+    const auto sensor = node.getSensor();
+    const auto replaces = [&trouble, sensor](const Trouble& other) {
+        return other.sign == trouble.sign && other.number == trouble.number && other.sensor == sensor;
+    };
+    return trouble.sensor == sensor
+        || (trouble.sensor == all && std::none_of(std::begin(troubles), std::end(troubles), replaces));
+}
+
+// What the change of this property shows to be wrong now, or null.
+const Trouble* troubleIn(const Change& change)
+{
+    for (const Trouble* trouble : troublesOf(*change.node))
+        if (trouble->sign == Trouble::FLAG_SET && trouble->number == change.key)
+            return trouble;
+    return nullptr;
+}
 
 AlertClass classOf(const IC::Node& node)
 {
@@ -23,6 +127,10 @@ AlertClass classOf(const IC::Node& node)
     case IC::Node::SENSOR_TEMPERATURE_SENSOR:
     case IC::Node::SENSOR_VOLTAGE_SENSOR:
     case IC::Node::SENSOR_POWER_SUPPLY:
+    case IC::Node::SENSOR_POWER_DOMAIN:
+    case IC::Node::SENSOR_COOLING_DOMAIN:
+    case IC::Node::SENSOR_INTRUSION:
+    case IC::Node::SENSOR_ALERT_INDICATION:
         return CLASS_ENVIRONMENT;
     default:
         return CLASS_CONFIGURATION;
@@ -44,7 +152,9 @@ std::string messageOf(const Change& change)
 IC::Alert alertOf(const Change& change)
 {
     const IC::Node& node = *change.node;
-    const Trouble* trouble = change.subject == Change::STATUS ? troubleOf(node) : nullptr;
+    const Trouble* trouble = change.subject == Change::STATUS ? troubleOf(node)
+        : change.subject == Change::PROPERTY                  ? troubleIn(change)
+                                                              : nullptr;
     const bool isLoss = change.subject == Change::NODE && change.from;
     // A new node, a status that is 0 again and a new reading are only information.
     const bool isNews = change.subject != Change::PROPERTY || change.key == KEY_READING;
@@ -58,12 +168,21 @@ IC::Alert alertOf(const Change& change)
 
 }  // namespace
 
+std::vector<const Trouble*> troublesOf(const IC::Node& node)
+{
+    std::vector<const Trouble*> found;
+    const unsigned int status = node.getStatus();
+    const Properties properties = node.getProperties();
+    for (const Trouble& trouble : troubles)
+        if (isSeen(trouble, status, properties) && concerns(trouble, node))
+            found.push_back(&trouble);
+    return found;
+}
+
 const Trouble* troubleOf(const IC::Node& node)
 {
-    for (const Trouble& trouble : troubles)
-        if (trouble.status == static_cast<unsigned int>(node.getStatus()))
-            return &trouble;
-    return nullptr;
+    const auto found = troublesOf(node);
+    return found.empty() ? nullptr : found.front();
 }
 
 std::vector<IC::Alert> alertsOf(const Nodes& nodes)
@@ -72,12 +191,11 @@ std::vector<IC::Alert> alertsOf(const Nodes& nodes)
     std::map<std::string, unsigned int> statuses;
     for (const auto& node : nodes) {
         const unsigned int status = statuses[node->getPath()] = node->getStatus();
-        const Trouble* trouble = troubleOf(*node);
-        if (trouble == nullptr || (status == STATUS_NOT_USABLE && statuses[node->getParent()] == status))
-            continue;
-        alerts.emplace_back(trouble->severity, trouble->alertClass,
-                            std::vector<std::string> {node->getPath()}, status,
-                            IC::pst[node->getSensor()] + ": " + trouble->words);
+        for (const Trouble* trouble : troublesOf(*node))
+            if (trouble->status != STATUS_NOT_USABLE || statuses[node->getParent()] != STATUS_NOT_USABLE)
+                alerts.emplace_back(trouble->severity, trouble->alertClass,
+                                    std::vector<std::string> {node->getPath()}, status,
+                                    IC::pst[node->getSensor()] + ": " + trouble->words);
     }
     return alerts;
 }

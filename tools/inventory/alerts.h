@@ -1,4 +1,4 @@
-// Alerts about nodes with a status above 0, and about changes.
+// Alerts about what is wrong, and about changes.
 #pragma once
 
 #include "IC/Alert.h"
@@ -8,17 +8,26 @@ namespace inventory {
 
 enum AlertClass : unsigned char { CLASS_CONFIGURATION = 1, CLASS_ENVIRONMENT = 2 };
 
-// The meaning of a status above 0.
+// Something that can be wrong with a node, a row of the table in alerts.cpp.
 struct Trouble {
-    Status status;
+    enum Sign : unsigned char {
+        IN_STATUS,  // the node's status is `number`
+        FLAG_SET,   // the property `number` is true
+        ABOVE,      // the reading is above the limit `number`
+        BELOW,      // the reading is below the limit `number`
+        NO_READING  // the property `number` is not a number
+    } sign;
+    unsigned int number;
+    IC::Node::SensorType sensor;  // the only sensor type that the row is about, or SENSOR_UNKNOWN for all
+    Status status;                // of a sensor whose worst trouble this is
     unsigned char severity;
     AlertClass alertClass;
     const char* words;
 };
-const Trouble* troubleOf(const IC::Node& node);  // null for status 0
+std::vector<const Trouble*> troublesOf(const IC::Node& node);  // in the order of the table, the worst first
+const Trouble* troubleOf(const IC::Node& node);                // the worst, or null
 
-// One for each node with a status above 0. A node that the system may not use gets none if the same holds for its
-// parent.
+// One for each trouble of each node. A node that the system may not use gets none if the same holds for its parent.
 std::vector<IC::Alert> alertsOf(const Nodes& nodes);
 
 // One alert for each change.

@@ -131,7 +131,7 @@ enum Key : unsigned int {
 // clang-format off
 enum Status : unsigned int {
     STATUS_FINE, STATUS_NOT_USABLE, STATUS_PARTLY_USABLE, STATUS_SIZE_UNKNOWN, STATUS_OUTSIDE_LIMITS,
-    STATUS_ALARM, STATUS_FAULT
+    STATUS_ALARM, STATUS_FAULT, STATUS_UNREAD
 };
 // clang-format on
 

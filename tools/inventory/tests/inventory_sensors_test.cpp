@@ -46,18 +46,18 @@ TEST(InventorySensors, AreNodesBelowTheMachine)
                                     "A: power1_input=250000000\\n\nA: curr1_input=1\\n\n",
                                     {"--properties"});
     EXPECT_EQ(outcome.status, 0) << outcome.err;
-    EXPECT_THAT(outcome.out, HasSubstr("\n  Fan board-isa-0001:fan1: fan1, 4200 turns a minute\n"));
+    EXPECT_THAT(outcome.out, HasSubstr("\n  Fan board-isa-0001:fan1: fan1, 4200 RPM\n"));
     EXPECT_THAT(outcome.out, HasSubstr(" = 4200] reading\n"));
     EXPECT_THAT(outcome.out, HasSubstr(" = 1000] lower limit\n"));
     EXPECT_THAT(outcome.out,
                 HasSubstr("\n  Temperature Sensor board-isa-0001:temp1: Inlet, 41.5 degrees Celsius\n"));
     EXPECT_THAT(outcome.out, HasSubstr(" = 90] upper critical limit\n"));
-    EXPECT_THAT(outcome.out, HasSubstr("\n  Voltage Sensor board-isa-0001:in0: in0, 12.05 volts\n"));
+    EXPECT_THAT(outcome.out, HasSubstr("\n  Voltage Sensor board-isa-0001:in0: in0, 12.05 V\n"));
     EXPECT_THAT(outcome.out, HasSubstr(" = 11] lower limit\n"));
     EXPECT_THAT(outcome.out, HasSubstr(" = 13] upper limit\n"));
     EXPECT_THAT(outcome.out, HasSubstr(" = false] alarm\n"));
-    EXPECT_THAT(outcome.out, HasSubstr("\n  Power Supply board-isa-0001:power1: power1, 250 watts\n"));
-    EXPECT_THAT(outcome.out, Not(HasSubstr("curr1")));
+    EXPECT_THAT(outcome.out, HasSubstr("\n  PowerDomain board-isa-0001:power1: power1, 250 W\n"));
+    EXPECT_THAT(outcome.out, HasSubstr("\n  PowerDomain board-isa-0001:curr1: curr1, 0.001 A\n"));
     EXPECT_THAT(outcome.out, HasSubstr("\nAlerts: 0\n"));
 }
 
@@ -68,19 +68,19 @@ TEST(InventorySensors, RaiseAnAlertBeyondALimit)
         const char* trouble;  // empty: none
     } rows[] = {
         {"A: fan1_input=1000\\n\nA: fan1_min=1000\\n\n", ""},
-        {"A: fan1_input=999\\n\nA: fan1_min=1000\\n\n", "it is outside its limits"},
+        {"A: fan1_input=999\\n\nA: fan1_min=1000\\n\n", "it is below its lower limit"},
         {"A: fan1_input=0\\n\nA: fan1_min=0\\n\n", ""},
         {"A: temp1_input=90000\\n\nA: temp1_crit=90000\\n\n", ""},
-        {"A: temp1_input=90100\\n\nA: temp1_crit=90000\\n\n", "it is outside its limits"},
-        {"A: temp1_input=-5000\\n\nA: temp1_min=-4000\\n\n", "it is outside its limits"},
+        {"A: temp1_input=90100\\n\nA: temp1_crit=90000\\n\n", "it is above its upper critical limit"},
+        {"A: temp1_input=-5000\\n\nA: temp1_min=-4000\\n\n", "it is below its lower limit"},
         {"A: temp1_input=50000\\n\nA: temp1_max=0\\n\n", ""},
-        {"A: in0_input=10900\\n\nA: in0_lcrit=11000\\n\n", "it is outside its limits"},
-        {"A: in0_input=13100\\n\nA: in0_max=13000\\n\n", "it is outside its limits"},
-        {"A: power1_average=300000000\\n\nA: power1_cap=250000000\\n\n", "it is outside its limits"},
+        {"A: in0_input=10900\\n\nA: in0_lcrit=11000\\n\n", "it is below its lower critical limit"},
+        {"A: in0_input=13100\\n\nA: in0_max=13000\\n\n", "it is above its upper limit"},
+        {"A: power1_average=300000000\\n\nA: power1_cap=250000000\\n\n", "it is above its cap"},
         {"A: fan1_input=2000\\n\nA: fan1_alarm=1\\n\n", "it raises an alarm"},
-        {"A: in0_input=12000\\n\nA: in0_min_alarm=0\\n\nA: in0_max_alarm=1\\n\n", "it raises an alarm"},
-        {"A: in0_input=12000\\n\nA: in0_min_alarm=1\\n\nA: in0_max_alarm=0\\n\n", "it raises an alarm"},
-        {"A: temp1_input=50000\\n\nA: temp1_fault=1\\n\n", "it cannot be read"},
+        {"A: in0_input=12000\\n\nA: in0_min_alarm=0\\n\nA: in0_max_alarm=1\\n\n", "it raises the alarm of its upper limit"},
+        {"A: in0_input=12000\\n\nA: in0_min_alarm=1\\n\nA: in0_max_alarm=0\\n\n", "it raises the alarm of its lower limit"},
+        {"A: temp1_input=50000\\n\nA: temp1_fault=1\\n\n", "it reports a fault"},
         {"A: temp1_input=broken\\n\n", "it cannot be read"},
         {"A: fan1_min=1000\\n\n", "it cannot be read"},
     };
