@@ -1,4 +1,4 @@
-// The nodes as JSON.
+// The machine as JSON. inventory.schema.json describes the document.
 #include <cmath>
 #include <nlohmann/json.hpp>
 #include <ostream>
@@ -65,7 +65,7 @@ Json arrayOf(const Elements& elements)
     return array;
 }
 
-Json jsonOf(const IC::PropertyValue& value)
+Json jsonOf(unsigned int key, const IC::PropertyValue& value)
 {
     switch (value.getKind()) {
     case IC::PropertyValue::KIND_NUMBER:
@@ -79,7 +79,8 @@ Json jsonOf(const IC::PropertyValue& value)
         return digits;
     }
     case IC::PropertyValue::KIND_ENUMVALUE:
-        return value.operator unsigned int();
+        return {{"code", value.operator unsigned int()},
+                {"name", nameOfCode(key, value.operator unsigned int())}};
     case IC::PropertyValue::KIND_NUMBERARRAY:
         return arrayOf(value.operator IC::NumberArray());
     case IC::PropertyValue::KIND_STRINGARRAY:
@@ -91,13 +92,17 @@ Json jsonOf(const IC::PropertyValue& value)
 
 Json jsonOf(const IC::Node& node)
 {
-    Json properties = Json::array();
-    for (const auto& [key, value] : node.getProperties())
-        properties.push_back({{"number", key},
-                              {"name", nameOf(key)},
-                              {"kind", kindName(value)},
-                              {"readOnly", value.readOnly()},
-                              {"value", jsonOf(value)}});
+    Json properties = Json::object();
+    for (const auto& [key, value] : node.getProperties()) {
+        const KeyInfo* info = infoOf(key);
+        Json property {{"number", key}, {"caption", info == nullptr ? "" : info->caption}};
+        if (info != nullptr && *info->unit != '\0')
+            property["unit"] = info->unit;
+        property["kind"] = kindName(value);
+        property["readOnly"] = value.readOnly();
+        property["value"] = jsonOf(key, value);
+        properties[identifierOf(key)] = std::move(property);
+    }
     return {{"path", jsonOf(node.getPath())},
             {"parent", jsonOf(node.getParent())},
             {"sensorType", static_cast<unsigned int>(node.getSensor())},
@@ -107,14 +112,36 @@ Json jsonOf(const IC::Node& node)
             {"properties", properties}};
 }
 
+// In whole seconds.
+std::string textOf(const ZQ::DateTime& time)
+{
+    return std::string(IC::Number(static_cast<long>(time), 0));
+}
+
+Json jsonOf(const IC::Alert& alert)
+{
+    return {{"time", textOf(alert.getTimeStamp())},
+            {"severity", static_cast<unsigned int>(alert.getSeverity())},
+            {"class", static_cast<unsigned int>(alert.getClass())},
+            {"status", static_cast<unsigned int>(alert.getStatus())},
+            {"paths", arrayOf(alert.getNodePaths())},
+            {"message", jsonOf(alert.getMessage())}};
+}
+
 }  // namespace
 
-void writeJson(std::ostream& out, const Nodes& nodes)
+void writeJson(std::ostream& out, const Nodes& nodes, const std::vector<IC::Alert>& alerts)
 {
     Json all = Json::array();
     for (const auto& node : nodes)
         all.push_back(jsonOf(*node));
-    out << Json {{"nodes", all}}.dump(2) << '\n';
+    Json raised = Json::array();
+    for (const IC::Alert& alert : alerts)
+        raised.push_back(jsonOf(alert));
+    const Json document {{"format", "ic-inventory"},      {"version", 1},
+                         {"host", jsonOf(hostOf(nodes))}, {"time", timeOf(nodes)},
+                         {"nodes", std::move(all)},       {"alerts", std::move(raised)}};
+    out << document.dump(2) << '\n';
 }
 
 }  // namespace inventory

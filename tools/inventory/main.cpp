@@ -1,19 +1,24 @@
-// The command line: describes this machine, or the machine of an hwloc export, as nodes.
+// The command line: describes this machine, or the machine of a file, as nodes.
 #include <CLI/CLI.hpp>
 #include <spdlog/cfg/env.h>
 #include <spdlog/sinks/stdout_color_sinks.h>
 #include <spdlog/spdlog.h>
 
+#include <algorithm>
 #include <cerrno>  // program_invocation_short_name: the installed program has another name
 #include <csignal>
 #include <cstdlib>
-#include <fstream>
+#include <functional>
+#include <iomanip>
 #include <iostream>
+#include <sstream>
+#include <system_error>
 #include <tuple>
 
 #include "VXLog/SpdlogSink.h"
 #include "alerts.h"
 #include "comparing.h"
+#include "output.h"
 #include "reading.h"
 #include "values.h"
 #include "watching.h"
@@ -34,6 +39,12 @@ void connectLog()
     VXLog::setRecordSink(VXLog::SpdlogSink(spdlog::default_logger()));
 }
 
+// Writes a line about what went wrong to standard error.
+void complain(const std::string& text)
+{
+    std::cerr << program_invocation_short_name << ": " << printable(text) << '\n';
+}
+
 // The text as a value of the stored value's kind. Writable properties hold texts or real numbers.
 IC::PropertyValue valueLike(const IC::PropertyValue& stored, const std::string& text)
 {
@@ -45,8 +56,8 @@ IC::PropertyValue valueLike(const IC::PropertyValue& stored, const std::string& 
     return IC::Number(*number);
 }
 
-ExitStatus change(const Nodes& nodes, const std::string& path, const std::string& keyText,
-                  const std::string& text)
+int change(std::ostream& out, const Nodes& nodes, const std::string& path, const std::string& keyText,
+           const std::string& text)
 {
     const auto key = count(keyText);
     if (!key)
@@ -60,10 +71,10 @@ ExitStatus change(const Nodes& nodes, const std::string& path, const std::string
         const bool isDone = outcome.getStatus() == IC::Error::STATUS_SUCCESS;
         const bool isReadOnly = outcome.getStatus() == IC::Error::STATUS_READ_ONLY;
         const char* words = isDone ? "changed" : isReadOnly ? "read-only" : "no such property";
-        std::cout << outcome << " (" << words << ")\n";
+        out << outcome << " (" << words << ")\n";
         if (node->getProperty(*key, value).getStatus() == IC::Error::STATUS_SUCCESS)
-            writeProperty(std::cout, *key, value);
-        std::cout << *node << '\n';
+            writeProperty(out, *key, value);
+        out << *node << '\n';
         return isDone ? EXIT_DONE : EXIT_REFUSED;
     }
     throw BadInput("no node has the path '" + path + "'");
@@ -74,10 +85,9 @@ struct Request {
     std::string file;
     TreeForm form;
     std::tuple<std::string, std::string, std::string> setting;
-    std::pair<std::string, std::string> sides;
-    std::string drawing;
+    std::vector<std::string> sides;
+    std::string output;  // "-": standard output
     std::string period;
-    bool asJson = false;
 };
 
 Inventory readFrom(const std::string& file)
@@ -96,38 +106,26 @@ Inventory readHere()
     return inventory;
 }
 
-void describe(const Nodes& nodes, const TreeForm& form)
+void describe(std::ostream& out, const Nodes& nodes, const TreeForm& form)
 {
-    writeTree(std::cout, nodes, form);
-    std::cout << '\n';
-    writeAlerts(std::cout, alertsOf(nodes), form.look);
-    std::cout << '\n';
-    writeSummary(std::cout, nodes);
+    writeTree(out, nodes, form);
+    out << '\n';
+    writeAlerts(out, alertsOf(nodes), form.look);
+    out << '\n';
+    writeSummary(out, nodes);
 }
 
-ExitStatus compare(const std::string& before, const std::string& after)
+int compare(std::ostream& out, const std::vector<std::string>& sides, const Look& look)
 {
-    const Inventory old = readFrom(before);
-    const Inventory current = readFrom(after);
+    const Inventory old = readFrom(sides.front());
+    const Inventory current = sides.size() > 1 ? readFrom(sides[1]) : readHere();
     const auto changes = changesBetween(old.nodes, current.nodes);
     if (changes.empty())
         return EXIT_DONE;
-    std::cout << "--- " << printable(before) << "\n+++ " << printable(after) << '\n';
-    writeChanges(std::cout, changes, lookOfStandardOutput());
+    out << "--- " << printable(sides.front()) << "\n+++ "
+        << (sides.size() > 1 ? printable(sides[1]) : "this machine") << '\n';
+    writeChanges(out, changes, look);
     return EXIT_DIFFERENT;
-}
-
-ExitStatus draw(const Nodes& nodes, const std::string& name)
-{
-    std::ofstream file(name, std::ios::binary);
-    if (file)
-        writeSvg(file, nodes);
-    file.close();
-    if (file)
-        return EXIT_DONE;
-    std::cerr << program_invocation_short_name << ": " << printable(name)
-              << ": the drawing cannot be written\n";
-    return EXIT_REFUSED;
 }
 
 double secondsIn(const std::string& text)
@@ -140,12 +138,17 @@ double secondsIn(const std::string& text)
     return *seconds;
 }
 
+bool isGiven(const CLI::Option* option)
+{
+    return option->count() != 0;
+}
+
 // Throws BadInput if more than one of these options is given.
 void allowOne(const std::vector<const CLI::Option*>& options)
 {
     const CLI::Option* given = nullptr;
     for (const CLI::Option* option : options) {
-        if (option->count() == 0)
+        if (!isGiven(option))
             continue;
         if (given != nullptr)
             throw BadInput(given->get_name() + " and " + option->get_name() + " exclude each other");
@@ -153,33 +156,59 @@ void allowOne(const std::vector<const CLI::Option*>& options)
     }
 }
 
-// The exit status: `failure` if the output cannot be written. With --diff, status 1 means that something differs, so
-// its `failure` is another status.
-int flushed(int status, ExitStatus failure)
+// The exit status: `failure` if the output cannot be written. That nobody reads it any more is no failure.
+int flushed(int status, int failure)
 {
-    if (std::cout.flush())
+    if (std::cout.flush() || isOutputClosed())
         return status;
-    std::cerr << program_invocation_short_name << ": the output cannot be written\n";
+    complain("the output cannot be written");
     return failure;
+}
+
+// Writes what `write` gives to the file, or to standard output if it is "-".
+int written(const std::string& file, const std::function<int(std::ostream&)>& write, int failure)
+{
+    if (file == "-")
+        return flushed(write(std::cout), failure);
+    std::ostringstream content;
+    const int status = write(content);
+    try {
+        replaceFile(file, content.str());
+        return status;
+    } catch (const std::system_error& error) {
+        complain(file + ": the output cannot be written: " + error.code().message());
+        return failure;
+    }
+}
+
+std::string help()
+{
+    const std::string name = program_invocation_short_name;
+    const std::pair<const char*, const char*> examples[] = {
+        {"", "this machine as a tree"},
+        {" --properties day1.xml", "all properties of the machine of that file"},
+        {" --diff day1.xml day2.xml", "what has changed in between"},
+        {" --watch 10", "alerts, as changes happen"},
+        {" --json | jq -r '.nodes[].path'", "the paths of all nodes"},
+        {" --svg machine.svg", "a drawing"},
+    };
+    std::ostringstream text;
+    text << "Examples:\n";
+    for (const auto& [words, meaning] : examples)
+        text << "  " << std::left << std::setw(46) << name + words << ' ' << meaning << '\n';
+    text << "\nExit status: 0; 1 if --set is refused, --diff finds differences or the output cannot be "
+            "written;\n"
+            "2 for options or input that cannot be used, and for --diff if the output cannot be written.\n"
+            "Log records go to standard error; SPDLOG_LEVEL=trace shows all of them, SPDLOG_LEVEL=off none.\n"
+            "On a terminal the tree is drawn with lines and colours; NO_COLOR=1 turns the colours off.";
+    return text.str();
 }
 
 int run(int argc, char** argv)
 {
     CLI::App app("Describes this machine, or that of FILE, as nodes with numbered properties.",
                  program_invocation_short_name);
-    app.footer(
-        "Examples:\n"
-        "  inventory                            this machine as a tree\n"
-        "  lstopo day1.xml                      exports it, to read or compare it later\n"
-        "  inventory --properties day1.xml      all properties of the machine of that file\n"
-        "  inventory --diff day1.xml day2.xml   what has changed in between\n"
-        "  inventory --watch 10                 alerts, as changes happen\n"
-        "  inventory --json | jq '.nodes[].path'\n"
-        "  inventory --svg machine.svg && xdg-open machine.svg\n\n"
-        "Exit status: 0; 1 if --set is refused, --diff finds differences or the output cannot be written;\n"
-        "2 for options or input that cannot be used, and for --diff if the output cannot be written.\n"
-        "Log records go to standard error; SPDLOG_LEVEL=trace shows all of them, SPDLOG_LEVEL=off none.\n"
-        "On a terminal the tree is drawn with lines and colours; NO_COLOR=1 turns the colours off.");
+    app.footer(help());
     app.set_version_flag("--version",
                          program_invocation_short_name
                              + std::string(" " INVENTORY_VERSION ", hwloc " HWLOC_VERSION));
@@ -190,19 +219,25 @@ int run(int argc, char** argv)
         app.add_flag("--log", request.form.own, "Write each node in its own text form, as a log shows it");
     const auto* properties = app.add_flag("--properties", request.form.withProperties,
                                           "Write the properties of each node: [number = value] name");
-    const auto* set =
-        app.add_option("--set", request.setting, "Change one property and write the outcome, nothing else")
-            ->type_name("PATH NUMBER TEXT");
-    const auto* json = app.add_flag("--json", request.asJson,
-                                    "Write the nodes and their properties as JSON; a text that is not"
-                                    " UTF-8 becomes {\"hex\": \"fffe\"}");
-    const auto* svg = app.add_option("--svg", request.drawing, "Draw the nodes as nested boxes into OUTPUT")
-                          ->type_name("OUTPUT");
+    const auto* json = app.add_flag("--json", "Write the nodes, their properties and the alerts as JSON");
+    std::string drawing = "-";
+    const auto* svg =
+        app.add_option("--svg", drawing, "Draw the nodes as nested boxes into SVG")->type_name("SVG");
+    const auto* output =
+        app.add_option("--output", request.output,
+                       "Write to OUTPUT, as a whole or not at all, instead of to standard output")
+            ->type_name("OUTPUT");
+    const auto* diff = app.add_option("--diff", request.sides,
+                                      "Write the differences between two machines; the second is this one if"
+                                      " AFTER is missing")
+                           ->type_name("BEFORE [AFTER]")
+                           ->expected(1, CLI::detail::expected_max_vector_size);
     const auto* watching = app.add_option("--watch", request.period,
                                           "Read again every SECONDS and write what changed, as alerts")
                                ->type_name("SECONDS");
-    const auto* diff = app.add_option("--diff", request.sides, "Write the differences between two machines")
-                           ->type_name("BEFORE AFTER");
+    const auto* set =
+        app.add_option("--set", request.setting, "Change one property and write the outcome, nothing else")
+            ->type_name("PATH NUMBER TEXT");
     try {
         app.parse(argc, argv);
     } catch (const CLI::Success& success) {  // --help, --version
@@ -212,28 +247,44 @@ int run(int argc, char** argv)
         for (const CLI::Option* mode : {set, json, svg, watching, diff})
             allowOne({form, mode});
     allowOne({set, json, svg, watching, diff});
-    allowOne({diff, file});
+    if (request.sides.size() > 2 || (isGiven(diff) && isGiven(file)))
+        throw BadInput("--diff and FILE exclude each other");
+    allowOne({watching, output});
 
-    if (diff->count() != 0)
-        return flushed(compare(request.sides.first, request.sides.second), EXIT_BAD_INPUT);
-    const auto read = [&] { return file->count() != 0 ? readFrom(request.file) : readHere(); };
-    request.form.look = lookOfStandardOutput();
-    if (watching->count() != 0) {
-        watch(read, secondsIn(request.period), std::cout, request.form.look);
+    const auto read = [&] { return isGiven(file) ? readFrom(request.file) : readHere(); };
+    if (isGiven(watching)) {
+        watch(read, secondsIn(request.period), std::cout, lookOfStandardOutput());
         return flushed(EXIT_DONE, EXIT_REFUSED);
     }
+
+    // Each option that names a file of its own.
+    std::string target = isGiven(output) ? request.output : "-";
+    for (const auto& [option, own] : {std::pair(svg, &drawing)}) {
+        if (isGiven(option) && *own != "-") {
+            allowOne({option, output});
+            target = *own;
+        }
+    }
+    if (target == "-")
+        request.form.look = lookOfStandardOutput();
+    if (isGiven(diff))
+        return written(
+            target, [&](std::ostream& out) { return compare(out, request.sides, request.form.look); },
+            EXIT_BAD_INPUT);
     const Inventory inventory = read();
-    ExitStatus status = EXIT_DONE;
-    if (set->count() != 0)
-        status = std::apply([&](const auto&... words) { return change(inventory.nodes, words...); },
-                            request.setting);
-    else if (svg->count() != 0)
-        status = draw(inventory.nodes, request.drawing);
-    else if (request.asJson)
-        writeJson(std::cout, inventory.nodes);
-    else
-        describe(inventory.nodes, request.form);
-    return flushed(status, EXIT_REFUSED);
+    const auto write = [&](std::ostream& out) -> int {
+        if (isGiven(set))
+            return std::apply([&](const auto&... words) { return change(out, inventory.nodes, words...); },
+                              request.setting);
+        if (isGiven(svg))
+            writeSvg(out, inventory.nodes);
+        else if (isGiven(json))
+            writeJson(out, inventory.nodes, alertsOf(inventory.nodes));
+        else
+            describe(out, inventory.nodes, request.form);
+        return EXIT_DONE;
+    };
+    return written(target, write, EXIT_REFUSED);
 }
 
 }  // namespace
@@ -242,12 +293,13 @@ int main(int argc, char** argv)
 {
     // Failures of hwloc are reported by their return values; hwloc must not write lines of its own.
     setenv("HWLOC_HIDE_ERRORS", "2", 0);
-    std::signal(SIGPIPE, SIG_IGN);  // writing to a closed pipe then fails and is reported
+    std::signal(SIGPIPE, SIG_IGN);  // writing to a closed pipe then fails
+    std::signal(SIGXFSZ, SIG_IGN);  // and so does writing a file that is larger than allowed
     try {
         connectLog();
         return run(argc, argv);
     } catch (const std::exception& error) {
-        std::cerr << program_invocation_short_name << ": " << printable(error.what()) << '\n';
+        complain(error.what());
         return EXIT_BAD_INPUT;
     }
 }

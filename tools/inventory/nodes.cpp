@@ -197,6 +197,17 @@ std::string nameOfPciClass(unsigned int code)
         : words.substr(begin + 1, end - begin - 1);
 }
 
+// The text of the property of the first node that has it.
+std::string firstOf(const Nodes& nodes, unsigned int key)
+{
+    for (const auto& node : nodes) {
+        const auto properties = node->getProperties();
+        if (const auto found = properties.find(key); found != properties.end())
+            return std::string(found->second);
+    }
+    return "";
+}
+
 // IC::Number takes unsigned long long; on some machines hwloc's 64-bit type is another type.
 IC::Number number64(hwloc_uint64_t number)
 {
@@ -229,6 +240,12 @@ std::string nameOf(unsigned int key)
     return *info->unit == '\0' ? info->caption : std::string(info->caption) + " in " + info->unit;
 }
 
+std::string identifierOf(unsigned int key)
+{
+    const KeyInfo* info = infoOf(key);
+    return info == nullptr ? "property" + std::to_string(key) : info->identifier;
+}
+
 std::string nameOfCode(unsigned int key, unsigned int code)
 {
     switch (key) {
@@ -243,6 +260,16 @@ std::string nameOfCode(unsigned int key, unsigned int code)
     default:
         return "";
     }
+}
+
+std::string hostOf(const Nodes& nodes)
+{
+    return firstOf(nodes, KEY_HOST_NAME);
+}
+
+std::string timeOf(const Nodes& nodes)
+{
+    return firstOf(nodes, KEY_READ_AT);
 }
 
 Component::Component(const Site& site) : Node(site.sensor)

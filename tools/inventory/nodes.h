@@ -149,8 +149,14 @@ const KeyInfo* infoOf(unsigned int key);
 // The caption and, if there is one, the unit: "size in bytes". "" if no property has this number.
 std::string nameOf(unsigned int key);
 
+// In JSON: "cacheKind"; "property99" if no property has this number.
+std::string identifierOf(unsigned int key);
 // The name of a code that a property holds: "data" for the cache kind 1. "" if the code has none.
 std::string nameOfCode(unsigned int key, unsigned int code);
+
+// What the nodes know of the machine: the name of its host and when it was read, "" if they do not know.
+std::string hostOf(const Nodes& nodes);
+std::string timeOf(const Nodes& nodes);
 
 // The data from which a node is built.
 struct Site {

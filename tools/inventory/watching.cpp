@@ -10,32 +10,10 @@
 #include <thread>
 
 #include "alerts.h"
+#include "output.h"
 #include "values.h"
 
 namespace inventory {
-
-namespace {
-
-// Blocks the signals that end the program, so that it never ends in the middle of its output.
-class BlockedSignals {
-public:
-    BlockedSignals()
-    {
-        sigset_t ends;
-        sigemptyset(&ends);
-        sigaddset(&ends, SIGINT);
-        sigaddset(&ends, SIGTERM);
-        pthread_sigmask(SIG_BLOCK, &ends, &before_);
-    }
-    ~BlockedSignals() { pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
-    BlockedSignals(const BlockedSignals&) = delete;
-    BlockedSignals& operator=(const BlockedSignals&) = delete;
-
-private:
-    sigset_t before_ {};
-};
-
-}  // namespace
 
 void watch(const std::function<Inventory()>& read, double seconds, std::ostream& out, const Look& look)
 {

@@ -38,7 +38,7 @@ void writeChanges(std::ostream& out, const std::vector<Change>& changes, const L
 // How many nodes there are of each sensor type.
 void writeSummary(std::ostream& out, const Nodes& nodes);
 
-void writeJson(std::ostream& out, const Nodes& nodes);  // throws BadInput if JSON was not built in
+void writeJson(std::ostream& out, const Nodes& nodes, const std::vector<IC::Alert>& alerts);
 void writeSvg(std::ostream& out, const Nodes& nodes);
 
 // Used for the text and for the drawing.

@@ -692,10 +692,7 @@ protected:
             GTEST_SKIP() << whyNoMachines;
     }
 
-    static Inventory read(const std::string& name)
-    {
-        return readExport(readFile(realMachine(name)));
-    }
+    static Inventory read(const std::string& name) { return readExport(readFile(realMachine(name))); }
 
     static constexpr const char* names[] = {"x86-2socket-dimms-nvme-infiniband",
                                             "x86-24socket-384thread",
