@@ -137,6 +137,19 @@ AlertClass classOf(const IC::Node& node)
     }
 }
 
+// A CPU and a memory array tell what of them the system may not use; their parts do not tell it again.
+bool isToldOf(const IC::Node& node, Status status)
+{
+    switch (node.getSensor()) {
+    case IC::Node::SENSOR_COMPUTER:
+    case IC::Node::SENSOR_CPU:
+    case IC::Node::SENSOR_MEMORY_ARRAY:
+        return true;
+    default:
+        return status != STATUS_NOT_USABLE && status != STATUS_PARTLY_USABLE;
+    }
+}
+
 std::string messageOf(const Change& change)
 {
     const std::string node = IC::pst[change.node->getSensor()];
@@ -188,11 +201,10 @@ const Trouble* troubleOf(const IC::Node& node)
 std::vector<IC::Alert> alertsOf(const Nodes& nodes)
 {
     std::vector<IC::Alert> alerts;
-    std::map<std::string, unsigned int> statuses;
     for (const auto& node : nodes) {
-        const unsigned int status = statuses[node->getPath()] = node->getStatus();
+        const unsigned int status = node->getStatus();
         for (const Trouble* trouble : troublesOf(*node))
-            if (trouble->status != STATUS_NOT_USABLE || statuses[node->getParent()] != STATUS_NOT_USABLE)
+            if (isToldOf(*node, trouble->status))
                 alerts.emplace_back(trouble->severity, trouble->alertClass,
                                     std::vector<std::string> {node->getPath()}, status,
                                     IC::pst[node->getSensor()] + ": " + trouble->words);

@@ -27,7 +27,8 @@ struct Trouble {
 std::vector<const Trouble*> troublesOf(const IC::Node& node);  // in the order of the table, the worst first
 const Trouble* troubleOf(const IC::Node& node);                // the worst, or null
 
-// One for each trouble of each node. A node that the system may not use gets none if the same holds for its parent.
+// One for each trouble of each node. Of the parts that the system may not use, only CPUs, memory arrays and the machine
+// get one.
 std::vector<IC::Alert> alertsOf(const Nodes& nodes);
 
 // One alert for each change.

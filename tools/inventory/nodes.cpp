@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
+#include <new>
+#include <set>
 
 #include "mapping.h"
 #include "values.h"
@@ -219,6 +221,82 @@ IC::Number number32(int number)
     return static_cast<ZQ::Uint32>(std::max(number, 0));
 }
 
+std::vector<hwloc_obj_t> objectsOf(hwloc_topology_t topology, hwloc_obj_type_t type)
+{
+    std::vector<hwloc_obj_t> objects;
+    for (hwloc_obj_t object = nullptr;
+         (object = hwloc_get_next_obj_by_type(topology, type, object)) != nullptr;)
+        objects.push_back(object);
+    return objects;
+}
+
+ZQ::Uint32 weightOf(hwloc_const_bitmap_t set)
+{
+    return static_cast<ZQ::Uint32>(std::max(hwloc_bitmap_weight(set), 0));
+}
+
+using Bitmap = std::unique_ptr<hwloc_bitmap_s, decltype(&hwloc_bitmap_free)>;
+
+Bitmap copyOf(hwloc_const_bitmap_t set)
+{
+    Bitmap copy(set == nullptr ? hwloc_bitmap_alloc() : hwloc_bitmap_dup(set), hwloc_bitmap_free);
+    if (!copy)
+        throw std::bad_alloc();
+    return copy;
+}
+
+// What is there, but not both in the tree and allowed. A null set is empty.
+Bitmap unusableOf(hwloc_const_bitmap_t there, hwloc_const_bitmap_t inTree, hwloc_const_bitmap_t allowed)
+{
+    Bitmap unusable = copyOf(inTree);
+    hwloc_bitmap_and(unusable.get(), unusable.get(), allowed);
+    hwloc_bitmap_andnot(unusable.get(), copyOf(there).get(), unusable.get());
+    return unusable;
+}
+
+// What a package or the machine has and the system may not use, in the tree of objects or not.
+struct Unusable {
+    ZQ::Uint32 threads = 0;
+    ZQ::Uint32 cores = 0;
+    ZQ::Uint32 cpus = 0;
+    ZQ::Uint32 memoryArrays = 0;
+    bool elsewhere = false;  // threads outside the packages, or memory arrays that are not in the tree
+};
+
+Unusable countUnusable(const Subject& subject)
+{
+    const hwloc_obj* const object = subject.object;
+    const hwloc_topology_t topology = subject.topology;
+    Unusable count;
+    const Bitmap threads =
+        unusableOf(object->complete_cpuset, object->cpuset, hwloc_topology_get_allowed_cpuset(topology));
+    count.threads = weightOf(threads.get());
+
+    // Threads of cores that are not in the tree are taken for cores with as many threads as the largest core.
+    const Bitmap gone = copyOf(threads.get());
+    ZQ::Uint32 largest = 0;
+    for (hwloc_obj_t core : objectsOf(topology, HWLOC_OBJ_CORE)) {
+        largest = std::max(largest, weightOf(core->complete_cpuset));
+        count.cores += hwloc_bitmap_isincluded(core->complete_cpuset, threads.get()) != 0 ? 1 : 0;
+        hwloc_bitmap_andnot(gone.get(), gone.get(), core->complete_cpuset);
+    }
+    if (largest != 0)
+        count.cores += (weightOf(gone.get()) + largest - 1) / largest;
+
+    const Bitmap outside = copyOf(threads.get());
+    for (hwloc_obj_t package : objectsOf(topology, HWLOC_OBJ_PACKAGE)) {
+        count.cpus += hwloc_bitmap_isincluded(package->complete_cpuset, threads.get()) != 0 ? 1 : 0;
+        hwloc_bitmap_andnot(outside.get(), outside.get(), package->complete_cpuset);
+    }
+    const Bitmap memory =
+        unusableOf(object->complete_nodeset, object->nodeset, hwloc_topology_get_allowed_nodeset(topology));
+    count.memoryArrays = weightOf(memory.get());
+    for (hwloc_obj_t array : objectsOf(topology, HWLOC_OBJ_NUMANODE))
+        hwloc_bitmap_andnot(memory.get(), memory.get(), array->complete_nodeset);
+    count.elsewhere = hwloc_bitmap_iszero(outside.get()) == 0 || hwloc_bitmap_iszero(memory.get()) == 0;
+    return count;
+}
+
 IC::Number now()
 {
     // In whole seconds, for a short text.
@@ -280,26 +358,57 @@ Component::Component(const Site& site) : Node(site.sensor)
     if (!parent.empty())
         put(KEY_PARENT, IC::Number(site.above));
     put(KEY_LABEL, std::string(), false);  // for the operator to write
+}
 
-    const hwloc_obj* const object = site.object;
-    if (object == nullptr)
-        return;
+Component::Component(const Subject& subject) : Component(static_cast<const Site&>(subject))
+{
+    const hwloc_obj_t object = subject.object;
     const bool ofMachine = object->type == HWLOC_OBJ_MACHINE;
-    addFacts(object->infos, object->infos_count, ofMachine);
-    if (ofMachine && site.sensor != SENSOR_COMPUTER)
+    // A driver knows its device better than the bus does: its facts come first.
+    if (object->type == HWLOC_OBJ_PCI_DEVICE)
+        addViews(subject);
+    addFacts(object, ofMachine);
+    if (ofMachine && subject.sensor != SENSOR_COMPUTER)
         return;  // the rest is about the machine, not about a part of it
+    if (object->type != HWLOC_OBJ_PCI_DEVICE)
+        addViews(subject);
     if (object->name != nullptr)
         put(KEY_NAME, std::string(object->name));
-    if (object->subtype != nullptr)
-        put(KEY_SUBTYPE, std::string(object->subtype));
     if (object->os_index != HWLOC_UNKNOWN_INDEX)
         put(KEY_INDEX, IC::Number(object->os_index));
+    addThreads(subject);
+}
 
+void Component::addViews(const Subject& subject)
+{
+    std::vector<hwloc_obj_t> all = subject.views;
+    if (subject.object->type == HWLOC_OBJ_OS_DEVICE)
+        all.insert(all.begin(), subject.object);
+    std::set<std::string> names;
+    ZQ::Uint64 memory = 0;
+    for (hwloc_obj_t view : all) {
+        if (view->name != nullptr)
+            names.insert(view->name);
+        if (view != subject.object)
+            addFacts(view);
+        for (const char* name : {"CXLRAMSize", "CXLPMEMSize"})
+            if (const char* text = hwloc_obj_get_info_by_name(view, name); text != nullptr)
+                memory += sizeInBytes(text).value_or(0);
+    }
+    if (memory != 0 && properties.count(KEY_SIZE) == 0)
+        put(KEY_SIZE, IC::Number(memory));
+    if (!subject.views.empty())
+        put(KEY_VIEWS, IC::StringArray(names.begin(), names.end()));
+}
+
+void Component::addThreads(const Subject& subject)
+{
+    const hwloc_obj* const object = subject.object;
     const bool isMemory = hwloc_obj_type_is_memory(object->type) != 0;
     const auto* const all = isMemory ? object->complete_nodeset : object->complete_cpuset;
     if (all != nullptr && hwloc_bitmap_iszero(all) == 0) {
-        const auto* const allowed = isMemory ? hwloc_topology_get_allowed_nodeset(site.topology)
-                                             : hwloc_topology_get_allowed_cpuset(site.topology);
+        const auto* const allowed = isMemory ? hwloc_topology_get_allowed_nodeset(subject.topology)
+                                             : hwloc_topology_get_allowed_cpuset(subject.topology);
         const bool usable = hwloc_bitmap_intersects(all, allowed) != 0;
         put(KEY_USABLE, IC::Number(usable));
         become(usable ? STATUS_FINE : STATUS_NOT_USABLE);
@@ -312,6 +421,26 @@ Component::Component(const Site& site) : Node(site.sensor)
         threads.push_back(number32(thread));
     put(KEY_THREADS, number32(weight));
     put(KEY_CPU_SET, threads);
+}
+
+void Component::addFacts(hwloc_obj_t object, bool ofMachine)
+{
+    addFacts(object->infos, object->infos_count, ofMachine);
+    if (object->subtype == nullptr || (ofMachine && getSensor() != SENSOR_COMPUTER))
+        return;
+    const auto [subtype, isNew] =
+        properties.insert({KEY_SUBTYPE, IC::PropertyValue(std::string(object->subtype), true)});
+    if (!isNew && std::string(subtype->second) != object->subtype)
+        addOther(std::string("subtype=") + object->subtype);
+}
+
+void Component::addOther(const std::string& fact)
+{
+    IC::StringArray others;
+    if (const auto found = properties.find(KEY_OTHER_FACTS); found != properties.end())
+        others = found->second;
+    others.push_back(fact);
+    put(KEY_OTHER_FACTS, others);
 }
 
 void Component::addFacts(const hwloc_info_s* facts, unsigned int number, bool ofMachine)
@@ -327,9 +456,13 @@ void Component::addFacts(const hwloc_info_s* facts, unsigned int number, bool of
             fact.key = fact.key == KEY_MAKER ? KEY_CPU_MAKER
                 : fact.key == KEY_MODEL      ? KEY_CPU_MODEL
                                              : KEY_OTHER_FACTS;
-        // A fact that occurs again is one of the others.
-        if (fact.key == KEY_OTHER_FACTS || !properties.insert({fact.key, fact.value}).second)
-            others.push_back(std::string(facts[i].name) + '=' + facts[i].value);
+        // A fact that says something else than one before is one of the others.
+        if (fact.key != KEY_OTHER_FACTS) {
+            const auto [known, isNew] = properties.insert({fact.key, fact.value});
+            if (isNew || std::string(known->second) == std::string(fact.value))
+                continue;
+        }
+        others.push_back(std::string(facts[i].name) + '=' + facts[i].value);
     }
     if (!others.empty())
         put(KEY_OTHER_FACTS, others);
@@ -363,51 +496,67 @@ std::string Component::size() const
     return bytes == 0 ? "" : sizeInWords(bytes);
 }
 
-Machine::Machine(const Site& site) : Component(site)
+Machine::Machine(const Subject& subject) : Component(subject)
 {
     put(KEY_READ_AT, now());
-    put(KEY_SIZE, number64(site.object->total_memory));
-    put(KEY_CPUS, number32(hwloc_get_nbobjs_by_type(site.topology, HWLOC_OBJ_PACKAGE)));
-    put(KEY_CORES, number32(hwloc_get_nbobjs_by_type(site.topology, HWLOC_OBJ_CORE)));
+    put(KEY_SIZE, number64(subject.object->total_memory));
+    put(KEY_CPUS, number32(hwloc_get_nbobjs_by_type(subject.topology, HWLOC_OBJ_PACKAGE)));
+    put(KEY_CORES, number32(hwloc_get_nbobjs_by_type(subject.topology, HWLOC_OBJ_CORE)));
+    const Unusable unusable = countUnusable(subject);
+    put(KEY_UNUSABLE_THREADS, IC::Number(unusable.threads));
+    put(KEY_UNUSABLE_CORES, IC::Number(unusable.cores));
+    put(KEY_UNUSABLE_CPUS, IC::Number(unusable.cpus));
+    put(KEY_UNUSABLE_MEMORY_ARRAYS, IC::Number(unusable.memoryArrays));
+    // What a CPU or a memory array lacks is its own trouble.
+    if (unusable.elsewhere)
+        become(STATUS_PARTLY_USABLE);
     describe({product(), "CPUs: " + words(KEY_CPUS), "cores: " + words(KEY_CORES),
               size().empty() ? "" : "memory: " + size()});
 }
 
-MachinePart::MachinePart(const Site& site) : Component(site)
+MachinePart::MachinePart(const Subject& subject) : Component(subject)
 {
     if (const auto number = version(words(KEY_REVISION)))
         put(KEY_VERSION, IC::Number(*number));
     describe({told(product() + ' ' + words(KEY_REVISION)), words(KEY_RELEASED).substr(0, 10)});  // the day
 }
 
-Processor::Processor(const Site& site) : Component(site)
+Processor::Processor(const Subject& subject) : Component(subject)
 {
     put(KEY_CORES,
-        number32(hwloc_get_nbobjs_inside_cpuset_by_type(site.topology, site.object->cpuset, HWLOC_OBJ_CORE)));
+        number32(hwloc_get_nbobjs_inside_cpuset_by_type(subject.topology, subject.object->cpuset,
+                                                        HWLOC_OBJ_CORE)));
+    if (subject.object->type == HWLOC_OBJ_PACKAGE) {
+        const Unusable unusable = countUnusable(subject);
+        put(KEY_UNUSABLE_THREADS, IC::Number(unusable.threads));
+        put(KEY_UNUSABLE_CORES, IC::Number(unusable.cores));
+        if (unusable.threads != 0 && status == STATUS_INITIAL)
+            become(STATUS_PARTLY_USABLE);
+    }
     describe({words(KEY_MODEL), "cores: " + words(KEY_CORES)});
 }
 
-Core::Core(const Site& site) : Component(site)
+Core::Core(const Subject& subject) : Component(subject)
 {
     // The facts that all cores of this kind share.
     hwloc_info_s* facts = nullptr;
     unsigned int number = 0;
-    const int kind = hwloc_cpukinds_get_by_cpuset(site.topology, site.object->cpuset, 0);
+    const int kind = hwloc_cpukinds_get_by_cpuset(subject.topology, subject.object->cpuset, 0);
     if (kind >= 0)
-        hwloc_cpukinds_get_info(site.topology, static_cast<unsigned int>(kind), nullptr, nullptr, &number,
+        hwloc_cpukinds_get_info(subject.topology, static_cast<unsigned int>(kind), nullptr, nullptr, &number,
                                 &facts, 0);
-    addFacts(facts, number, false);
-    const auto* const allowed = hwloc_topology_get_allowed_cpuset(site.topology);
-    if (status == STATUS_INITIAL && hwloc_bitmap_isincluded(site.object->complete_cpuset, allowed) == 0)
+    addFacts(facts, number);
+    const auto* const allowed = hwloc_topology_get_allowed_cpuset(subject.topology);
+    if (status == STATUS_INITIAL && hwloc_bitmap_isincluded(subject.object->complete_cpuset, allowed) == 0)
         become(STATUS_PARTLY_USABLE);
     const std::string frequency = words(KEY_FREQUENCY);
-    describe({"number " + words(KEY_INDEX), "threads: " + words(KEY_THREADS),
+    describe({words(KEY_INDEX).empty() ? "" : "number " + words(KEY_INDEX), "threads: " + words(KEY_THREADS),
               frequency.empty() ? "" : frequency + " MHz"});
 }
 
-Cache::Cache(const Site& site) : Component(site)
+Cache::Cache(const Subject& subject) : Component(subject)
 {
-    const auto& cache = site.object->attr->cache;
+    const auto& cache = subject.object->attr->cache;
     const unsigned int kind = codeOf(cache.type);
     put(KEY_SIZE, number64(cache.size));
     put(KEY_LEVEL, IC::Number(cache.depth));
@@ -420,9 +569,9 @@ Cache::Cache(const Site& site) : Component(site)
                                                         : ""});
 }
 
-MemoryArray::MemoryArray(const Site& site) : Component(site)
+MemoryArray::MemoryArray(const Subject& subject) : Component(subject)
 {
-    const auto& memory = site.object->attr->numanode;
+    const auto& memory = subject.object->attr->numanode;
     IC::NumberArray sizes;
     IC::NumberArray counts;
     for (unsigned int i = 0; i < memory.page_types_len; ++i) {
@@ -435,25 +584,25 @@ MemoryArray::MemoryArray(const Site& site) : Component(site)
     describe({size()});
 }
 
-MemoryModule::MemoryModule(const Site& site) : Component(site)
+MemoryModule::MemoryModule(const Subject& subject) : Component(subject)
 {
     if (size().empty())
         become(STATUS_SIZE_UNKNOWN);
     describe({words(KEY_PART_NUMBER), size()});
 }
 
-PciDevice::PciDevice(const Site& site) : Component(site)
+PciDevice::PciDevice(const Subject& subject) : Component(subject)
 {
-    const auto& device = site.object->attr->pcidev;
+    const auto& device = subject.object->attr->pcidev;
     char ids[16];
     std::snprintf(ids, sizeof ids, "%04hx:%04hx", device.vendor_id, device.device_id);
     const double speed = device.linkspeed;
-    put(KEY_PCI_ADDRESS, pciAddress(site.object));
+    put(KEY_PCI_ADDRESS, pciAddress(subject.object));
     put(KEY_PCI_CLASS, IC::EnumValue(device.class_id));
     put(KEY_PCI_DEVICE, std::string(ids));
     put(KEY_LINK_SPEED,
         speed > 0 && std::isfinite(speed) ? IC::Number(speed) : IC::Number(IC::Number::KIND_NAN));
-    describe({product().empty() ? ids : product()});
+    describe({product().empty() ? ids : product(), size()});
 }
 
 std::string pciAddress(hwloc_obj_t object)
@@ -470,10 +619,10 @@ Slot::Slot(const Site& site, const std::string& name) : Component(site)
     put(KEY_LOCATION, name);
 }
 
-Device::Device(const Site& site) : Component(site)
+Device::Device(const Subject& subject) : Component(subject)
 {
     // As in the export, because with colons it is easier to read than the property's text.
-    const char* address = hwloc_obj_get_info_by_name(site.object, "Address");
+    const char* address = hwloc_obj_get_info_by_name(subject.object, "Address");
     describe({product(), size(), address == nullptr ? "" : told(address)});
 }
 

@@ -165,8 +165,14 @@ struct Site {
     std::string parent;
     IC::NodeRef self {};  // the references to this node and to its parent
     IC::NodeRef above {};
+};
+
+// A site of which hwloc knows more. Valid while the topology is loaded.
+struct Subject : Site {
     hwloc_topology_t topology = nullptr;
-    hwloc_obj_t object = nullptr;  // null if hwloc has none for the node
+    hwloc_obj_t object = nullptr;
+    std::vector<hwloc_obj_t>
+        views;  // the operating system's devices that are this device, seen by its drivers
 };
 
 // The properties that all nodes have, and those that hwloc gives for any object: name, number, threads, whether
@@ -174,6 +180,7 @@ struct Site {
 class Component : public IC::Node {
 public:
     explicit Component(const Site& site);
+    explicit Component(const Subject& subject);
 
 protected:
     template <class T>
@@ -184,26 +191,32 @@ protected:
         properties.insert_or_assign(key, IC::PropertyValue(value, readOnly));
     }
     void become(Status newStatus) { status = static_cast<StatusType>(newStatus); }
-    void addFacts(const hwloc_info_s* facts, unsigned int number, bool ofMachine);
+    void addFacts(const hwloc_info_s* facts, unsigned int number, bool ofMachine = false);
+    void addFacts(hwloc_obj_t object, bool ofMachine = false);
     // Sets the description: the pieces, without empty ones, separated by commas.
     void describe(const std::vector<std::string>& pieces);
 
     std::string words(Key key) const;  // the property's text, "" if there is none
     std::string product() const;       // maker and model
     std::string size() const;
+
+private:
+    void addOther(const std::string& fact);
+    void addViews(const Subject& subject);
+    void addThreads(const Subject& subject);
 };
 
 // clang-format off
-struct Machine : Component { explicit Machine(const Site& site); };
-struct MachinePart : Component { explicit MachinePart(const Site& site); };  // chassis, planar, BIOS, system
-struct Processor : Component { explicit Processor(const Site& site); };      // also a die, a group of cores
-struct Core : Component { explicit Core(const Site& site); };
-struct Cache : Component { explicit Cache(const Site& site); };
-struct MemoryArray : Component { explicit MemoryArray(const Site& site); };
-struct MemoryModule : Component { explicit MemoryModule(const Site& site); };
-struct PciDevice : Component { explicit PciDevice(const Site& site); };
+struct Machine : Component { explicit Machine(const Subject& subject); };
+struct MachinePart : Component { explicit MachinePart(const Subject& subject); };  // chassis, planar, BIOS, system
+struct Processor : Component { explicit Processor(const Subject& subject); };      // also a die, a group of cores
+struct Core : Component { explicit Core(const Subject& subject); };
+struct Cache : Component { explicit Cache(const Subject& subject); };
+struct MemoryArray : Component { explicit MemoryArray(const Subject& subject); };
+struct MemoryModule : Component { explicit MemoryModule(const Subject& subject); };
+struct PciDevice : Component { explicit PciDevice(const Subject& subject); };
 struct Slot : Component { Slot(const Site& site, const std::string& name); };
-struct Device : Component { explicit Device(const Site& site); };  // a device of the operating system
+struct Device : Component { explicit Device(const Subject& subject); };  // a device of the operating system
 // clang-format on
 
 std::string pciAddress(hwloc_obj_t object);  // "0000:02:00.0"

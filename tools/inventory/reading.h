@@ -16,19 +16,25 @@ struct BadInput : std::runtime_error {
     using std::runtime_error::runtime_error;
 };
 
-// The nodes, each after its parent. Paths are unique, and the same machine always gets the same paths. In a
-// name, each byte but letters, digits and -._: becomes % and two hexadecimal digits.
+// The nodes, each after its parent. Paths are unique, and the same machine always gets the same paths. A node's path
+// need not begin with its parent's: see the manual page about paths. In a name, each byte but letters, digits and -._: becomes % and two hexadecimal digits.
 struct Inventory {
     std::vector<std::unique_ptr<IC::Node>> nodes;
     Site machine;
 
-    // The site of a new node below `parent`. A name that is taken gets "#2" and so on.
+    // The site of a new node below `parent`, whose path lies below the path `place`, as a rule the parent's. A name of
+    // more than 64 bytes is cut off, and a digest of it follows. A path that is taken gets "#2" and so on.
     Site site(const Site& parent, IC::Node::SensorType sensor, std::string_view name);
+    Site site(const Site& parent, IC::Node::SensorType sensor, std::string_view name,
+              const std::string& place, const std::string& mark = {});
 
 private:
     std::map<std::string, unsigned int> taken_;
     std::map<IC::Node::SensorType, unsigned int> ids_;
 };
+
+// The name of a memory module in paths: by its place and, if that is not unique on a board, by its bank.
+std::string moduleName(const std::string& location, const std::string& bank);
 
 Inventory readThisMachine();
 Inventory readExport(const std::string& xml);   // throws BadInput

@@ -192,6 +192,8 @@ std::string toldIdentity(std::string_view text)
 
 std::string sizeInWords(ZQ::Uint64 bytes)
 {
+    if (bytes == 1)
+        return "1 byte";
     static const char* const units[] = {"bytes", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"};
     auto size = static_cast<double>(bytes);
     std::size_t unit = 0;

@@ -95,13 +95,13 @@ TEST_F(InventoryTerminal, HasColoursAndLines)
     EXPECT_EQ(outcome.status, 0);
     EXPECT_THAT(outcome.out,
                 StartsWith("\x1b[1mComputer\x1b[0m machine: One, CPUs: 0, cores: 0\r\n"
-                           "├── \x1b[32mMemory Array\x1b[0m memory0\r\n"
+                           "├── \x1b[32mMemory Array\x1b[0m numa-0\r\n"
                            "├── \x1b[33mDisk Controller\x1b[0m storage-0000:01:00.0: 8086:1d02\r\n"
                            "│   └── \x1b[33mHard Drive\x1b[0m sda\r\n"
-                           "└── \x1b[32mDIMM\x1b[0m dimm0\x1b[31m -- its size is unknown\x1b[0m\r\n"
+                           "└── \x1b[32mDIMM\x1b[0m dimm\x1b[31m -- its size is unknown\x1b[0m\r\n"
                            "\r\n"
                            "Alerts: 1\r\n"
-                           "  \x1b[33m/machine/dimm0, DIMM: its size is unknown\x1b[0m\r\n"));
+                           "  \x1b[33m/machine/dimm, DIMM: its size is unknown\x1b[0m\r\n"));
 }
 
 TEST_F(InventoryTerminal, HasNoColoursIfTheyAreTurnedOff)
@@ -110,13 +110,13 @@ TEST_F(InventoryTerminal, HasNoColoursIfTheyAreTurnedOff)
         SCOPED_TRACE(setting);
         EXPECT_THAT(run({"LC_ALL=C.UTF-8", setting}, {file}).out,
                     StartsWith("Computer machine: One, CPUs: 0, cores: 0\r\n"
-                               "├── Memory Array memory0\r\n"
+                               "├── Memory Array numa-0\r\n"
                                "├── Disk Controller storage-0000:01:00.0: 8086:1d02\r\n"
                                "│   └── Hard Drive sda\r\n"
-                               "└── DIMM dimm0 -- its size is unknown\r\n"
+                               "└── DIMM dimm -- its size is unknown\r\n"
                                "\r\n"
                                "Alerts: 1\r\n"
-                               "  /machine/dimm0, DIMM: its size is unknown\r\n"));
+                               "  /machine/dimm, DIMM: its size is unknown\r\n"));
     }
     EXPECT_THAT(run({"LC_ALL=C.UTF-8", "NO_COLOR="}, {file}).out, StartsWith("\x1b[1mComputer"));
 }
@@ -126,7 +126,7 @@ TEST_F(InventoryTerminal, HasAsciiLinesIfItIsNotUtf8)
     EXPECT_THAT(run({"LC_ALL=C", "NO_COLOR=1"}, {"--properties", "--log", file}).out,
                 testing::MatchesRegex("Node 2f6d616368696e65 : 40, status = 0\r\n"
                                       "\\|     \\[1 = Computer:0\\] this node\r\n(.|\n)*"
-                                      "\\|-- Node 2f6d616368696e652f6d656d6f727930 : 32, status = 0\r\n"
+                                      "\\|-- Node 2f6d616368696e652f6e756d612d30 : 32, status = 0\r\n"
                                       "\\|         \\[1 = Memory Array:0\\] this node\r\n(.|\n)*"
                                       "`-- Node [0-9a-f]* : 19, status = 3\r\n"
                                       "          \\[1 = DIMM:0\\] this node\r\n(.|\n)*"));
@@ -139,13 +139,13 @@ TEST_F(InventoryOutput, IsPlainTextInAPipe)
     unsetenv("LC_ALL");
     EXPECT_THAT(outcome.out,
                 StartsWith("Computer machine: One, CPUs: 0, cores: 0\n"
-                           "  Memory Array memory0\n"
+                           "  Memory Array numa-0\n"
                            "  Disk Controller storage-0000:01:00.0: 8086:1d02\n"
                            "    Hard Drive sda\n"
-                           "  DIMM dimm0 -- its size is unknown\n"
+                           "  DIMM dimm -- its size is unknown\n"
                            "\n"
                            "Alerts: 1\n"
-                           "  /machine/dimm0, DIMM: its size is unknown\n"));
+                           "  /machine/dimm, DIMM: its size is unknown\n"));
 }
 
 TEST_F(InventoryTerminal, HasColouredChanges)
