@@ -102,6 +102,7 @@ Inventory readFrom(const std::string& file)
 Inventory readHere()
 {
     Inventory inventory = readThisMachine();
+    readMemory(inventory);
     readSensors(inventory);
     return inventory;
 }

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
+#include <iterator>
 #include <new>
 #include <set>
 
@@ -510,8 +511,26 @@ Machine::Machine(const Subject& subject) : Component(subject)
     // What a CPU or a memory array lacks is its own trouble.
     if (unusable.elsewhere)
         become(STATUS_PARTLY_USABLE);
+    conclude();
+}
+
+void Machine::learn(const Facts& facts)
+{
+    const Lock lock(mutex);
+    properties.insert(facts.begin(), facts.end());
+    conclude();
+}
+
+void Machine::conclude()
+{
+    description.clear();
+    const std::string nodes = size();
+    const auto ofSystem = properties.find(KEY_SYSTEM_MEMORY);
+    const std::string system =
+        ofSystem == properties.end() ? "" : sizeInWords(ofSystem->second.operator ZQ::Uint64());
     describe({product(), "CPUs: " + words(KEY_CPUS), "cores: " + words(KEY_CORES),
-              size().empty() ? "" : "memory: " + size()});
+              nodes.empty() ? "" : "memory: " + nodes,
+              system.empty() ? "" : "memory of the system: " + system});
 }
 
 MachinePart::MachinePart(const Subject& subject) : Component(subject)
@@ -586,9 +605,35 @@ MemoryArray::MemoryArray(const Subject& subject) : Component(subject)
 
 MemoryModule::MemoryModule(const Subject& subject) : Component(subject)
 {
-    if (size().empty())
-        become(STATUS_SIZE_UNKNOWN);
-    describe({words(KEY_PART_NUMBER), size()});
+    conclude(true);
+}
+
+MemoryModule::MemoryModule(const Site& site, const Facts& facts) : Component(site)
+{
+    learn(facts, true);
+}
+
+void MemoryModule::learn(const Facts& facts, bool isPresent)
+{
+    const Lock lock(mutex);
+    properties.insert(facts.begin(), facts.end());
+    conclude(isPresent);
+}
+
+bool MemoryModule::isModule(const Facts& facts)
+{
+    constexpr Key signs[] = {KEY_MAKER, KEY_SERIAL_NUMBER, KEY_PART_NUMBER, KEY_MEMORY_TYPE, KEY_SPEED};
+    return std::any_of(std::begin(signs), std::end(signs),
+                       [&facts](Key key) { return facts.count(key) != 0; });
+}
+
+void MemoryModule::conclude(bool isPresent)
+{
+    become(isPresent && size().empty() && isModule(properties) ? STATUS_SIZE_UNKNOWN : STATUS_FINE);
+    const std::string speed = words(KEY_SPEED);
+    description.clear();
+    describe({product(), words(KEY_PART_NUMBER), size(), words(KEY_MEMORY_TYPE),
+              speed.empty() ? "" : speed + " MT/s"});
 }
 
 PciDevice::PciDevice(const Subject& subject) : Component(subject)

@@ -4,6 +4,7 @@
 #include <hwloc.h>
 
 #include <cstring>
+#include <map>
 #include <memory>
 #include <string>
 #include <type_traits>
@@ -179,6 +180,8 @@ struct Subject : Site {
 // the system may use it, facts.
 class Component : public IC::Node {
 public:
+    using Facts = std::map<unsigned int, IC::PropertyValue>;
+
     explicit Component(const Site& site);
     explicit Component(const Subject& subject);
 
@@ -206,14 +209,34 @@ private:
     void addThreads(const Subject& subject);
 };
 
+class Machine : public Component {
+public:
+    explicit Machine(const Subject& subject);
+    void learn(const Facts& facts);  // adds what another source than hwloc knows
+
+private:
+    void conclude();
+};
+
+class MemoryModule : public Component {
+public:
+    explicit MemoryModule(const Subject& subject);
+    MemoryModule(const Site& site, const Facts& facts);
+    // True if the facts say, without the size, that there is a module and not only a slot.
+    static bool isModule(const Facts& facts);
+    // Adds what another source than hwloc knows. If it knows that the slot is empty, nothing is wrong with the slot.
+    void learn(const Facts& facts, bool isPresent);
+
+private:
+    void conclude(bool isPresent);
+};
+
 // clang-format off
-struct Machine : Component { explicit Machine(const Subject& subject); };
 struct MachinePart : Component { explicit MachinePart(const Subject& subject); };  // chassis, planar, BIOS, system
 struct Processor : Component { explicit Processor(const Subject& subject); };      // also a die, a group of cores
 struct Core : Component { explicit Core(const Subject& subject); };
 struct Cache : Component { explicit Cache(const Subject& subject); };
 struct MemoryArray : Component { explicit MemoryArray(const Subject& subject); };
-struct MemoryModule : Component { explicit MemoryModule(const Subject& subject); };
 struct PciDevice : Component { explicit PciDevice(const Subject& subject); };
 struct Slot : Component { Slot(const Site& site, const std::string& name); };
 struct Device : Component { explicit Device(const Subject& subject); };  // a device of the operating system

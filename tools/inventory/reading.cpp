@@ -435,6 +435,8 @@ private:
             return '-' + kindOf(object);
         if (object->type != HWLOC_OBJ_OS_DEVICE && object->type != HWLOC_OBJ_MISC)
             return "";
+        if (object->type == HWLOC_OBJ_MISC && object->os_index != HWLOC_UNKNOWN_INDEX)
+            return '-' + std::to_string(object->os_index);  // as memory.cpp does: udev counts as hwloc does
         std::string facts;
         for (unsigned int i = 0; i < object->infos_count; ++i)
             facts += std::string(object->infos[i].name) + '=' + object->infos[i].value + '\n';
@@ -460,6 +462,7 @@ private:
 Inventory readFrom(const Topology& topology)
 {
     Inventory inventory;
+    inventory.isThisSystem = hwloc_topology_is_thissystem(topology.get()) != 0;
     std::vector<Site> sites;
     for (const Plan& plan : Planner(topology.get()).plans) {
         const bool isMachine = sites.empty();
@@ -481,14 +484,6 @@ Inventory readFrom(const Topology& topology)
 }
 
 }  // namespace
-
-std::string moduleName(const std::string& location, const std::string& bank)
-{
-    std::string name = "dimm";
-    for (const std::string& part : {bank, location})
-        name += part.empty() ? "" : '-' + part;
-    return name;
-}
 
 Site Inventory::site(const Site& parent, IC::Node::SensorType sensor, std::string_view name)
 {
@@ -518,6 +513,14 @@ Site Inventory::site(const Site& parent, IC::Node::SensorType sensor, std::strin
     site.self = {sensor, ids_[sensor]++};
     site.above = parent.self;
     return site;
+}
+
+std::string moduleName(const std::string& location, const std::string& bank)
+{
+    std::string name = "dimm";
+    for (const std::string& part : {bank, location})
+        name += part.empty() ? "" : '-' + part;
+    return name;
 }
 
 Inventory readThisMachine()

@@ -1,5 +1,5 @@
-// Reads this machine, or the XML export of a machine, into nodes: with hwloc (reading.cpp) and libsensors
-// (sensors.cpp).
+// Reads this machine, or the XML export of a machine, into nodes: with hwloc (reading.cpp), udev (memory.cpp) and
+// libsensors (sensors.cpp).
 #pragma once
 
 #include <map>
@@ -21,6 +21,7 @@ struct BadInput : std::runtime_error {
 struct Inventory {
     std::vector<std::unique_ptr<IC::Node>> nodes;
     Site machine;
+    bool isThisSystem = false;  // false too if the environment makes hwloc describe another machine
 
     // The site of a new node below `parent`, whose path lies below the path `place`, as a rule the parent's. A name of
     // more than 64 bytes is cut off, and a digest of it follows. A path that is taken gets "#2" and so on.
@@ -40,6 +41,7 @@ Inventory readThisMachine();
 Inventory readExport(const std::string& xml);   // throws BadInput
 std::string readFile(const std::string& name);  // throws BadInput
 
+void readMemory(Inventory& inventory);   // adds what udev and the kernel know of the memory of this machine
 void readSensors(Inventory& inventory);  // adds the sensors of this machine
 
 }  // namespace inventory

@@ -549,13 +549,26 @@ TEST(InventoryAlerts, AreRaisedForMemoryModulesOfUnknownSize)
 {
     for (const char* size : {"", "0", "Unknown", "-1"}) {
         SCOPED_TRACE(size);
-        const Inventory inventory = readExport(machineWith(
-            "", "<object type=\"Misc\" subtype=\"MemoryModule\">" + info("Size", size) + "</object>"));
+        const Inventory inventory =
+            readExport(machineWith("",
+                                   "<object type=\"Misc\" subtype=\"MemoryModule\">" + info("Size", size)
+                                       + info("PartNumber", "HMT351R7CFR8C-PB") + "</object>"));
         const auto alerts = alertsOf(inventory.nodes);
         ASSERT_EQ(alerts.size(), 1u);
         EXPECT_EQ(alerts[0].getStatus(), STATUS_SIZE_UNKNOWN);
         EXPECT_THAT(alerts[0].getNodePaths(), ElementsAre("/machine/dimm"));
     }
+}
+
+TEST(InventoryAlerts, AreNotRaisedForEmptyMemorySlots)
+{
+    const Inventory inventory = readExport(
+        machineWith("",
+                    "<object type=\"Misc\" subtype=\"MemoryModule\">" + info("DeviceLocation", "A1")
+                        + info("Vendor", "NO DIMM") + info("SerialNumber", "00000000")
+                        + info("PartNumber", "Not Specified") + info("Size", "0") + "</object>"));
+    EXPECT_EQ(nodeAt(inventory, "/machine/dimm-A1").getStatus(), STATUS_FINE);
+    EXPECT_EQ(alertsOf(inventory.nodes).size(), 0u);
 }
 
 TEST(InventoryExports, CutOffAnywhereAreRefusedOrRead)
@@ -859,11 +872,13 @@ TEST_F(InventoryProgram, WritesPropertiesWithTheirNames)
 
 TEST_F(InventoryProgram, WritesAlerts)
 {
-    const std::string file =
-        folder.write("alert.xml", machineWith("", "<object type=\"Misc\" subtype=\"MemoryModule\"/>"));
+    const std::string file = folder.write("alert.xml",
+                                          machineWith("",
+                                                      "<object type=\"Misc\" subtype=\"MemoryModule\">"
+                                                          + info("PartNumber", "A1") + "</object>"));
     const Outcome outcome = run({file});
     EXPECT_EQ(outcome.status, 0);
-    EXPECT_THAT(outcome.out, HasSubstr("  DIMM dimm -- its size is unknown\n"));
+    EXPECT_THAT(outcome.out, HasSubstr("  DIMM dimm: A1 -- its size is unknown\n"));
     EXPECT_THAT(outcome.out,
                 HasSubstr("Alerts: 1\n  /machine/dimm, DIMM: its size is unknown\n"
                           "    Alert 1; 1; 3; DIMM: its size is unknown; "));
