@@ -187,8 +187,18 @@ TEST(InventoryChanges, BecomeAlertsWithASeverityAndAClass)
               "0 2 0 Fan: reading changed from 900 to 1000");
     EXPECT_EQ(alert(one(fan, {{KEY_LOWER_LIMIT, slow}}), one(fan, {{KEY_LOWER_LIMIT, fast}})),
               "1 2 0 Fan: lower limit changed from 900 to 1000");
-    EXPECT_EQ(alert(one(fan), one(fan, {}, STATUS_OUTSIDE_LIMITS)), "3 2 4 Fan: status changed from 0 to 4");
+    const Properties tooSlow {{KEY_READING, slow}, {KEY_LOWER_LIMIT, fast}};
+    EXPECT_EQ(alert(one(fan, tooSlow), one(fan, tooSlow, STATUS_OUTSIDE_LIMITS)),
+              "2 2 4 Fan: status changed from 0 to 4");
+    const Properties tooHot {{KEY_READING, fast}, {KEY_UPPER_CRITICAL, slow}};
+    EXPECT_EQ(alert(one(fan, tooHot), one(fan, tooHot, STATUS_OUTSIDE_LIMITS)),
+              "3 2 4 Fan: status changed from 0 to 4");
     EXPECT_EQ(alert(one(fan, {}, STATUS_FAULT), one(fan)), "0 2 0 Fan: status changed from 6 to 0");
+    const auto flagged = [&one](bool isSet) {
+        return one(fan, {{KEY_CRIT_ALARM, IC::Number(isSet)}}, STATUS_ALARM);
+    };
+    EXPECT_EQ(alert(flagged(false), flagged(true)),
+              "3 2 5 Fan: alarm of the upper critical limit changed from false to true");
     EXPECT_EQ(alert(one(cpu), one(cpu, {}, STATUS_PARTLY_USABLE)), "1 1 2 CPU: status changed from 0 to 2");
 }
 

@@ -53,9 +53,10 @@ protected:
     std::string file = folder.write(
         "machine.xml",
         machineOf(fact("DMIProductName", "One"),
-                  "<object type=\"Misc\" subtype=\"MemoryModule\"/>"
-                  "<object type=\"PCIDev\" pci_busid=\"0000:01:00.0\" pci_type=\"0106 [8086:1d02]"
-                  " [0000:0000] 01\"><object type=\"OSDev\" osdev_type=\"0\" name=\"sda\"/></object>"));
+                  "<object type=\"Misc\" subtype=\"MemoryModule\">" + fact("SerialNumber", "7")
+                      + "</object>"
+                        "<object type=\"PCIDev\" pci_busid=\"0000:01:00.0\" pci_type=\"0106 [8086:1d02]"
+                        " [0000:0000] 01\"><object type=\"OSDev\" osdev_type=\"0\" name=\"sda\"/></object>"));
     std::string hostileText =
         "\xff\xfe&quot;\x01\x1b[2J]]&gt;&lt;/text&gt;&amp;amp;'\x7f\xed\xa0\x80\xc3\xa4";
     std::string hostile =
