@@ -26,6 +26,9 @@ constexpr Trouble troubles[] = {
     {Trouble::IN_STATUS, STATUS_NOT_USABLE, all, STATUS_NOT_USABLE, 2, CLASS_CONFIGURATION, "the system may not use it"},
     {Trouble::FLAG_SET, KEY_FAULT, all, STATUS_FAULT, 2, CLASS_ENVIRONMENT, "it reports a fault"},
     {Trouble::FLAG_SET, KEY_ALARM, all, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises an alarm"},
+    {Trouble::IN_STATUS, STATUS_OUTSIDE_LIMITS, all, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is outside its limits"},
+    {Trouble::IN_STATUS, STATUS_ALARM, all, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises an alarm"},
+    {Trouble::IN_STATUS, STATUS_FAULT, all, STATUS_FAULT, 2, CLASS_ENVIRONMENT, "it reports a fault"},
     {Trouble::BELOW, KEY_LOWER_LIMIT, fan, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is below its lower limit"},
     {Trouble::FLAG_SET, KEY_MIN_ALARM, fan, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises the alarm of its lower limit"},
     {Trouble::BELOW, KEY_LOWER_LIMIT, voltage, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is below its lower limit"},
@@ -40,6 +43,7 @@ constexpr Trouble troubles[] = {
     {Trouble::FLAG_SET, KEY_CAP_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises the alarm of its cap"},
     {Trouble::FLAG_SET, KEY_ALARM, intrusion, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "the chassis has been opened"},
     {Trouble::NO_READING, KEY_READING, all, STATUS_UNREAD, 1, CLASS_ENVIRONMENT, "it cannot be read"},
+    {Trouble::IN_STATUS, STATUS_UNREAD, all, STATUS_UNREAD, 1, CLASS_ENVIRONMENT, "it cannot be read"},
     {Trouble::IN_STATUS, STATUS_PARTLY_USABLE, all, STATUS_PARTLY_USABLE, 1, CLASS_CONFIGURATION, "the system may not use all of it"},
     {Trouble::IN_STATUS, STATUS_SIZE_UNKNOWN, all, STATUS_SIZE_UNKNOWN, 1, CLASS_CONFIGURATION, "its size is unknown"},
 };
@@ -189,6 +193,15 @@ std::vector<const Trouble*> troublesOf(const IC::Node& node)
     for (const Trouble& trouble : troubles)
         if (isSeen(trouble, status, properties) && concerns(trouble, node))
             found.push_back(&trouble);
+    // A sensor's limit, flag or reading says more than its status.
+    const bool isExplained = std::any_of(found.begin(), found.end(), [](const Trouble* trouble) {
+        return trouble->sign != Trouble::IN_STATUS;
+    });
+    const auto isVague = [](const Trouble* trouble) {
+        return trouble->sign == Trouble::IN_STATUS && trouble->status >= STATUS_OUTSIDE_LIMITS;
+    };
+    if (isExplained)
+        found.erase(std::remove_if(found.begin(), found.end(), isVague), found.end());
     return found;
 }
 

@@ -193,8 +193,9 @@ private:
 
     void judge()
     {
-        const Trouble* worst = troubleOf(*this);
-        become(worst == nullptr ? STATUS_FINE : worst->status);
+        become(STATUS_FINE);  // or the status itself would be a trouble
+        if (const Trouble* worst = troubleOf(*this))
+            become(worst->status);
     }
 };
 
