@@ -72,8 +72,6 @@ void limit(decltype(RLIMIT_AS) resource, rlim_t most)
     setrlimit(resource, &limits);
 }
 
-Inventory readFrom(const Topology& topology);
-
 // In the child process. The status tells whether the memory was enough.
 enum Trial : unsigned char { TRIAL_DONE, TRIAL_REFUSED, TRIAL_NO_MEMORY };
 [[noreturn]] void describeForTrial(const std::string& xml)
@@ -87,7 +85,7 @@ enum Trial : unsigned char { TRIAL_DONE, TRIAL_REFUSED, TRIAL_NO_MEMORY };
     std::signal(SIGALRM, SIG_DFL);
     alarm(secondsAtMost);
     try {
-        const Inventory inventory = readFrom(load(&xml));
+        const Inventory inventory = readTopology(load(&xml).get());
         std::ostringstream text;
         writeTree(text, inventory.nodes, {false, true});
         writeAlerts(text, alertsOf(inventory.nodes));
@@ -459,12 +457,14 @@ private:
     std::set<IC::Node::SensorType> parts_;
 };
 
-Inventory readFrom(const Topology& topology)
+}  // namespace
+
+Inventory readTopology(hwloc_topology_t topology)
 {
     Inventory inventory;
-    inventory.isThisSystem = hwloc_topology_is_thissystem(topology.get()) != 0;
+    inventory.isThisSystem = hwloc_topology_is_thissystem(topology) != 0;
     std::vector<Site> sites;
-    for (const Plan& plan : Planner(topology.get()).plans) {
+    for (const Plan& plan : Planner(topology).plans) {
         const bool isMachine = sites.empty();
         Subject subject;
         static_cast<Site&>(subject) =
@@ -474,7 +474,7 @@ Inventory readFrom(const Topology& topology)
         sites.push_back(subject);
         if (isMachine)
             inventory.machine = subject;
-        subject.topology = topology.get();
+        subject.topology = topology;
         subject.object = plan.object;
         subject.views = plan.views;
         inventory.nodes.push_back(plan.row == nullptr ? std::make_unique<Slot>(subject, plan.slot)
@@ -482,8 +482,6 @@ Inventory readFrom(const Topology& topology)
     }
     return inventory;
 }
-
-}  // namespace
 
 Site Inventory::site(const Site& parent, IC::Node::SensorType sensor, std::string_view name)
 {
@@ -525,13 +523,13 @@ std::string moduleName(const std::string& location, const std::string& bank)
 
 Inventory readThisMachine()
 {
-    return readFrom(load(nullptr));
+    return readTopology(load(nullptr).get());
 }
 
 Inventory readExport(const std::string& xml)
 {
     tryFirst(xml);
-    return readFrom(load(&xml));
+    return readTopology(load(&xml).get());
 }
 
 std::string readFile(const std::string& name)

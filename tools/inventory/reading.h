@@ -17,7 +17,8 @@ struct BadInput : std::runtime_error {
 };
 
 // The nodes, each after its parent. Paths are unique, and the same machine always gets the same paths. A node's path
-// need not begin with its parent's: see the manual page about paths. In a name, each byte but letters, digits and -._: becomes % and two hexadecimal digits.
+// need not begin with its parent's: see the manual page about paths. In a name, each byte but letters, digits and
+// -._: becomes % and two hexadecimal digits.
 struct Inventory {
     std::vector<std::unique_ptr<IC::Node>> nodes;
     Site machine;
@@ -38,6 +39,7 @@ private:
 std::string moduleName(const std::string& location, const std::string& bank);
 
 Inventory readThisMachine();
+Inventory readTopology(hwloc_topology_t topology);
 Inventory readExport(const std::string& xml);   // throws BadInput
 std::string readFile(const std::string& name);  // throws BadInput
 
