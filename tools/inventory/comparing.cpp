@@ -5,6 +5,7 @@
 #include <cmath>
 #include <map>
 #include <set>
+#include <tuple>
 
 #include "values.h"
 
@@ -26,7 +27,7 @@ public:
             nodes_.insert(node.get());
             IC::PropertyValue self("");
             if (node->getProperty(KEY_SELF, self).getStatus() == IC::Error::STATUS_SUCCESS)
-                paths_[std::string(self)] = node->getPath();
+                targets_[std::string(self)] = node.get();
         }
     }
 
@@ -37,36 +38,67 @@ public:
         return found == nodes_.end() || (*found)->getSensor() != node.getSensor() ? nullptr : *found;
     }
 
-    // The path of the node that a reference leads to; the reference's own text if there is no such node.
-    std::string target(const IC::Number& reference) const
+    // The node that a reference leads to, or null.
+    const IC::Node* target(const IC::Number& reference) const
     {
-        const auto found = paths_.find(std::string(reference));
-        return found == paths_.end() ? std::string(reference) : found->second;
+        const auto found = targets_.find(std::string(reference));
+        return found == targets_.end() ? nullptr : found->second;
     }
 
+    // A reference as the path of the node that it leads to; its own text if there is no such node.
     std::string textOf(const IC::PropertyValue& value) const
     {
         const bool isReference = value.getKind() == IC::PropertyValue::KIND_NUMBER
             && IC::Number(value).getKind() == IC::Number::KIND_NODEREF;
-        return isReference ? target(IC::Number(value)) : exactText(value);
+        const IC::Node* node = isReference ? target(IC::Number(value)) : nullptr;
+        return node == nullptr ? exactText(value) : node->getPath();
     }
 
 private:
     std::set<const IC::Node*, ByPath> nodes_;
-    std::map<std::string, std::string> paths_;
+    std::map<std::string, const IC::Node*> targets_;
 };
+
+// What a cache or a group of cores is, but for its name and its threads.
+struct Sort {
+    IC::Node::SensorType sensor;
+    std::string level;
+    std::string kind;
+    bool operator<(const Sort& other) const
+    {
+        return std::tie(sensor, level, kind) < std::tie(other.sensor, other.level, other.kind);
+    }
+};
+
+Sort sortOf(const IC::Node& node)
+{
+    IC::PropertyValue level("");
+    IC::PropertyValue kind("");
+    static_cast<void>(node.getProperty(KEY_LEVEL, level));
+    static_cast<void>(node.getProperty(KEY_CACHE_KIND, kind));
+    return {node.getSensor(), std::string(level), std::string(kind)};
+}
+
+IC::NumberArray threadsOf(const IC::Node& node)
+{
+    IC::PropertyValue threads(IC::NumberArray {});
+    static_cast<void>(node.getProperty(KEY_CPU_SET, threads));
+    return threads.getKind() == IC::PropertyValue::KIND_NUMBERARRAY ? threads.operator IC::NumberArray()
+                                                                    : IC::NumberArray {};
+}
 
 class Comparison {
 public:
     Comparison(const Nodes& before, const Nodes& after) : before_(before), after_(after)
     {
+        findRenamed(before, after);
         for (const auto& node : before)
-            if (const IC::Node* now = after_.find(*node))
+            if (const IC::Node* now = laterOf(*node); now != nullptr)
                 compare(*node, *now);
             else
                 add({Change::NODE, node.get(), 0, node->getDescription(), {}});
         for (const auto& node : after)
-            if (before_.find(*node) == nullptr)
+            if (earlierOf(*node) == nullptr)
                 add({Change::NODE, node.get(), 0, {}, node->getDescription()});
     }
 
@@ -74,6 +106,68 @@ public:
 
 private:
     void add(Change change) { changes_.push_back(std::move(change)); }
+
+    // Caches and groups are named by their lowest core or thread. One that has lost it or got a lower one is the same
+    // if its threads are some of the former ones, or all of them and more.
+    void findRenamed(const Nodes& before, const Nodes& after)
+    {
+        const auto mayBeRenamed = [](const IC::Node& node) {
+            return node.getSensor() == IC::Node::SENSOR_CACHE || node.getSensor() == IC::Node::SENSOR_GROUP;
+        };
+        std::map<std::pair<Sort, std::string>, std::vector<const IC::Node*>> byThread;
+        for (const auto& node : after)
+            if (mayBeRenamed(*node) && before_.find(*node) == nullptr)
+                for (const IC::Number& thread : threadsOf(*node))
+                    byThread[{sortOf(*node), std::string(thread)}].push_back(node.get());
+        if (byThread.empty())
+            return;
+        for (const auto& node : before) {
+            if (!mayBeRenamed(*node) || after_.find(*node) != nullptr)
+                continue;
+            const Sort sort = sortOf(*node);
+            const IC::NumberArray threads = threadsOf(*node);
+            std::map<const IC::Node*, std::size_t> shared;  // numbers of threads that both have
+            for (const IC::Number& thread : threads)
+                if (const auto found = byThread.find({sort, std::string(thread)}); found != byThread.end())
+                    for (const IC::Node* now : found->second)
+                        ++shared[now];
+            const IC::Node* best = nullptr;
+            for (const auto& [now, count] : shared)
+                if (earlier_.count(now) == 0 && count == std::min(threads.size(), threadsOf(*now).size())
+                    && (best == nullptr
+                        || std::make_pair(count, now->getPath())
+                            > std::make_pair(shared[best], best->getPath())))
+                    best = now;
+            if (best != nullptr) {
+                later_[node.get()] = best;
+                earlier_[best] = node.get();
+            }
+        }
+    }
+
+    const IC::Node* laterOf(const IC::Node& then) const
+    {
+        const auto renamed = later_.find(&then);
+        return renamed == later_.end() ? after_.find(then) : renamed->second;
+    }
+
+    const IC::Node* earlierOf(const IC::Node& now) const
+    {
+        const auto renamed = earlier_.find(&now);
+        return renamed == earlier_.end() ? before_.find(now) : renamed->second;
+    }
+
+    // Whether another parent only follows from a node that came or went.
+    bool followsFromParent(const IC::PropertyValue& then, const IC::PropertyValue& now) const
+    {
+        if (then.getKind() != IC::PropertyValue::KIND_NUMBER
+            || now.getKind() != IC::PropertyValue::KIND_NUMBER)
+            return false;
+        const IC::Node* former = before_.target(IC::Number(then));
+        const IC::Node* present = after_.target(IC::Number(now));
+        return (former != nullptr && laterOf(*former) == nullptr)
+            || (present != nullptr && earlierOf(*present) == nullptr);
+    }
 
     // Descriptions are not compared, because they are made from the properties.
     void compare(const IC::Node& then, const IC::Node& now)
@@ -90,7 +184,8 @@ private:
                 continue;
             if (found == current.end())
                 add({Change::PROPERTY, &now, key, before_.textOf(value), {}});
-            else if (!same(value, found->second))
+            else if (!same(value, found->second)
+                     && !(key == KEY_PARENT && followsFromParent(value, found->second)))
                 add(changed(now, key, value, found->second));
         }
         for (const auto& [key, value] : current)
@@ -111,8 +206,17 @@ private:
         if (a != b)
             return isNan(a) && isNan(b);
         if (a.getKind() == IC::Number::KIND_NODEREF)
-            return before_.target(a) == after_.target(b);
+            return isSameTarget(a, b);
         return exactText(a) == exactText(b);
+    }
+
+    bool isSameTarget(const IC::Number& a, const IC::Number& b) const
+    {
+        const IC::Node* former = before_.target(a);
+        const IC::Node* present = after_.target(b);
+        if (former == nullptr || present == nullptr)
+            return former == present && std::string(a) == std::string(b);
+        return laterOf(*former) == present;
     }
 
     // Texts, bytes and codes compare equal only if they are the same.
@@ -145,6 +249,8 @@ private:
 
     Side before_;
     Side after_;
+    std::map<const IC::Node*, const IC::Node*> later_;  // of caches and groups with another name
+    std::map<const IC::Node*, const IC::Node*> earlier_;
     std::vector<Change> changes_;
 };
 

@@ -18,7 +18,9 @@ struct Change {
     std::optional<std::string> to;    // nothing if it is gone
 };
 
-// In the order of the earlier nodes; new nodes come last. The time of reading is not compared.
+// In the order of the earlier nodes; new nodes come last. The time of reading is not compared. A cache or a group whose
+// name has changed with its lowest core is found by its threads. Another parent is no change if the former one is gone
+// or the present one is new.
 std::vector<Change> changesBetween(const Nodes& before, const Nodes& after);
 
 }  // namespace inventory
