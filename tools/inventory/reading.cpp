@@ -25,6 +25,17 @@
 
 namespace inventory {
 
+#if defined(__has_feature)
+#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer) || __has_feature(memory_sanitizer)
+#define INVENTORY_SANITIZED
+#endif
+#endif
+#if defined(INVENTORY_SANITIZED) || defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+const bool limitsMemory = false;
+#else
+const bool limitsMemory = true;
+#endif
+
 namespace {
 
 BadInput unreadable()
@@ -54,16 +65,6 @@ Topology load(const std::string* xml)
 constexpr unsigned int secondsAtMost = 10;
 constexpr rlim_t bytesAtMost = rlim_t {2} << 30;
 
-// A sanitizer reserves terabytes of addresses.
-#if defined(__has_feature)
-#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer) || __has_feature(memory_sanitizer)
-#define INVENTORY_SANITIZED
-#endif
-#endif
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#define INVENTORY_SANITIZED
-#endif
-
 void limit(decltype(RLIMIT_AS) resource, rlim_t most)
 {
     rlimit limits {};
@@ -78,9 +79,8 @@ enum Trial : unsigned char { TRIAL_DONE, TRIAL_REFUSED, TRIAL_NO_MEMORY };
 {
     limit(RLIMIT_CORE, 0);
     limit(RLIMIT_CPU, secondsAtMost);
-#ifndef INVENTORY_SANITIZED
-    limit(RLIMIT_AS, bytesAtMost);
-#endif
+    if (limitsMemory)
+        limit(RLIMIT_AS, bytesAtMost);
     dup2(open("/dev/null", O_WRONLY), STDERR_FILENO);
     std::signal(SIGALRM, SIG_DFL);
     alarm(secondsAtMost);

@@ -40,7 +40,9 @@ std::string moduleName(const std::string& location, const std::string& bank);
 
 Inventory readThisMachine();
 Inventory readTopology(hwloc_topology_t topology);
-Inventory readExport(const std::string& xml);   // throws BadInput
+// Throws BadInput if hwloc cannot read the export, or if it takes more than 10 s or 2 GiB to describe it.
+Inventory readExport(const std::string& xml);
+extern const bool limitsMemory;  // not under a sanitizer, which reserves terabytes of addresses
 std::string readFile(const std::string& name);  // throws BadInput
 
 void readMemory(Inventory& inventory);   // adds what udev and the kernel know of the memory of this machine

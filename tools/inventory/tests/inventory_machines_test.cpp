@@ -246,4 +246,192 @@ TEST(InventoryMachines, KeepThePathsAlsoWhereNumbersAreMissingOrOccurTwice)
     }
 }
 
+std::string textOf(const IC::Node& node, Key key)
+{
+    IC::PropertyValue value("");
+    static_cast<void>(node.getProperty(key, value));
+    return std::string(value);
+}
+
+// What tells a node from others, as far as its properties show it.
+std::string identityOf(const IC::Node& node)
+{
+    std::string text = IC::pst[node.getSensor()];
+    for (const Key key : {KEY_INDEX, KEY_NAME, KEY_LEVEL, KEY_CACHE_KIND, KEY_PCI_ADDRESS, KEY_CPU_SET})
+        text += '|' + textOf(node, key);
+    return text;
+}
+
+// The same from the object that the node describes.
+std::string identityOf(hwloc_obj_t object)
+{
+    std::string text = IC::pst[findRow(object)->sensor];
+    text += '|' + (object->os_index == HWLOC_UNKNOWN_INDEX ? "" : std::to_string(object->os_index));
+    text += '|' + std::string(object->name == nullptr ? "" : object->name) + '|';
+    const bool isCache = hwloc_obj_type_is_cache(object->type) != 0 || object->type == HWLOC_OBJ_MEMCACHE;
+    if (isCache)
+        text += std::to_string(object->attr->cache.depth) + '|'
+            + std::to_string(codeOf(object->attr->cache.type));
+    else
+        text += '|';
+    text += '|' + (object->type == HWLOC_OBJ_PCI_DEVICE ? pciAddress(object) : "") + '|';
+    if (object->cpuset != nullptr) {
+        std::string threads;
+        for (const unsigned int thread : setOf(object->cpuset))
+            threads += (threads.empty() ? "" : ", ") + std::to_string(thread);
+        text += '{' + threads + '}';
+    }
+    return text;
+}
+
+// Each object that has a sensor type and is no view of a PCI device, with the object around it that has one.
+void collect(hwloc_obj_t object, const std::string& parent, const hwloc_obj* device,
+             std::multiset<std::string>& all, std::multiset<std::string>& views)
+{
+    std::string around = parent;
+    if (object->type == HWLOC_OBJ_PCI_DEVICE)
+        device = findRow(object) == nullptr ? nullptr : object;
+    if (findRow(object) != nullptr && isView(object) && device != nullptr) {
+        views.insert(object->name);
+    } else if (findRow(object) != nullptr) {
+        around = identityOf(object);
+        all.insert(around + " in " + parent);
+    }
+    for (hwloc_obj_t list :
+         {object->first_child, object->memory_first_child, object->io_first_child, object->misc_first_child})
+        for (hwloc_obj_t child = list; child != nullptr; child = child->next_sibling)
+            collect(child, around, device, all, views);
+}
+
+TEST(InventoryMachines, HaveANodeForEachObjectUnderTheRightParent)
+{
+    const auto files = realMachines();
+    for (const std::string& file : files) {
+        SCOPED_TRACE(file);
+        const Topology topology = load(contentOf(file));
+        std::multiset<std::string> objects;
+        std::multiset<std::string> views;
+        collect(hwloc_get_root_obj(topology.get()), "", nullptr, objects, views);
+
+        std::multiset<std::string> described;
+        std::multiset<std::string> describedViews;
+        std::map<std::string, std::string> identities;  // of a slot: of what is around it
+        const Inventory inventory = readTopology(topology.get());
+        for (const auto& node : inventory.nodes) {
+            const auto above = identities.find(node->getParent());
+            const std::string parent = above == identities.end() ? "" : above->second;
+            const bool isSlot = node->getSensor() == IC::Node::SENSOR_SLOT;
+            EXPECT_TRUE(identities.emplace(node->getPath(), isSlot ? parent : identityOf(*node)).second);
+            EXPECT_EQ(above == identities.end(), node->getPath() == "/machine") << node->getPath();
+            IC::PropertyValue names(IC::StringArray {});
+            static_cast<void>(node->getProperty(KEY_VIEWS, names));
+            for (const std::string& name : names.operator IC::StringArray())
+                describedViews.insert(name);
+            const bool isPart = node->getPath().find_first_of("-.", 9) == std::string::npos
+                && node->getParent() == "/machine" && textOf(*node, KEY_NAME).empty()
+                && node->getSensor() != IC::Node::SENSOR_MEMORY_ARRAY;
+            if (!isSlot && !isPart)
+                described.insert(identityOf(*node) + " in " + parent);
+        }
+        EXPECT_EQ(described, objects);
+        EXPECT_EQ(describedViews, views);
+    }
+    if (files.empty())
+        GTEST_SKIP() << whyNoMachines;
+}
+
+TEST(InventoryMachines, CountWhatTheSystemMayNotUseAlsoIfItIsNotInTheTree)
+{
+    if (realMachines().empty())
+        GTEST_SKIP() << whyNoMachines;
+    // Threads 0 to 15, of which 0, 1, 3, 4, 6, 12 and 15 are online. In each package, 4 threads in 2 cores.
+    const Inventory inventory = readExport(readFile(realMachine("16em64t-4s2c2t-offlines")));
+    std::vector<std::string> counts;
+    for (const auto& node : inventory.nodes)
+        if (node->getSensor() == IC::Node::SENSOR_CPU || node->getPath() == "/machine")
+            counts.push_back(node->getPath() + ' ' + textOf(*node, KEY_UNUSABLE_THREADS) + ' '
+                             + textOf(*node, KEY_UNUSABLE_CORES) + ' ' + std::to_string(node->getStatus()));
+    EXPECT_THAT(counts,
+                testing::ElementsAre("/machine 9 2 0", "/machine/package-0 1 0 2", "/machine/package-1 3 1 2",
+                                     "/machine/package-2 3 1 2", "/machine/package-3 2 0 2"));
+    std::vector<std::string> alerts;
+    for (const IC::Alert& alert : alertsOf(inventory.nodes))
+        alerts.push_back(alert.getNodePaths().front() + ' ' + alert.getMessage());
+    EXPECT_THAT(alerts,
+                testing::ElementsAre("/machine/package-0 CPU: the system may not use all of it",
+                                     "/machine/package-1 CPU: the system may not use all of it",
+                                     "/machine/package-2 CPU: the system may not use all of it",
+                                     "/machine/package-3 CPU: the system may not use all of it"));
+}
+
+// The export with a few random changes.
+std::string damaged(std::string xml, std::mt19937& random)
+{
+    const auto upTo = [&](std::size_t most) { return random() % (most + 1); };
+    const auto lineAt = [&](std::size_t at) {
+        const auto begin = xml.rfind('\n', at) == std::string::npos ? 0 : xml.rfind('\n', at) + 1;
+        return std::make_pair(begin, std::min(xml.find('\n', at), xml.size() - 1) + 1 - begin);
+    };
+    for (std::size_t changes = 1 + upTo(3); changes != 0 && xml.size() > 2; --changes) {
+        const std::size_t at = upTo(xml.size() - 2);
+        const auto [begin, length] = lineAt(at);
+        static const char* const numbers[] = {
+            "-1", "0", "4294967295", "18446744073709551615", "0xffffffff,0x1", "", "1e99"};
+        const auto digit = xml.find_first_of("0123456789", at);
+        switch (upTo(6)) {
+        case 0:
+            xml[at] = static_cast<char>(upTo(255));
+            break;
+        case 1:
+            xml.erase(begin, length);
+            break;
+        case 2:
+            xml.insert(begin, xml.substr(begin, length));
+            break;
+        case 3:
+            xml.insert(begin, std::string("<object type=\"") + (upTo(1) != 0 ? "Group" : "Misc") + "\"/>");
+            break;
+        case 4:
+            xml.resize(at);
+            break;
+        default:
+            if (digit != std::string::npos)
+                xml.replace(digit, xml.find_first_not_of("0123456789", digit) - digit, numbers[upTo(6)]);
+        }
+    }
+    return xml;
+}
+
+TEST(InventoryMachines, OfDamagedExportsAreRefusedOrSound)
+{
+    const auto files = realMachines();
+    if (files.empty())
+        GTEST_SKIP() << whyNoMachines;
+    const char* number = std::getenv("INVENTORY_DAMAGED_EXPORTS");
+    std::mt19937 random(19);
+    std::size_t read = 0;
+    std::size_t refused = 0;
+    for (int i = number == nullptr ? 200 : std::stoi(number); i > 0; --i) {
+        const std::string& file = files[random() % files.size()];
+        const std::string xml = damaged(contentOf(file), random);
+        SCOPED_TRACE(std::to_string(i) + ' ' + file);
+        try {
+            const Inventory inventory = readExport(xml);
+            std::set<std::string> paths {""};
+            for (const auto& node : inventory.nodes) {
+                EXPECT_EQ(paths.count(node->getParent()), 1u) << node->getParent();
+                EXPECT_TRUE(paths.insert(node->getPath()).second) << node->getPath();
+            }
+            ++read;
+        } catch (const BadInput& refusal) {
+            EXPECT_THAT(refusal.what(),
+                        testing::AnyOf(testing::StartsWith("not a machine that hwloc "),
+                                       testing::StartsWith("takes more than ")));
+            ++refused;
+        }
+    }
+    EXPECT_GT(read, 10u);
+    EXPECT_GT(refused, 10u);
+}
+
 }  // namespace

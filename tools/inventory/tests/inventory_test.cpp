@@ -2,8 +2,10 @@
 #include <gmock/gmock.h>
 #include <hwloc.h>
 #include <hwloc/export.h>
+#include <sys/stat.h>
 
 #include <chrono>
+#include <future>
 #include <map>
 #include <memory>
 #include <set>
@@ -348,6 +350,7 @@ TEST(InventoryValues, TextsAreTrimmedAndSizesHaveUnits)
     EXPECT_EQ(toldIdentity(" 48AAE639 "), "48AAE639");
     EXPECT_EQ(sizeInWords(0), "0 bytes");
     EXPECT_EQ(sizeInWords(1), "1 byte");
+    EXPECT_EQ(sizeInWords(1), "1 byte");
     EXPECT_EQ(sizeInWords(1023), "1023 bytes");
     EXPECT_EQ(sizeInWords(20971520), "20 MiB");
     EXPECT_EQ(sizeInWords(128520671232), "119.7 GiB");
@@ -674,86 +677,118 @@ protected:
                                             "x86-16socket-disks-nics",
                                             "x86-2socket-16gpu",
                                             "power8-4gpu",
-                                            "arm64-20core-workstation"};
+                                            "arm64-20core-workstation",
+                                            "cxlmem+dax.v2",
+                                            "memorysidecaches",
+                                            "16em64t-4s2c2t-offlines"};
 };
 
 TEST_F(InventoryOfRealMachines, HasEveryNode)
 {
     using Counts = std::map<std::string, unsigned int>;
-    const std::map<std::string, Counts> expected {{names[0],
-                                                   {{"BIOS", 1},
-                                                    {"CPU", 2},
-                                                    {"CPU Core", 16},
-                                                    {"Cache", 50},
-                                                    {"Chassis", 1},
-                                                    {"Computer", 1},
-                                                    {"DIMM", 8},
-                                                    {"Disk Controller", 2},
-                                                    {"Hard Drive", 2},
-                                                    {"Memory Array", 2},
-                                                    {"Memory Device", 8},
-                                                    {"Network Controller", 3},
-                                                    {"Network Port", 3},
-                                                    {"Planar", 1},
-                                                    {"Slot", 2},
-                                                    {"USB Controller", 2},
-                                                    {"Video", 2}}},
-                                                  {names[1],
-                                                   {{"BIOS", 1},
-                                                    {"CPU", 24},
-                                                    {"CPU Core", 192},
-                                                    {"Cache", 600},
-                                                    {"Computer", 1},
-                                                    {"Disk Controller", 4},
-                                                    {"Hard Drive", 2},
-                                                    {"Memory Array", 24},
-                                                    {"Network Controller", 7},
-                                                    {"Network Port", 7},
-                                                    {"OS", 1},
-                                                    {"Video", 1}}},
-                                                  {names[2],
-                                                   {{"BIOS", 1},
-                                                    {"CPU", 16},
-                                                    {"CPU Core", 96},
-                                                    {"Cache", 160},
-                                                    {"Chassis", 1},
-                                                    {"Computer", 1},
-                                                    {"Disk Controller", 5},
-                                                    {"Group", 4},
-                                                    {"Hard Drive", 4},
-                                                    {"Memory Array", 4},
-                                                    {"Network Controller", 8},
-                                                    {"Network Port", 8},
-                                                    {"OS", 1},
-                                                    {"Planar", 1},
-                                                    {"Video", 1}}},
-                                                  {names[3],
-                                                   {{"CPU", 2},
-                                                    {"CPU Core", 4},
-                                                    {"Cache", 14},
-                                                    {"Computer", 1},
-                                                    {"IO Module", 12},
-                                                    {"Memory Array", 2},
-                                                    {"Planar", 1},
-                                                    {"Video", 16}}},
-                                                  {names[4],
-                                                   {{"CPU", 2},
-                                                    {"CPU Core", 8},
-                                                    {"Cache", 8},
-                                                    {"Computer", 1},
-                                                    {"Memory Array", 2},
-                                                    {"OS", 1},
-                                                    {"Video", 4}}},
-                                                  {names[5],
-                                                   {{"BIOS", 1},
-                                                    {"CPU", 1},
-                                                    {"CPU Core", 20},
-                                                    {"Cache", 62},
-                                                    {"Chassis", 1},
-                                                    {"Computer", 1},
-                                                    {"Memory Array", 1},
-                                                    {"OS", 1},
-                                                    {"Planar", 1}}}};
+    const std::map<std::string, Counts> expected {
+        {names[0],
+         {{"BIOS", 1},
+          {"CPU", 2},
+          {"CPU Core", 16},
+          {"Cache", 50},
+          {"Chassis", 1},
+          {"Computer", 1},
+          {"DIMM", 8},
+          {"Disk Controller", 2},
+          {"Hard Drive", 2},
+          {"Memory Array", 2},
+          {"Memory Device", 8},
+          {"Network Controller", 3},
+          {"Network Port", 3},
+          {"Planar", 1},
+          {"Slot", 2},
+          {"USB Controller", 2},
+          {"Video", 2}}},
+        {names[1],
+         {{"BIOS", 1},
+          {"CPU", 24},
+          {"CPU Core", 192},
+          {"Cache", 600},
+          {"Computer", 1},
+          {"Disk Controller", 4},
+          {"Hard Drive", 2},
+          {"Memory Array", 24},
+          {"Network Controller", 7},
+          {"Network Port", 7},
+          {"OS", 1},
+          {"Video", 1}}},
+        {names[2],
+         {{"BIOS", 1},
+          {"CPU", 16},
+          {"CPU Core", 96},
+          {"Cache", 160},
+          {"Chassis", 1},
+          {"Computer", 1},
+          {"Disk Controller", 5},
+          {"Group", 4},
+          {"Hard Drive", 4},
+          {"Memory Array", 4},
+          {"Network Controller", 8},
+          {"Network Port", 8},
+          {"OS", 1},
+          {"Planar", 1},
+          {"Video", 1}}},
+        {names[3],
+         {{"CPU", 2},
+          {"CPU Core", 4},
+          {"Cache", 14},
+          {"Computer", 1},
+          {"IO Module", 12},
+          {"Memory Array", 2},
+          {"Planar", 1},
+          {"Video", 16}}},
+        {names[4],
+         {{"CPU", 2},
+          {"CPU Core", 8},
+          {"Cache", 8},
+          {"Computer", 1},
+          {"Memory Array", 2},
+          {"OS", 1},
+          {"Video", 4}}},
+        {names[5],
+         {{"BIOS", 1},
+          {"CPU", 1},
+          {"CPU Core", 20},
+          {"Cache", 62},
+          {"Chassis", 1},
+          {"Computer", 1},
+          {"Memory Array", 1},
+          {"OS", 1},
+          {"Planar", 1}}},
+        {names[6],
+         {{"BIOS", 1},
+          {"CPU", 1},
+          {"CPU Core", 4},
+          {"Cache", 13},
+          {"Chassis", 1},
+          {"Computer", 1},
+          {"Disk Controller", 1},
+          {"Hard Drive", 1},
+          {"Memory Array", 1},
+          {"Memory Device", 5},
+          {"Network Controller", 1},
+          {"Network Port", 1},
+          {"OS", 1},
+          {"Slot", 7},
+          {"Video", 1}}},
+        {names[7],
+         {{"BIOS", 1},
+          {"CPU", 2},
+          {"CPU Core", 40},
+          {"Cache", 46},
+          {"Chassis", 1},
+          {"Computer", 1},
+          {"Group", 4},
+          {"Memory Array", 4},
+          {"OS", 1},
+          {"Planar", 1}}},
+        {names[8], {{"CPU", 4}, {"CPU Core", 6}, {"Cache", 16}, {"Computer", 1}, {"Memory Array", 1}}}};
     std::set<std::string> sensorTypes;
     for (const char* name : names) {
         SCOPED_TRACE(name);
@@ -793,6 +828,27 @@ TEST_F(InventoryOfRealMachines, KeepsTheirValuesUnchanged)
     const IC::Node& core = nodeAt(workstation, "/machine/package-36/core-5");
     EXPECT_EQ(property(core, KEY_FREQUENCY).operator double(), 3900.0);
     EXPECT_EQ(property(core, KEY_CAPACITY).operator unsigned int(), 997u);
+}
+
+TEST_F(InventoryOfRealMachines, HasOneNodeForEachDeviceWithWhatEachDriverKnows)
+{
+    const Inventory gpus = read("power8-4gpu");
+    const IC::Node& gpu = nodeAt(gpus, "/machine/display-0002:01:00.0");
+    EXPECT_THAT(property(gpu, KEY_VIEWS).operator IC::StringArray(),
+                ElementsAre("cuda0", "nvml0", "opencl0d0"));
+    EXPECT_EQ(std::string(property(gpu, KEY_MODEL)), "Tesla P100-SXM2-16GB");
+    EXPECT_EQ(std::string(property(gpu, KEY_SUBTYPE)), "CUDA");
+    EXPECT_EQ(property(gpu, KEY_SIZE).operator unsigned long long(), 17071734784u);
+    EXPECT_THAT(
+        property(gpu, KEY_OTHER_FACTS).operator IC::StringArray(),
+        testing::IsSupersetOf({"CUDAMultiProcessors=56", "subtype=NVML", "subtype=OpenCL", "Backend=NVML"}));
+
+    const Inventory expanders = read("cxlmem+dax.v2");
+    const IC::Node& expander = nodeAt(expanders, "/machine/cxl-0000:16:00.0");
+    EXPECT_EQ(expander.getSensor(), IC::Node::SENSOR_MEMORY_DEVICE);
+    EXPECT_EQ(expander.getParent(), "/machine/slot-0/slot-2/slot-7");
+    EXPECT_THAT(property(expander, KEY_VIEWS).operator IC::StringArray(), ElementsAre("mem1"));
+    EXPECT_EQ(property(expander, KEY_SIZE).operator unsigned long long(), 536870912u);
 }
 
 TEST_F(InventoryOfRealMachines, AreDescribedInUnderASecond)
@@ -956,6 +1012,55 @@ TEST_F(InventoryProgram, RefusesBadInputInOneLine)
         EXPECT_EQ(outcome.err.substr(0, 11), "inventory: ");
         EXPECT_THAT(outcome.err, HasSubstr(row.told));
     }
+}
+
+TEST_F(InventoryProgram, GivesUpWhatNeverEnds)
+{
+    const std::string never = folder.path("never");
+    ASSERT_EQ(mkfifo(never.c_str(), S_IRUSR | S_IWUSR), 0);
+    std::string modules;
+    for (int i = 0; i < 200000; ++i)  // hwloc takes quadratic time
+        modules += "<object type=\"Misc\" subtype=\"MemoryModule\"/>";
+    const std::string large = folder.write("large.xml", machineOf("", modules));
+    const auto begin = std::chrono::steady_clock::now();
+    auto waiting = std::async(std::launch::async, [&] { return run({never}); });
+    const Outcome computing = run({large});
+    const std::chrono::duration<double> took = std::chrono::steady_clock::now() - begin;
+    EXPECT_EQ(computing.status, 2);
+    EXPECT_EQ(computing.err, "inventory: " + large + ": takes more than 10 s\n");
+    EXPECT_GT(took.count(), 9);
+    EXPECT_LT(took.count(), 20);
+    const Outcome waited = waiting.get();
+    EXPECT_EQ(waited.status, 2);
+    EXPECT_EQ(waited.err, "inventory: " + never + ": nobody wrote to it for 10 s\n");
+}
+
+TEST_F(InventoryProgram, GivesUpWhatFillsTheMemory)
+{
+    if (!limitsMemory)
+        GTEST_SKIP() << "a sanitizer reserves more addresses than an export may take";
+    std::string threads;  // for a high number hwloc allocates a set of half a GiB
+    for (unsigned int number = 4294967200; number < 4294967208; ++number)
+        threads += "<object type=\"PU\" os_index=\"" + std::to_string(number) + "\"/>";
+    std::string xml = machineOf("", threads);
+    const std::string sets =
+        xml.substr(xml.find(" cpuset="), xml.find('>', xml.find(" cpuset=")) - xml.find(" cpuset="));
+    for (std::size_t at = 0; (at = xml.find("\"/>", xml.find("os_index=\"42949", at))) != std::string::npos;
+         ++at)
+        xml.insert(at + 1, sets);
+    const std::string file = folder.write("numbers.xml", xml);
+    const Outcome outcome = run({file});
+    EXPECT_EQ(outcome.status, 2);
+    EXPECT_EQ(outcome.err, "inventory: " + file + ": takes more than 2 GiB\n");
+}
+
+TEST_F(InventoryProgram, ReadsAPipe)
+{
+    const Outcome outcome =
+        runProgram({"sh", "-c", "{ head -c 100 \"$1\"; sleep 0.2; tail -c +101 \"$1\"; } | \"$0\" /dev/stdin",
+                    INVENTORY_PROGRAM, small});
+    EXPECT_EQ(outcome.status, 0) << outcome.err;
+    EXPECT_EQ(outcome.out, run({small}).out);
 }
 
 TEST_F(InventoryProgram, ReportsThatItCannotWrite)
