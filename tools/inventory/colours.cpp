@@ -1,6 +1,10 @@
 // The table of colours: related sensor types share a colour on a terminal and have similar ones in a drawing.
 #include "colours.h"
 
+#include <algorithm>
+#include <cstdio>
+#include <iterator>
+
 namespace inventory {
 
 namespace {
@@ -46,6 +50,26 @@ const Colour& colourOf(Node::SensorType sensor)
         if (colour.sensor == sensor)
             return colour;
     return other;
+}
+
+std::size_t rankOf(Node::SensorType sensor)
+{
+    const auto* const found = std::find_if(std::begin(colours), std::end(colours),
+                                           [&](const Colour& colour) { return colour.sensor == sensor; });
+    return found == std::end(colours) ? std::size(colours) + sensor
+                                      : static_cast<std::size_t>(found - std::begin(colours));
+}
+
+std::string darkFillOf(const Colour& colour)
+{
+    // The difference to grey is doubled, because in the dark it is hard to see.
+    unsigned int parts[3] = {};
+    std::sscanf(colour.fill, "#%2x%2x%2x", &parts[0], &parts[1], &parts[2]);
+    const unsigned int least = std::min({parts[0], parts[1], parts[2]});
+    char text[8];
+    const auto dark = [&](unsigned int part) { return (part + 2 * (part - least)) * 3 / 16; };
+    std::snprintf(text, sizeof text, "#%02x%02x%02x", dark(parts[0]), dark(parts[1]), dark(parts[2]));
+    return text;
 }
 
 }  // namespace inventory

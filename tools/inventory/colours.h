@@ -1,6 +1,9 @@
 // The colours of the sensor types.
 #pragma once
 
+#include <cstddef>
+#include <string>
+
 #include "IC/Node.h"
 
 namespace inventory {
@@ -12,5 +15,7 @@ struct Colour {
 };
 
 const Colour& colourOf(IC::Node::SensorType sensor);
+std::size_t rankOf(IC::Node::SensorType sensor);  // related sensor types follow each other
+std::string darkFillOf(const Colour& colour);     // of the same hue, for white text
 
 }  // namespace inventory

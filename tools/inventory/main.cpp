@@ -18,6 +18,7 @@
 #include "VXLog/SpdlogSink.h"
 #include "alerts.h"
 #include "comparing.h"
+#include "notice.h"
 #include "output.h"
 #include "reading.h"
 #include "values.h"
@@ -109,7 +110,14 @@ Inventory readHere()
 
 void describe(std::ostream& out, const Nodes& nodes, const TreeForm& form)
 {
-    writeTree(out, nodes, form);
+    const View view(nodes);
+    if (!form.own) {
+        writeFirstScreen(out, view, form.look);
+        out << '\n';
+    }
+    writeTree(out, view, form);
+    if (!form.own && !form.withProperties && !form.all)
+        return;
     out << '\n';
     writeAlerts(out, alertsOf(nodes), form.look);
     out << '\n';
@@ -192,6 +200,7 @@ std::string help()
         {" --watch 10", "alerts, as changes happen"},
         {" --json | jq -r '.nodes[].path'", "the paths of all nodes"},
         {" --svg machine.svg", "a drawing"},
+        {" --html machine.html", "a page for a browser, with the drawing and a search"},
     };
     std::ostringstream text;
     text << "Examples:\n";
@@ -218,12 +227,16 @@ int run(int argc, char** argv)
         app.add_option("FILE", request.file, "A machine as hwloc exports it (lstopo FILE.xml)");
     const auto* log =
         app.add_flag("--log", request.form.own, "Write each node in its own text form, as a log shows it");
+    const auto* all =
+        app.add_flag("--all", request.form.all, "Write each node; otherwise equal parts share a line");
     const auto* properties = app.add_flag("--properties", request.form.withProperties,
                                           "Write the properties of each node: [number = value] name");
     const auto* json = app.add_flag("--json", "Write the nodes, their properties and the alerts as JSON");
     std::string drawing = "-";
-    const auto* svg =
-        app.add_option("--svg", drawing, "Draw the nodes as nested boxes into SVG")->type_name("SVG");
+    const auto* svg = app.add_option("--svg", drawing, "Draw the machine into SVG")->type_name("SVG");
+    std::string page = "-";
+    const auto* html = app.add_option("--html", page, "Write all about the machine as one page into HTML")
+                           ->type_name("HTML");
     const auto* output =
         app.add_option("--output", request.output,
                        "Write to OUTPUT, as a whole or not at all, instead of to standard output")
@@ -244,10 +257,10 @@ int run(int argc, char** argv)
     } catch (const CLI::Success& success) {  // --help, --version
         return flushed(app.exit(success), EXIT_REFUSED);
     }
-    for (const CLI::Option* form : {log, properties})
-        for (const CLI::Option* mode : {set, json, svg, watching, diff})
+    for (const CLI::Option* form : {log, all, properties})
+        for (const CLI::Option* mode : {set, json, svg, html, watching, diff})
             allowOne({form, mode});
-    allowOne({set, json, svg, watching, diff});
+    allowOne({set, json, svg, html, watching, diff});
     if (request.sides.size() > 2 || (isGiven(diff) && isGiven(file)))
         throw BadInput("--diff and FILE exclude each other");
     allowOne({watching, output});
@@ -260,25 +273,29 @@ int run(int argc, char** argv)
 
     // Each option that names a file of its own.
     std::string target = isGiven(output) ? request.output : "-";
-    for (const auto& [option, own] : {std::pair(svg, &drawing)}) {
+    for (const auto& [option, own] : {std::pair(svg, &drawing), std::pair(html, &page)}) {
         if (isGiven(option) && *own != "-") {
             allowOne({option, output});
             target = *own;
         }
     }
-    if (target == "-")
-        request.form.look = lookOfStandardOutput();
+    request.form.look = target == "-" ? lookOfStandardOutput() : lookOfFile();
     if (isGiven(diff))
         return written(
             target, [&](std::ostream& out) { return compare(out, request.sides, request.form.look); },
             EXIT_BAD_INPUT);
-    const Inventory inventory = read();
+    const Inventory inventory = [&] {
+        const Notice notice("reading the machine...");
+        return read();
+    }();
     const auto write = [&](std::ostream& out) -> int {
         if (isGiven(set))
             return std::apply([&](const auto&... words) { return change(out, inventory.nodes, words...); },
                               request.setting);
         if (isGiven(svg))
             writeSvg(out, inventory.nodes);
+        else if (isGiven(html))
+            writeHtml(out, inventory.nodes);
         else if (isGiven(json))
             writeJson(out, inventory.nodes, alertsOf(inventory.nodes));
         else

@@ -197,7 +197,7 @@ std::string sizeInWords(ZQ::Uint64 bytes)
     static const char* const units[] = {"bytes", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"};
     auto size = static_cast<double>(bytes);
     std::size_t unit = 0;
-    for (; size >= 1024; ++unit)
+    for (; size >= 1023.5; ++unit)  // which rounds to 1024
         size /= 1024;
     char text[32];
     std::snprintf(text, sizeof text, "%.4g %s", size, bytes == 1 ? "byte" : units[unit]);
@@ -240,6 +240,29 @@ std::string printable(std::string_view text)
     for (const char character : text)
         out += character >= ' ' && character <= '~' ? std::string(1, character)
                                                     : "\\x" + IC::pB(static_cast<unsigned char>(character));
+    return out;
+}
+
+std::string escapedForXml(std::string_view text)
+{
+    std::string out;
+    for (const char character : text)
+        switch (character) {
+        case '&':
+            out += "&amp;";
+            break;
+        case '<':
+            out += "&lt;";
+            break;
+        case '>':
+            out += "&gt;";
+            break;
+        case '"':
+            out += "&quot;";
+            break;
+        default:
+            out += character;
+        }
     return out;
 }
 

@@ -37,4 +37,7 @@ std::string kindName(const IC::PropertyValue& value);
 // hexadecimal digits.
 std::string printable(std::string_view text);
 
+// With XML's own characters escaped, also for HTML and in quotes.
+std::string escapedForXml(std::string_view text);
+
 }  // namespace inventory

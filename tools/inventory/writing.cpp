@@ -2,8 +2,10 @@
 #include "writing.h"
 
 #include <langinfo.h>
+#include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <clocale>
 #include <cstdlib>
 #include <cstring>
@@ -36,21 +38,64 @@ std::string textOf(const T& value)
     return printable(text.str());
 }
 
-std::string troubleIn(const IC::Node& node)
+// The text with the signs that the output can show.
+std::string shownAs(std::string text, const Look& look)
 {
-    const Trouble* trouble = troubleOf(node);
-    return trouble == nullptr ? "" : std::string(" -- ") + trouble->words;
+    static const struct {
+        std::string_view sign;
+        const char* plain;
+    } signs[] = {{"\u00d7", "x"}, {"\u00b0", ""}};
+    for (const auto& row : signs)
+        for (std::size_t at = 0; !look.isUtf8 && (at = text.find(row.sign, at)) != std::string::npos;)
+            text.replace(at, row.sign.size(), row.plain);
+    return text;
 }
 
-std::string nodeLine(const IC::Node& node, const TreeForm& form)
+// Every character of the texts is one column wide.
+std::size_t columnsOf(const std::string& text)
 {
-    if (form.own)
-        return textOf(node);
-    const std::string text = inWords(node);
-    const std::size_t sensor = IC::pst[node.getSensor()].size();
-    const std::string trouble = troubleIn(node);
-    return painted(form.look, colourOf(node.getSensor()).onTerminal, text.substr(0, sensor))
-        + text.substr(sensor) + (trouble.empty() ? "" : painted(form.look, severities[2], trouble));
+    return static_cast<std::size_t>(
+        std::count_if(text.begin(), text.end(), [](char byte) { return (byte & 0xC0) != 0x80; }));
+}
+
+std::string cut(const std::string& text, std::size_t columns)
+{
+    constexpr std::string_view dots = "...";
+    if (columnsOf(text) <= columns)
+        return text;
+    const std::size_t kept = columns < dots.size() ? columns : columns - dots.size();
+    std::size_t end = 0;
+    for (std::size_t column = 0; column <= kept; ++end)
+        column += (text[end] & 0xC0) != 0x80 ? 1 : 0;
+    return text.substr(0, end - 1) + std::string(dots.substr(0, columns - kept));
+}
+
+struct Painted {
+    const char* colour;
+    std::string text;
+};
+
+// Writes the pieces. If they are wider than the terminal, the one with this index becomes shorter, then all.
+void writeLine(std::ostream& out, const Look& look, std::vector<Painted> pieces, std::size_t shortened)
+{
+    std::size_t columns = 0;
+    for (Painted& piece : pieces) {
+        piece.text = shownAs(piece.text, look);
+        columns += columnsOf(piece.text);
+    }
+    if (look.width != 0 && columns > look.width) {
+        std::string& text = pieces[shortened].text;
+        const std::size_t others = columns - columnsOf(text);
+        constexpr std::size_t fewest = 3;  // the dots
+        text = cut(text, std::max(look.width - std::min(others, look.width), fewest));
+    }
+    std::size_t left = look.width == 0 ? std::string::npos : look.width;
+    for (const Painted& piece : pieces) {
+        const std::string text = cut(piece.text, left);
+        left -= left == std::string::npos ? 0 : columnsOf(text);
+        out << (text.empty() || *piece.colour == '\0' ? text : painted(look, piece.colour, text));
+    }
+    out << '\n';
 }
 
 // The beginnings of lines: of a child that another child follows, of the last child, of the lines below each of the
@@ -68,23 +113,33 @@ constexpr Lines linesOfLook[] = {
     {"|-- ", "`-- ", "|   ", "    ", "|     ", "      "},
     {"\u251c\u2500\u2500 ", "\u2514\u2500\u2500 ", "\u2502   ", "    ", "\u2502     ", "      "}};
 
-void writeNode(std::ostream& out, const Children& children, const IC::Node& node, const TreeForm& form,
-               const std::string& indent)
+void writePart(std::ostream& out, const Part& part, const TreeForm& form, const std::string& indent,
+               const char* branch)
 {
     const Lines& lines = linesOfLook[form.look.lines];
-    const auto found = children.find(node.getPath());
-    const bool hasChildren = found != children.end();
-    out << nodeLine(node, form) << '\n';
-    if (form.withProperties)
-        for (const auto& [key, value] : node.getProperties())
-            writeProperty(out << indent << (hasChildren ? lines.property : lines.lastProperty), key, value);
-    if (!hasChildren)
-        return;
-    for (const IC::Node* child : found->second) {
-        const bool isLast = child == found->second.back();
-        out << indent << (isLast ? lines.lastChild : lines.child);
-        writeNode(out, children, *child, form, indent + (isLast ? lines.belowLast : lines.belowChild));
+    const Shown& first = part.first();
+    if (form.own) {
+        out << indent << branch << textOf(*first.node) << '\n';
+    } else {
+        const std::string details = View::detailsOf(part);
+        const std::string troubles = View::troublesOf(part);
+        writeLine(out, form.look,
+                  {{"", indent + branch},
+                   {colourOf(first.node->getSensor()).onTerminal, View::headOf(part)},
+                   {"", details.empty() ? "" : ": " + details},
+                   {severities[2], troubles.empty() ? "" : " -- " + troubles}},
+                  2);
     }
+    const std::string below = indent
+        + (branch == lines.lastChild ? lines.belowLast
+               : *branch == '\0'     ? ""
+                                     : lines.belowChild);
+    if (form.withProperties)
+        for (const auto& [key, value] : first.properties)
+            writeProperty(out << below << (part.inner.empty() ? lines.lastProperty : lines.property), key,
+                          value);
+    for (const Part& inner : part.inner)
+        writePart(out, inner, form, below, &inner == &part.inner.back() ? lines.lastChild : lines.child);
 }
 
 std::string heading(const IC::Node& node)
@@ -103,46 +158,74 @@ std::string changedIn(const Change& change, const std::string& text)
 
 }  // namespace
 
+Look lookOfFile()
+{
+    std::setlocale(LC_CTYPE, "");
+    return {false, Look::LINES_NONE, std::strcmp(nl_langinfo(CODESET), "UTF-8") == 0};
+}
+
 Look lookOfStandardOutput()
 {
+    Look look = lookOfFile();
     if (isatty(STDOUT_FILENO) == 0)
-        return {};
+        return look;
     const auto is = [](const char* name) {
         const char* value = std::getenv(name);
         return std::string(value == nullptr ? "" : value);
     };
-    std::setlocale(LC_CTYPE, "");
-    const bool isUtf8 = std::strcmp(nl_langinfo(CODESET), "UTF-8") == 0;
-    return {is("NO_COLOR").empty() && is("TERM") != "dumb", isUtf8 ? Look::LINES_DRAWN : Look::LINES_ASCII};
+    look.isColoured = is("NO_COLOR").empty() && is("TERM") != "dumb";
+    look.lines = look.isUtf8 ? Look::LINES_DRAWN : Look::LINES_ASCII;
+    winsize window {};
+    look.width = ioctl(STDOUT_FILENO, TIOCGWINSZ, &window) == 0 ? window.ws_col : 0;
+    return look;
 }
 
-Children childrenOf(const Nodes& nodes)
+void writeFirstScreen(std::ostream& out, const View& view, const Look& look)
 {
-    Children children;
-    for (const auto& node : nodes)
-        children[node->getParent()].push_back(node.get());
-    return children;
+    constexpr std::size_t most = 25;
+    constexpr std::size_t labelWidth = 12;
+    constexpr const char* bold = "1";
+    writeLine(out, look, {{bold, view.title()}}, 0);
+    std::size_t lines = 1;
+    for (const Entry& row : view.entries())
+        for (const std::string& line : row.lines) {
+            std::string label = &line == &row.lines.front() ? row.label : "";
+            label.resize(labelWidth, ' ');
+            writeLine(out, look, {{bold, "  " + label}, {"", line}}, 1);
+            ++lines;
+        }
+    const auto& alerts = view.alerts();
+    std::string label = "Alerts";
+    label.resize(labelWidth, ' ');
+    writeLine(out, look,
+              {{bold, "  " + label}, {"", alerts.empty() ? "none" : std::to_string(alerts.size())}}, 1);
+    ++lines;
+    const std::size_t shown = alerts.size() <= most - lines ? alerts.size() : most - lines - 1;
+    for (std::size_t i = 0; i < shown; ++i)
+        writeLine(out, look,
+                  {{"", "    "},
+                   {severities[alerts[i].severity], severityName(alerts[i].severity)},
+                   {"", " " + alerts[i].path + ", "},
+                   {"", alerts[i].message}},
+                  3);
+    if (shown < alerts.size())
+        writeLine(out, look,
+                  {{"", "    and " + std::to_string(alerts.size() - shown) + " more; --all writes them"}}, 0);
 }
 
-std::string inWords(const IC::Node& node)
+void writeTree(std::ostream& out, const View& view, const TreeForm& form)
 {
-    const std::string path = node.getPath();
-    const std::string description = node.getDescription();
-    return printable(IC::pst[node.getSensor()] + ' ' + path.substr(path.rfind('/') + 1)
-                     + (description.empty() ? "" : ": " + description));
-}
-
-void writeTree(std::ostream& out, const Nodes& nodes, const TreeForm& form)
-{
-    const Children children = childrenOf(nodes);
-    for (const auto& node : nodes)
-        if (node->getParent().empty())
-            writeNode(out, children, *node, form, "");
+    const bool all = form.own || form.withProperties || form.all;
+    for (const Part& part : all ? view.all() : view.folded())
+        writePart(out, part, form, "", "");
 }
 
 void writeProperty(std::ostream& out, unsigned int key, const IC::PropertyValue& value)
 {
-    out << '[' << textOf(std::make_pair(key, value)) << "] " << nameOf(key) << '\n';
+    const std::string ranges = key == KEY_CPU_SET ? rangesOf(value) : "";
+    const std::string text =
+        ranges.empty() ? textOf(std::make_pair(key, value)) : std::to_string(key) + " = " + ranges;
+    out << '[' << text << "] " << nameOf(key) << '\n';
 }
 
 void writeAlerts(std::ostream& out, const std::vector<IC::Alert>& alerts, const Look& look)

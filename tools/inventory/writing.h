@@ -1,33 +1,40 @@
-// Writes the tree of nodes, properties, alerts, changes and a summary as text (writing.cpp), and all nodes as JSON
-// (json.cpp) and as a drawing (svg.cpp).
+// Writes the first screen, the tree of nodes, properties, alerts, changes and a summary as text (writing.cpp), and all
+// nodes as JSON (json.cpp), as a drawing (svg.cpp) and as a page (html.cpp).
 #pragma once
 
 #include <iosfwd>
-#include <map>
 #include <string>
 #include <vector>
 
 #include "IC/Alert.h"
 #include "comparing.h"
 #include "nodes.h"
+#include "view.h"
 
 namespace inventory {
 
-// The defaults are for a pipe or a file.
+// The defaults are for a pipe or a file in the locale "C".
 struct Look {
     enum Lines : unsigned char { LINES_NONE, LINES_ASCII, LINES_DRAWN };
     bool isColoured = false;
     Lines lines = LINES_NONE;  // between the nodes of the tree
+    bool isUtf8 = false;       // otherwise \u00d7 is written as x, and \u00b0C as C
+    std::size_t width = 0;     // of the longest line; 0: lines are not cut
 };
-Look lookOfStandardOutput();  // with the colours and lines that a terminal can show
+Look lookOfFile();            // with the signs of the locale
+Look lookOfStandardOutput();  // with the colours, signs and lines that a terminal or the locale can show
 
-// Each node on a line, indented below its parent: in plain words, or in its own text form.
+// What the machine is and what is wrong with it: 25 lines at most.
+void writeFirstScreen(std::ostream& out, const View& view, const Look& look = {});
+
+// The parts, each on a line, indented below the part around it. Equal parts share a line.
 struct TreeForm {
-    bool own = false;
-    bool withProperties = false;  // below the node, each on a line
+    bool own = false;             // each node in its own text form
+    bool withProperties = false;  // each node, and below it its properties, each on a line
+    bool all = false;             // each node
     Look look = {};
 };
-void writeTree(std::ostream& out, const Nodes& nodes, const TreeForm& form);
+void writeTree(std::ostream& out, const View& view, const TreeForm& form);
 void writeProperty(std::ostream& out, unsigned int key, const IC::PropertyValue& value);
 
 void writeAlerts(std::ostream& out, const std::vector<IC::Alert>& alerts, const Look& look = {});
@@ -39,11 +46,7 @@ void writeChanges(std::ostream& out, const std::vector<Change>& changes, const L
 void writeSummary(std::ostream& out, const Nodes& nodes);
 
 void writeJson(std::ostream& out, const Nodes& nodes, const std::vector<IC::Alert>& alerts);
-void writeSvg(std::ostream& out, const Nodes& nodes);
-
-// Used for the text and for the drawing.
-using Children = std::map<std::string, std::vector<const IC::Node*>>;  // the key is the parent's path
-Children childrenOf(const Nodes& nodes);
-std::string inWords(const IC::Node& node);  // sensor type, name and description, printable
+int writeSvg(std::ostream& out, const View& view);  // returns the drawing's width in its own units
+void writeHtml(std::ostream& out, const View& view);
 
 }  // namespace inventory

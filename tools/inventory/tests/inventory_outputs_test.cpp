@@ -1,14 +1,10 @@
-// The inventory's output on a terminal, as JSON and as a drawing; its command line and its manual.
+// The inventory's output as JSON; its command line and its manual.
 #include <gmock/gmock.h>
-#include <pty.h>
 
-#include <cmath>
-#include <cstring>
 #include <limits>
 #include <regex>
 #include <set>
 
-#include "colours.h"
 #include "inventory_run.h"
 #include "writing.h"
 
@@ -31,14 +27,6 @@ struct Made : IC::Node {
         status = static_cast<StatusType>(itsStatus);
     }
 };
-
-// The output of a Python program that reads the file. The program fails if the file is not valid.
-std::string readByPython(const std::string& program, const std::string& file)
-{
-    const Outcome outcome = runProgram({PYTHON, "-c", program, file});
-    EXPECT_EQ(outcome.status, 0) << outcome.err;
-    return outcome.out;
-}
 
 class InventoryOutput : public testing::Test {
 protected:
@@ -66,99 +54,6 @@ protected:
                                "<object type=\"OSDev\" osdev_type=\"2\" name=\"" + hostileText + "\">"
                                    + fact("Address", hostileText) + "</object>"));
 };
-
-// --- Terminals ---
-
-class InventoryTerminal : public InventoryOutput {
-protected:
-    void SetUp() override
-    {
-        int ours = -1;
-        int its = -1;
-        if (openpty(&ours, &its, nullptr, nullptr, nullptr) != 0)
-            GTEST_SKIP() << "no pseudo-terminal can be opened: " << std::strerror(errno);
-        close(ours);
-        close(its);
-    }
-
-    static Outcome run(const std::vector<std::string>& environment, const std::vector<std::string>& words)
-    {
-        const std::vector<std::string> usual {"env", "-u", "NO_COLOR", "TERM=xterm"};
-        return runProgram({"env", "SHELL=/bin/sh", "script", "-qec",
-                           quoted(usual) + quoted(environment) + quoted({INVENTORY_PROGRAM}) + quoted(words),
-                           "/dev/null"});
-    }
-};
-
-TEST_F(InventoryTerminal, HasColoursAndLines)
-{
-    const Outcome outcome = run({"LC_ALL=C.UTF-8"}, {file});
-    EXPECT_EQ(outcome.status, 0);
-    EXPECT_THAT(outcome.out,
-                StartsWith("\x1b[1mComputer\x1b[0m machine: One, CPUs: 0, cores: 0\r\n"
-                           "├── \x1b[32mMemory Array\x1b[0m numa-0\r\n"
-                           "├── \x1b[33mDisk Controller\x1b[0m storage-0000:01:00.0: 8086:1d02\r\n"
-                           "│   └── \x1b[33mHard Drive\x1b[0m sda\r\n"
-                           "└── \x1b[32mDIMM\x1b[0m dimm\x1b[31m -- its size is unknown\x1b[0m\r\n"
-                           "\r\n"
-                           "Alerts: 1\r\n"
-                           "  \x1b[33m/machine/dimm, DIMM: its size is unknown\x1b[0m\r\n"));
-}
-
-TEST_F(InventoryTerminal, HasNoColoursIfTheyAreTurnedOff)
-{
-    for (const char* setting : {"NO_COLOR=1", "TERM=dumb"}) {
-        SCOPED_TRACE(setting);
-        EXPECT_THAT(run({"LC_ALL=C.UTF-8", setting}, {file}).out,
-                    StartsWith("Computer machine: One, CPUs: 0, cores: 0\r\n"
-                               "├── Memory Array numa-0\r\n"
-                               "├── Disk Controller storage-0000:01:00.0: 8086:1d02\r\n"
-                               "│   └── Hard Drive sda\r\n"
-                               "└── DIMM dimm -- its size is unknown\r\n"
-                               "\r\n"
-                               "Alerts: 1\r\n"
-                               "  /machine/dimm, DIMM: its size is unknown\r\n"));
-    }
-    EXPECT_THAT(run({"LC_ALL=C.UTF-8", "NO_COLOR="}, {file}).out, StartsWith("\x1b[1mComputer"));
-}
-
-TEST_F(InventoryTerminal, HasAsciiLinesIfItIsNotUtf8)
-{
-    EXPECT_THAT(run({"LC_ALL=C", "NO_COLOR=1"}, {"--properties", "--log", file}).out,
-                testing::MatchesRegex("Node 2f6d616368696e65 : 40, status = 0\r\n"
-                                      "\\|     \\[1 = Computer:0\\] this node\r\n(.|\n)*"
-                                      "\\|-- Node 2f6d616368696e652f6e756d612d30 : 32, status = 0\r\n"
-                                      "\\|         \\[1 = Memory Array:0\\] this node\r\n(.|\n)*"
-                                      "`-- Node [0-9a-f]* : 19, status = 3\r\n"
-                                      "          \\[1 = DIMM:0\\] this node\r\n(.|\n)*"));
-}
-
-TEST_F(InventoryOutput, IsPlainTextInAPipe)
-{
-    setenv("LC_ALL", "C.UTF-8", 1);
-    const Outcome outcome = run({file});
-    unsetenv("LC_ALL");
-    EXPECT_THAT(outcome.out,
-                StartsWith("Computer machine: One, CPUs: 0, cores: 0\n"
-                           "  Memory Array numa-0\n"
-                           "  Disk Controller storage-0000:01:00.0: 8086:1d02\n"
-                           "    Hard Drive sda\n"
-                           "  DIMM dimm -- its size is unknown\n"
-                           "\n"
-                           "Alerts: 1\n"
-                           "  /machine/dimm, DIMM: its size is unknown\n"));
-}
-
-TEST_F(InventoryTerminal, HasColouredChanges)
-{
-    const std::string other = folder.write("other.xml", machineOf(fact("DMIProductName", "Two")));
-    const Outcome outcome = run({"LC_ALL=C"}, {"--diff", file, other});
-    EXPECT_EQ(outcome.status, 1);
-    EXPECT_THAT(outcome.out,
-                HasSubstr("  Computer /machine\r\n"
-                          "\x1b[31m-   [12 = One] model\x1b[0m\r\n"
-                          "\x1b[32m+   [12 = Two] model\x1b[0m\r\n"));
-}
 
 // --- JSON ---
 
@@ -382,163 +277,6 @@ TEST_F(InventoryOutput, IsValidJsonForTextsThatAreNotUtf8)
               "{'hex': 'fffe22011b5b324a5d5d3e3c2f746578743e26616d703b277feda080c3a4'}\n");
 }
 
-// --- The drawing ---
-
-// Checks that each box lies in its parent's box without overlapping its siblings, and each text in its box. Prints the
-// numbers of boxes and of colours. Takes a letter of the monospaced 11-pixel font as 6.7 pixels wide.
-constexpr const char* measure = R"(
-import re, sys
-import xml.etree.ElementTree as tree
-svg = '{http://www.w3.org/2000/svg}'
-root = tree.parse(sys.argv[1]).getroot()
-fills = set()
-count = 0
-
-def box(group):
-    rectangle = group.find(svg + 'rect')
-    x, y = map(int, re.fullmatch(r'translate\((\d+),(\d+)\)', group.get('transform')).groups())
-    return x, y, x + int(rectangle.get('width')), y + int(rectangle.get('height'))
-
-def check(groups, width, height):
-    global count
-    boxes = [box(group) for group in groups]
-    for i, (left, top, right, bottom) in enumerate(boxes):
-        assert 0 <= left < right <= width and 0 <= top < bottom <= height, (boxes[i], width, height)
-        for other in boxes[:i]:
-            assert right < other[0] or other[2] < left or bottom < other[1] or other[3] < top, (boxes[i], other)
-    for group, (left, top, right, bottom) in zip(groups, boxes):
-        count += 1
-        fills.add(group.find(svg + 'rect').get('fill'))
-        assert group.find(svg + 'title').text
-        for text in group.findall(svg + 'text'):
-            assert int(text.get('x')) + 6.7 * len(text.text) <= right - left, text.text
-            assert int(text.get('y')) < bottom - top
-        check(group.findall(svg + 'g'), right - left, bottom - top)
-
-legend = root.findall(svg + "g[@class='legend']")
-page = [group for group in root.findall(svg + 'g') if group not in legend]
-assert len(page) == 1
-top = int(re.fullmatch(r'translate\(0,(\d+)\)', page[0].get('transform')).group(1))
-check(page[0].findall(svg + 'g'), int(root.get('width')), int(root.get('height')) - top)
-assert fills == {entry.find(svg + 'rect').get('fill') for entry in legend}
-print('boxes: %d, colours: %d' % (count, len(legend)))
-)";
-
-class InventoryDrawing : public InventoryOutput {
-protected:
-    std::string draw(const std::string& machine) const
-    {
-        const Outcome outcome = run({"--svg", folder.path("machine.svg"), machine});
-        EXPECT_EQ(outcome.status, 0) << outcome.err;
-        EXPECT_EQ(outcome.out, "");
-        return folder.path("machine.svg");
-    }
-};
-
-TEST_F(InventoryDrawing, NestsTheBoxesAsTheNodes)
-{
-    Nodes nodes;
-    nodes.push_back(std::make_unique<Made>(IC::Node::SENSOR_CPU, "/cpu", "", "a<b"));
-    nodes.push_back(std::make_unique<Made>(IC::Node::SENSOR_FAN, "/cpu/fan", "/cpu", "\"x\" & \xff",
-                                           std::map<unsigned int, IC::PropertyValue> {}, STATUS_ALARM));
-    std::ostringstream out;
-    writeSvg(out, nodes);
-    EXPECT_EQ(out.str(), R"svg(<?xml version="1.0" encoding="UTF-8"?>
-<svg xmlns="http://www.w3.org/2000/svg" width="560" height="105" viewBox="0 0 560 105">
-<title>Inventory</title>
-<style>text { font: 11px monospace; fill: #000 } .name { font-weight: bold }
-rect { stroke: #555 } .page { stroke: none } .trouble { stroke: #c00; stroke-width: 3 }</style>
-<rect width="560" height="105" fill="#fff" class="page"/>
-<g class="legend" transform="translate(5,5)">
-<rect width="12" height="12" fill="#c6e0f5"/>
-<text x="17" y="11">CPU</text>
-</g>
-<g class="legend" transform="translate(187,5)">
-<rect width="12" height="12" fill="#bff3f7"/>
-<text x="17" y="11">Fan</text>
-</g>
-<g transform="translate(0,25)">
-<g transform="translate(5,0)">
-<title>CPU cpu: a&lt;b</title>
-<rect width="90" height="75" fill="#c6e0f5"/>
-<text x="5" y="13" class="name">cpu</text>
-<text x="5" y="28">a&lt;b</text>
-<g transform="translate(5,35)">
-<title>Fan fan: "x" &amp; \xff -- it raises an alarm</title>
-<rect width="80" height="35" fill="#bff3f7" class="trouble"/>
-<text x="5" y="13" class="name">fan</text>
-<text x="5" y="28">"x" &amp; \xff</text>
-</g>
-</g>
-</g>
-</svg>
-)svg");
-}
-
-TEST_F(InventoryDrawing, IsValidAndLegibleForEveryMachine)
-{
-    if (realMachines().empty())
-        GTEST_SKIP() << whyNoMachines;
-    for (const std::string& machine : realMachines()) {
-        SCOPED_TRACE(machine);
-        std::string nodes;
-        for (const std::string& line : linesOf(run({machine}).out))
-            if (line.compare(0, 7, "Nodes: ") == 0)
-                nodes = line;
-        EXPECT_EQ(readByPython(measure, draw(machine)),
-                  std::regex_replace(nodes, std::regex("Nodes: (.*), sensor types: (.*)"),
-                                     "boxes: $1, colours: $2\n"));
-    }
-}
-
-TEST_F(InventoryDrawing, IsValidForTextsThatAreNotUtf8)
-{
-    EXPECT_EQ(readByPython(measure, draw(hostile)), "boxes: 3, colours: 3\n");
-}
-
-TEST_F(InventoryDrawing, HasALightColourOfItsOwnForEachSensorType)
-{
-    // The contrast as WCAG defines it; its strictest level demands 7.
-    const auto contrastToBlack = [](const std::string& fill) {
-        const double weights[] = {0.2126, 0.7152, 0.0722};
-        double luminance = 0;
-        for (std::size_t i = 0; i < 3; ++i) {
-            const double part = std::stoi(fill.substr(1 + 2 * i, 2), nullptr, 16) / 255.0;
-            luminance +=
-                weights[i] * (part <= 0.04045 ? part / 12.92 : std::pow((part + 0.055) / 1.055, 2.4));
-        }
-        return (luminance + 0.05) / 0.05;
-    };
-    std::set<std::string> fills;
-    for (unsigned int sensor = 0; sensor <= IC::Node::SENSOR_LARGEST; ++sensor) {
-        const Colour& colour = colourOf(static_cast<IC::Node::SensorType>(sensor));
-        EXPECT_GE(contrastToBlack(colour.fill), 7) << IC::pst[sensor];
-        const bool isShared = colour.sensor == IC::Node::SENSOR_UNKNOWN;
-        EXPECT_TRUE(isShared || fills.insert(colour.fill).second) << IC::pst[sensor];
-    }
-    EXPECT_EQ(fills.size(), 27u);
-}
-
-TEST_F(InventoryDrawing, IsNotCreatedIfTheMachineCannotBeRead)
-{
-    const Outcome outcome = run({"--svg", folder.path("new.svg"), folder.path("missing.xml")});
-    EXPECT_EQ(outcome.status, 2);
-    EXPECT_FALSE(std::filesystem::exists(folder.path("new.svg")));
-}
-
-TEST_F(InventoryDrawing, FailsIfItCannotBeWritten)
-{
-    for (const std::string& drawing : {std::string("/dev/full"), folder.path("missing/machine.svg")}) {
-        const Outcome outcome = run({file, "--svg", drawing});
-        EXPECT_EQ(outcome.status, 1);
-        EXPECT_EQ(outcome.out, "");
-        EXPECT_EQ(outcome.err,
-                  "inventory: " + drawing + ": the output cannot be written: "
-                      + (drawing == "/dev/full" ? "No space left on device" : "No such file or directory")
-                      + '\n');
-    }
-}
-
 // --- The command line and the manual ---
 
 TEST_F(InventoryOutput, IsOneErrorLineForInvalidOptions)
@@ -611,8 +349,8 @@ TEST_F(InventoryOutput, HasTheSameOptionsInHelpAndManual)
 {
     const std::string help = run({"--help"}).out;
     const std::string manual = contentOf(INVENTORY_MANUAL);
-    const std::set<std::string> expected {"diff",       "help", "json", "log",     "output",
-                                          "properties", "set",  "svg",  "version", "watch"};
+    const std::set<std::string> expected {"all",    "diff",       "help", "html", "json",    "log",
+                                          "output", "properties", "set",  "svg",  "version", "watch"};
     EXPECT_EQ(optionsIn(help, "--"), expected);
     EXPECT_EQ(optionsIn(manual, "\n\\.It Fl (?:h , )?-"), expected);
     EXPECT_EQ(optionsIn(manual.substr(manual.find(".Sh EXAMPLES")), "--"),

@@ -111,6 +111,16 @@ inline std::vector<std::string> linesOf(const std::string& text)
     return lines;
 }
 
+#ifdef PYTHON
+// The output of a Python program that reads the file. The program fails if the file is not valid.
+inline std::string readByPython(const std::string& program, const std::string& file)
+{
+    const Outcome outcome = runProgram({PYTHON, "-c", program, file});
+    EXPECT_EQ(outcome.status, 0) << outcome.err;
+    return outcome.out;
+}
+#endif
+
 #ifdef IC_TEST_TOPOLOGIES
 constexpr const char* whyNoMachines =
     "no folder with exports of real machines (CMake variable IC_TEST_TOPOLOGIES)";
