@@ -5,8 +5,10 @@
 #include <cmath>
 #include <map>
 #include <set>
+#include <string_view>
 #include <tuple>
 
+#include "alerts.h"
 #include "values.h"
 
 namespace inventory {
@@ -87,6 +89,38 @@ IC::NumberArray threadsOf(const IC::Node& node)
                                                                     : IC::NumberArray {};
 }
 
+// Whether the fact only tells how the machine was read.
+bool isAboutReading(const std::string& fact)
+{
+    static constexpr std::string_view names[] = {"Backend=", "LinuxCgroup=", "ProcessName=", "hwlocVersion="};
+    return std::any_of(std::begin(names), std::end(names),
+                       [&fact](std::string_view name) { return fact.compare(0, name.size(), name) == 0; });
+}
+
+// The properties without what only tells how the machine was read.
+std::map<unsigned int, IC::PropertyValue> compared(const IC::Node& node)
+{
+    auto properties = node.getProperties();
+    properties.erase(KEY_READ_AT);
+    properties.erase(KEY_SOURCE_VERSION);
+    const auto others = properties.find(KEY_OTHER_FACTS);
+    if (others == properties.end() || others->second.getKind() != IC::PropertyValue::KIND_STRINGARRAY)
+        return properties;
+    IC::StringArray facts = others->second;
+    facts.erase(std::remove_if(facts.begin(), facts.end(), isAboutReading), facts.end());
+    if (facts.empty())
+        properties.erase(others);
+    else
+        others->second = IC::PropertyValue(facts, others->second.readOnly());
+    return properties;
+}
+
+bool isReading(unsigned int key)
+{
+    return key == KEY_READING || key == KEY_AVERAGE || key == KEY_LOWEST || key == KEY_HIGHEST
+        || key == KEY_AVERAGE_LOWEST || key == KEY_AVERAGE_HIGHEST;
+}
+
 class Comparison {
 public:
     Comparison(const Nodes& before, const Nodes& after) : before_(before), after_(after)
@@ -96,10 +130,10 @@ public:
             if (const IC::Node* now = laterOf(*node); now != nullptr)
                 compare(*node, *now);
             else
-                add({Change::NODE, node.get(), 0, node->getDescription(), {}});
+                add({Change::NODE, node.get(), node.get(), 0, node->getDescription(), {}});
         for (const auto& node : after)
             if (earlierOf(*node) == nullptr)
-                add({Change::NODE, node.get(), 0, {}, node->getDescription()});
+                add({Change::NODE, node.get(), nullptr, 0, {}, node->getDescription()});
     }
 
     std::vector<Change> take() { return std::move(changes_); }
@@ -175,22 +209,20 @@ private:
         const unsigned int statusThen = then.getStatus();
         const unsigned int statusNow = now.getStatus();
         if (statusThen != statusNow)
-            add({Change::STATUS, &now, 0, std::to_string(statusThen), std::to_string(statusNow)});
-        const auto old = then.getProperties();
-        const auto current = now.getProperties();
+            add({Change::STATUS, &now, &then, 0, std::to_string(statusThen), std::to_string(statusNow)});
+        const auto old = compared(then);
+        const auto current = compared(now);
         for (const auto& [key, value] : old) {
             const auto found = current.find(key);
-            if (key == KEY_READ_AT)
-                continue;
             if (found == current.end())
-                add({Change::PROPERTY, &now, key, before_.textOf(value), {}});
+                add({Change::PROPERTY, &now, &then, key, before_.textOf(value), {}});
             else if (!same(value, found->second)
                      && !(key == KEY_PARENT && followsFromParent(value, found->second)))
-                add(changed(now, key, value, found->second));
+                add(changed(then, now, key, value, found->second));
         }
         for (const auto& [key, value] : current)
-            if (key != KEY_READ_AT && old.count(key) == 0)
-                add({Change::PROPERTY, &now, key, {}, after_.textOf(value)});
+            if (old.count(key) == 0)
+                add({Change::PROPERTY, &now, &then, key, {}, after_.textOf(value)});
     }
 
     // Numbers that the library's operators call unequal differ, except that a real NaN equals no number, not even
@@ -235,8 +267,8 @@ private:
                           [this](const auto& one, const auto& other) { return same(one, other); });
     }
 
-    Change changed(const IC::Node& node, unsigned int key, const IC::PropertyValue& then,
-                   const IC::PropertyValue& now) const
+    Change changed(const IC::Node& nodeThen, const IC::Node& nodeNow, unsigned int key,
+                   const IC::PropertyValue& then, const IC::PropertyValue& now) const
     {
         std::string from = before_.textOf(then);
         std::string to = after_.textOf(now);
@@ -244,7 +276,7 @@ private:
             from += std::string(" (") + kindName(then) + ')';
             to += std::string(" (") + kindName(now) + ')';
         }
-        return {Change::PROPERTY, &node, key, from, to};
+        return {Change::PROPERTY, &nodeNow, &nodeThen, key, from, to};
     }
 
     Side before_;
@@ -259,6 +291,25 @@ private:
 std::vector<Change> changesBetween(const Nodes& before, const Nodes& after)
 {
     return Comparison(before, after).take();
+}
+
+std::vector<Change> withoutMereReadings(std::vector<Change> changes)
+{
+    const auto isMere = [](const Change& change) {
+        return change.subject == Change::PROPERTY && isReading(change.key)
+            && troublesOf(*change.before) == troublesOf(*change.node);
+    };
+    changes.erase(std::remove_if(changes.begin(), changes.end(), isMere), changes.end());
+    return changes;
+}
+
+Nodes withoutSensors(Nodes nodes)
+{
+    const auto isSensor = [](const std::unique_ptr<IC::Node>& node) {
+        return node->getProperties().count(KEY_CHIP) != 0;
+    };
+    nodes.erase(std::remove_if(nodes.begin(), nodes.end(), isSensor), nodes.end());
+    return nodes;
 }
 
 }  // namespace inventory

@@ -144,4 +144,9 @@ void writeJson(std::ostream& out, const Nodes& nodes, const std::vector<IC::Aler
     out << document.dump(2) << '\n';
 }
 
+void writeJsonLine(std::ostream& out, const IC::Alert& alert)
+{
+    out << jsonOf(alert).dump() << '\n';
+}
+
 }  // namespace inventory

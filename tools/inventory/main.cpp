@@ -21,6 +21,7 @@
 #include "notice.h"
 #include "output.h"
 #include "reading.h"
+#include "saving.h"
 #include "values.h"
 #include "watching.h"
 #include "writing.h"
@@ -87,14 +88,19 @@ struct Request {
     TreeForm form;
     std::tuple<std::string, std::string, std::string> setting;
     std::vector<std::string> sides;
-    std::string output;  // "-": standard output
+    std::string output = "-";  // standard output
+    std::string drawing = "-";
+    std::string page = "-";
+    std::string saved = "-";
     std::string period;
+    bool withReadings = false;
 };
 
 Inventory readFrom(const std::string& file)
 {
     try {
-        return readExport(readFile(file));
+        const std::string content = readFile(file);
+        return isSaved(content) ? readSaved(content) : readExport(content);
     } catch (const BadInput& bad) {
         throw BadInput(file + ": " + bad.what());
     }
@@ -105,6 +111,7 @@ Inventory readHere()
     Inventory inventory = readThisMachine();
     readMemory(inventory);
     readSensors(inventory);
+    inventory.hasSensors = true;
     return inventory;
 }
 
@@ -124,16 +131,24 @@ void describe(std::ostream& out, const Nodes& nodes, const TreeForm& form)
     writeSummary(out, nodes);
 }
 
-int compare(std::ostream& out, const std::vector<std::string>& sides, const Look& look)
+int compare(std::ostream& out, const Request& request)
 {
-    const Inventory old = readFrom(sides.front());
-    const Inventory current = sides.size() > 1 ? readFrom(sides[1]) : readHere();
-    const auto changes = changesBetween(old.nodes, current.nodes);
+    const std::vector<std::string>& sides = request.sides;
+    Inventory old = readFrom(sides.front());
+    Inventory current = sides.size() > 1 ? readFrom(sides[1])
+        : old.hasSensors                 ? readHere()
+                                         : readThisMachine();
+    if (old.hasSensors != current.hasSensors)
+        for (Inventory* side : {&old, &current})
+            side->nodes = withoutSensors(std::move(side->nodes));
+    auto changes = changesBetween(old.nodes, current.nodes);
+    if (!request.withReadings)
+        changes = withoutMereReadings(std::move(changes));
     if (changes.empty())
         return EXIT_DONE;
     out << "--- " << printable(sides.front()) << "\n+++ "
         << (sides.size() > 1 ? printable(sides[1]) : "this machine") << '\n';
-    writeChanges(out, changes, look);
+    writeChanges(out, changes, request.form.look);
     return EXIT_DIFFERENT;
 }
 
@@ -195,12 +210,15 @@ std::string help()
     const std::string name = program_invocation_short_name;
     const std::pair<const char*, const char*> examples[] = {
         {"", "this machine as a tree"},
-        {" --properties day1.xml", "all properties of the machine of that file"},
-        {" --diff day1.xml day2.xml", "what has changed in between"},
+        {" --save day1.json", "keeps it, to read or compare it later"},
+        {" --properties day1.json", "all properties of the machine of that file"},
+        {" --diff day1.json", "what has changed since then"},
         {" --watch 10", "alerts, as changes happen"},
         {" --json | jq -r '.nodes[].path'", "the paths of all nodes"},
         {" --svg machine.svg", "a drawing"},
         {" --html machine.html", "a page for a browser, with the drawing and a search"},
+        {" --check", "a line and an exit status for a monitoring system"},
+        {" --metrics --output ic.prom", "metrics for the node exporter of Prometheus"},
     };
     std::ostringstream text;
     text << "Examples:\n";
@@ -209,6 +227,7 @@ std::string help()
     text << "\nExit status: 0; 1 if --set is refused, --diff finds differences or the output cannot be "
             "written;\n"
             "2 for options or input that cannot be used, and for --diff if the output cannot be written.\n"
+            "With --check: 0 all is well, 1 a warning, 2 critical, 3 cannot tell.\n"
             "Log records go to standard error; SPDLOG_LEVEL=trace shows all of them, SPDLOG_LEVEL=off none.\n"
             "On a terminal the tree is drawn with lines and colours; NO_COLOR=1 turns the colours off.";
     return text.str();
@@ -223,8 +242,8 @@ int run(int argc, char** argv)
                          program_invocation_short_name
                              + std::string(" " INVENTORY_VERSION ", hwloc " HWLOC_VERSION));
     Request request;
-    const auto* file =
-        app.add_option("FILE", request.file, "A machine as hwloc exports it (lstopo FILE.xml)");
+    const auto* file = app.add_option(
+        "FILE", request.file, "A machine that --save has kept, or that hwloc exports (lstopo FILE.xml)");
     const auto* log =
         app.add_flag("--log", request.form.own, "Write each node in its own text form, as a log shows it");
     const auto* all =
@@ -232,11 +251,15 @@ int run(int argc, char** argv)
     const auto* properties = app.add_flag("--properties", request.form.withProperties,
                                           "Write the properties of each node: [number = value] name");
     const auto* json = app.add_flag("--json", "Write the nodes, their properties and the alerts as JSON");
-    std::string drawing = "-";
-    const auto* svg = app.add_option("--svg", drawing, "Draw the machine into SVG")->type_name("SVG");
-    std::string page = "-";
-    const auto* html = app.add_option("--html", page, "Write all about the machine as one page into HTML")
-                           ->type_name("HTML");
+    const auto* metrics = app.add_flag("--metrics", "Write metrics in the text format that Prometheus reads");
+    const auto* check = app.add_flag(
+        "--check", "Write a line for monitoring systems, with the readings; see the exit status");
+    const auto* save = app.add_option("--save", request.saved, "Keep the machine, with its sensors, in SAVED")
+                           ->type_name("SAVED");
+    const auto* svg = app.add_option("--svg", request.drawing, "Draw the machine into SVG")->type_name("SVG");
+    const auto* html =
+        app.add_option("--html", request.page, "Write all about the machine as one page into HTML")
+            ->type_name("HTML");
     const auto* output =
         app.add_option("--output", request.output,
                        "Write to OUTPUT, as a whole or not at all, instead of to standard output")
@@ -249,6 +272,8 @@ int run(int argc, char** argv)
     const auto* watching = app.add_option("--watch", request.period,
                                           "Read again every SECONDS and write what changed, as alerts")
                                ->type_name("SECONDS");
+    const auto* readings = app.add_flag("--readings", request.withReadings,
+                                        "With --watch and --diff: also readings that pass no limit");
     const auto* set =
         app.add_option("--set", request.setting, "Change one property and write the outcome, nothing else")
             ->type_name("PATH NUMBER TEXT");
@@ -258,23 +283,28 @@ int run(int argc, char** argv)
         return flushed(app.exit(success), EXIT_REFUSED);
     }
     for (const CLI::Option* form : {log, all, properties})
-        for (const CLI::Option* mode : {set, json, svg, html, watching, diff})
+        for (const CLI::Option* mode : {set, json, metrics, check, save, svg, html, watching, diff})
             allowOne({form, mode});
-    allowOne({set, json, svg, html, watching, diff});
+    allowOne({set, json, metrics, check, save, svg, html, diff});
+    for (const CLI::Option* mode : {set, metrics, check, save, svg, html, diff, output})
+        allowOne({mode, watching});
     if (request.sides.size() > 2 || (isGiven(diff) && isGiven(file)))
         throw BadInput("--diff and FILE exclude each other");
-    allowOne({watching, output});
+    if (isGiven(readings) && !isGiven(watching) && !isGiven(diff))
+        throw BadInput("--readings needs --watch or --diff");
 
     const auto read = [&] { return isGiven(file) ? readFrom(request.file) : readHere(); };
     if (isGiven(watching)) {
-        watch(read, secondsIn(request.period), std::cout, lookOfStandardOutput());
+        watch(read, {secondsIn(request.period), request.withReadings, isGiven(json), lookOfStandardOutput()},
+              std::cout);
         return flushed(EXIT_DONE, EXIT_REFUSED);
     }
 
     // Each option that names a file of its own.
-    std::string target = isGiven(output) ? request.output : "-";
-    for (const auto& [option, own] : {std::pair(svg, &drawing), std::pair(html, &page)}) {
-        if (isGiven(option) && *own != "-") {
+    std::string target = request.output;
+    for (const auto& [option, own] : {std::pair(save, &request.saved), std::pair(svg, &request.drawing),
+                                      std::pair(html, &request.page)}) {
+        if (*own != "-") {
             allowOne({option, output});
             target = *own;
         }
@@ -282,8 +312,7 @@ int run(int argc, char** argv)
     request.form.look = target == "-" ? lookOfStandardOutput() : lookOfFile();
     if (isGiven(diff))
         return written(
-            target, [&](std::ostream& out) { return compare(out, request.sides, request.form.look); },
-            EXIT_BAD_INPUT);
+            target, [&](std::ostream& out) { return compare(out, request); }, EXIT_BAD_INPUT);
     const Inventory inventory = [&] {
         const Notice notice("reading the machine...");
         return read();
@@ -292,17 +321,24 @@ int run(int argc, char** argv)
         if (isGiven(set))
             return std::apply([&](const auto&... words) { return change(out, inventory.nodes, words...); },
                               request.setting);
+        const auto alerts = alertsOf(inventory.nodes);
+        if (isGiven(check))
+            return writeCheck(out, inventory.nodes, alerts);
         if (isGiven(svg))
             writeSvg(out, inventory.nodes);
         else if (isGiven(html))
             writeHtml(out, inventory.nodes);
+        else if (isGiven(save))
+            writeSaved(out, inventory);
         else if (isGiven(json))
-            writeJson(out, inventory.nodes, alertsOf(inventory.nodes));
+            writeJson(out, inventory.nodes, alerts);
+        else if (isGiven(metrics))
+            writeMetrics(out, inventory.nodes, alerts, INVENTORY_VERSION);
         else
             describe(out, inventory.nodes, request.form);
         return EXIT_DONE;
     };
-    return written(target, write, EXIT_REFUSED);
+    return written(target, write, isGiven(check) ? int {CHECK_UNKNOWN} : int {EXIT_REFUSED});
 }
 
 }  // namespace
@@ -317,6 +353,11 @@ int main(int argc, char** argv)
         connectLog();
         return run(argc, argv);
     } catch (const std::exception& error) {
+        // A monitoring system reads only standard output, also if the options are wrong.
+        if (std::count(argv, argv + argc, std::string_view("--check")) != 0) {
+            writeUnknown(std::cout, error.what());
+            return flushed(CHECK_UNKNOWN, CHECK_UNKNOWN);
+        }
         complain(error.what());
         return EXIT_BAD_INPUT;
     }

@@ -1,5 +1,5 @@
 // Reads this machine, or the XML export of a machine, into nodes: with hwloc (reading.cpp), udev (memory.cpp) and
-// libsensors (sensors.cpp).
+// libsensors (sensors.cpp). saving.h reads saved machines.
 #pragma once
 
 #include <map>
@@ -23,6 +23,7 @@ struct Inventory {
     std::vector<std::unique_ptr<IC::Node>> nodes;
     Site machine;
     bool isThisSystem = false;  // false too if the environment makes hwloc describe another machine
+    bool hasSensors = false;    // whether they were read; no export has any
 
     // The site of a new node below `parent`, whose path lies below the path `place`, as a rule the parent's. A name of
     // more than 64 bytes is cut off, and a digest of it follows. A path that is taken gets "#2" and so on.

@@ -46,6 +46,16 @@ void writeChanges(std::ostream& out, const std::vector<Change>& changes, const L
 void writeSummary(std::ostream& out, const Nodes& nodes);
 
 void writeJson(std::ostream& out, const Nodes& nodes, const std::vector<IC::Alert>& alerts);
+void writeJsonLine(std::ostream& out, const IC::Alert& alert);  // an object without line breaks
+// In the format that Prometheus reads. The version is that of this program.
+void writeMetrics(std::ostream& out, const Nodes& nodes, const std::vector<IC::Alert>& alerts,
+                  const char* version);
+
+// The line for monitoring systems, and the exit status that they expect.
+enum CheckStatus : unsigned char { CHECK_OK, CHECK_WARNING, CHECK_CRITICAL, CHECK_UNKNOWN };
+CheckStatus writeCheck(std::ostream& out, const Nodes& nodes, const std::vector<IC::Alert>& alerts);
+void writeUnknown(std::ostream& out, const std::string& why);
+
 int writeSvg(std::ostream& out, const View& view);  // returns the drawing's width in its own units
 void writeHtml(std::ostream& out, const View& view);
 

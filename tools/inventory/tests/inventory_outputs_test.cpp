@@ -292,10 +292,13 @@ TEST_F(InventoryOutput, IsOneErrorLineForInvalidOptions)
         {{"--diff"}, "--diff"},
         {{"--set", "/machine", "4"}, "--set"},
         {{file, "--json", "--svg", "x"}, "--json and --svg exclude each other"},
-        {{file, "--json", "--watch", "1"}, "--json and --watch exclude each other"},
+        {{file, "--metrics", "--watch", "1"}, "--metrics and --watch exclude each other"},
+        {{file, "--output", "x", "--watch", "1"}, "--output and --watch exclude each other"},
+        {{file, "--output", "x", "--svg", "y"}, "--svg and --output exclude each other"},
+        {{file, "--readings"}, "--readings needs --watch or --diff"},
         {{file, "--svg", "x", "--watch", "1"}, "--svg and --watch exclude each other"},
         {{"--diff", file, file, "--json"}, "--json and --diff exclude each other"},
-        {{"--diff", file, file, "--watch", "1"}, "--watch and --diff exclude each other"},
+        {{"--diff", file, file, "--watch", "1"}, "--diff and --watch exclude each other"},
         {{file, "--set", "/machine", "4", "x", "--json"}, "--set and --json exclude each other"},
         {{file, "--set", "/machine", "4", "x", "--log"}, "--log and --set exclude each other"},
         {{file, "--json", "--properties"}, "--properties and --json exclude each other"},
@@ -349,12 +352,14 @@ TEST_F(InventoryOutput, HasTheSameOptionsInHelpAndManual)
 {
     const std::string help = run({"--help"}).out;
     const std::string manual = contentOf(INVENTORY_MANUAL);
-    const std::set<std::string> expected {"all",    "diff",       "help", "html", "json",    "log",
-                                          "output", "properties", "set",  "svg",  "version", "watch"};
+    const std::set<std::string> expected {"all", "check",   "diff",    "help",       "html",     "json",
+                                          "log", "metrics", "output",  "properties", "readings", "save",
+                                          "set", "svg",     "version", "watch"};
     EXPECT_EQ(optionsIn(help, "--"), expected);
     EXPECT_EQ(optionsIn(manual, "\n\\.It Fl (?:h , )?-"), expected);
     EXPECT_EQ(optionsIn(manual.substr(manual.find(".Sh EXAMPLES")), "--"),
-              (std::set<std::string> {"diff", "json", "properties", "set", "svg", "watch"}));
+              (std::set<std::string> {"check", "diff", "json", "metrics", "output", "properties", "save",
+                                      "set", "svg", "watch"}));
 }
 
 TEST(InventoryManual, ListsAllProperties)

@@ -286,14 +286,14 @@ protected:
         "\xff\xfe&quot;\x01\x1b[2J]]&gt;&lt;/text&gt;&lt;/td&gt;&lt;img src=x"
         " onerror=&quot;hacked=1&quot;&gt;&lt;/script&gt;&lt;script&gt;hacked=1&lt;/script&gt;"
         "&amp;amp;'\x7f\xed\xa0\x80\xc3\xa4";
-    std::string hostile =
-        folder.write("hostile.xml",
-                     machineOf(fact("HostName", hostileText) + fact("DMIProductName", hostileText)
-                                   + fact(hostileText, hostileText) + fact("UUID", "\xc3\xa4"),
-                               "<object type=\"OSDev\" osdev_type=\"2\" name=\"" + hostileText + "\">"
-                                   + fact("Address", hostileText)
-                                   + "</object><object type=\"Misc\" subtype=\"MemoryModule\">"
-                                   + fact("DeviceLocation", hostileText) + fact("PartNumber", hostileText) + "</object>"));
+    std::string hostile = folder.write(
+        "hostile.xml",
+        machineOf(fact("HostName", hostileText) + fact("DMIProductName", hostileText)
+                      + fact(hostileText, hostileText) + fact("UUID", "\xc3\xa4"),
+                  "<object type=\"OSDev\" osdev_type=\"2\" name=\"" + hostileText + "\">"
+                      + fact("Address", hostileText)
+                      + "</object><object type=\"Misc\" subtype=\"MemoryModule\">"
+                      + fact("DeviceLocation", hostileText) + fact("PartNumber", hostileText) + "</object>"));
 };
 
 TEST_F(InventoryViews, FollowTheLocaleInAPipe)
