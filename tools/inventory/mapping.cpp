@@ -61,6 +61,8 @@ const Row rows[] = {
     {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_BLOCK, "fd", Node::SENSOR_FLOPPY_DRIVE, "floppy", make<Device>},
     {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_BLOCK, "Removable Media Device", Node::SENSOR_UNKNOWN, "", nullptr},
     {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_BLOCK, "Tape", Node::SENSOR_UNKNOWN, "", nullptr},
+    {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_BLOCK, "sr", Node::SENSOR_UNKNOWN, "", nullptr},
+    {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_BLOCK, "st", Node::SENSOR_UNKNOWN, "", nullptr},
     {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_BLOCK, nullptr, Node::SENSOR_HARD_DRIVE, "disk", make<Device>},
     {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_GPU, nullptr, Node::SENSOR_VIDEO, "gpu", make<Device>},
     {HWLOC_OBJ_OS_DEVICE, HWLOC_OBJ_OSDEV_COPROC, nullptr, Node::SENSOR_VIDEO, "coproc", make<Device>},

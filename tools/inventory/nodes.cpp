@@ -388,7 +388,7 @@ void Component::addViews(const Subject& subject)
     std::set<std::string> names;
     ZQ::Uint64 memory = 0;
     for (hwloc_obj_t view : all) {
-        if (view->name != nullptr)
+        if (view->name != nullptr && *view->name != '\0')
             names.insert(view->name);
         if (view != subject.object)
             addFacts(view);

@@ -377,8 +377,8 @@ private:
             device = devices_.try_emplace(uuid, device).first->second;
         if (device == plans.size())
             return false;
-        plans[device].name =
-            std::min(plans[device].name, object->name == nullptr ? "" : std::string(object->name));
+        if (object->name != nullptr && *object->name != '\0')
+            plans[device].name = std::min(plans[device].name, std::string(object->name));
         plans[device].views.push_back(object);
         return true;
     }

@@ -484,6 +484,42 @@ TEST(InventoryNodes, HoldEveryKindOfValue)
     EXPECT_TRUE(alertsOf(inventory.nodes).empty());
 }
 
+TEST(InventoryNodes, JoinTheViewsOfOneDevice)
+{
+    const auto view = [](const char* type, const char* name, const std::string& facts) {
+        return std::string("<object type=\"OSDev\" osdev_type=\"") + type + "\" name=\"" + name + "\">"
+            + facts + "</object>";
+    };
+    const Inventory inventory = readExport(machineWith(
+        "",
+        view("5", "opencl0d0", info("NVIDIAUUID", "GPU-1")) + view("5", "cuda0", info("NVIDIAUUID", "GPU-1"))
+            + view("5", "", info("NVIDIAUUID", "GPU-1")) + view("5", "cuda1", info("NVIDIAUUID", "GPU-2"))
+            + view("5", "mic0", "")
+            // Classes without a sensor type: what the driver makes of the device.
+            + "<object type=\"PCIDev\" pci_busid=\"0000:01:00.0\" pci_type=\"ff00 [10de:1] [0000:0000] 01\">"
+            + view("1", "card0", "") + view("1", "renderD128", "") + view("4", "dma0", "") + "</object>"
+            + "<object type=\"PCIDev\" pci_busid=\"0000:02:00.0\" pci_type=\"0880 [8086:1] [0000:0000] 01\">"
+            + view("4", "dma1", "") + view("2", "eth0", "") + "</object>"
+            + "<object type=\"PCIDev\" pci_busid=\"0000:03:00.0\" pci_type=\"0c04 [8086:1] [0000:0000] 01\"/>"
+            + view("0", "sr0", "") + view("0", "st0", "") + view("0", "fd0", "") + view("0", "sdr0", "")
+            + "<object type=\"OSDev\" osdev_type=\"0\" name=\"x\" subtype=\"Tape\"/>"));
+    expectSound(inventory);
+    const auto paths = pathsOf(inventory);
+    EXPECT_EQ(std::vector(paths.begin() + 4, paths.end()),
+              (std::vector<std::string> {"/machine/cuda0", "/machine/cuda1", "/machine/mic0",
+                                         "/machine/display-0000:01:00.0", "/machine/eth0",
+                                         "/machine/storage-0000:03:00.0", "/machine/fd0", "/machine/sdr0"}));
+    EXPECT_THAT(property(nodeAt(inventory, "/machine/cuda0"), KEY_VIEWS).operator IC::StringArray(),
+                ElementsAre("cuda0", "opencl0d0"));
+    EXPECT_THAT(
+        property(nodeAt(inventory, "/machine/display-0000:01:00.0"), KEY_VIEWS).operator IC::StringArray(),
+        ElementsAre("card0", "renderD128"));
+    EXPECT_EQ(nodeAt(inventory, "/machine/fd0").getSensor(), IC::Node::SENSOR_FLOPPY_DRIVE);
+    EXPECT_EQ(nodeAt(inventory, "/machine/sdr0").getSensor(), IC::Node::SENSOR_HARD_DRIVE);
+    EXPECT_EQ(nodeAt(inventory, "/machine/storage-0000:03:00.0").getSensor(),
+              IC::Node::SENSOR_DISK_CONTROLLER);
+}
+
 TEST(InventoryNodes, KeepFactsThatCannotBeParsedAsText)
 {
     const Inventory inventory = readExport(
@@ -546,6 +582,23 @@ TEST(InventoryAlerts, AreRaisedOnceForACpuAndOnceForItsMemoryArray)
     EXPECT_EQ(nodeAt(inventory, "/machine/numa-1").getStatus(), STATUS_NOT_USABLE);
     EXPECT_EQ(nodeAt(inventory, "/machine/numa-0").getStatus(), STATUS_FINE);
     EXPECT_EQ(nodeAt(inventory, "/machine").getStatus(), STATUS_FINE);
+}
+
+TEST(InventoryAlerts, AreRaisedForTheMachineIfNoPartOfItInTheTreeLacksSomething)
+{
+    std::string xml = synthetic("pack:2 core:2 pu:2");
+    replace(xml, "complete_cpuset=\"0x000000ff\"", "complete_cpuset=\"0x00000fff\"");
+    replace(xml, "complete_nodeset=\"0x00000001\"", "complete_nodeset=\"0x00000007\"");
+    const Inventory inventory = readExport(xml);
+    const auto alerts = alertsOf(inventory.nodes);
+    ASSERT_EQ(alerts.size(), 1u);
+    EXPECT_THAT(alerts[0].getNodePaths(), ElementsAre("/machine"));
+    EXPECT_EQ(alerts[0].getStatus(), STATUS_PARTLY_USABLE);
+    const IC::Node& machine = nodeAt(inventory, "/machine");
+    EXPECT_EQ(property(machine, KEY_UNUSABLE_THREADS).operator unsigned int(), 4u);
+    EXPECT_EQ(property(machine, KEY_UNUSABLE_CORES).operator unsigned int(), 2u);
+    EXPECT_EQ(property(machine, KEY_UNUSABLE_CPUS).operator unsigned int(), 0u);
+    EXPECT_EQ(property(machine, KEY_UNUSABLE_MEMORY_ARRAYS).operator unsigned int(), 2u);
 }
 
 TEST(InventoryAlerts, AreRaisedForMemoryModulesOfUnknownSize)
