@@ -391,4 +391,74 @@ TEST_F(InventoryFleet, ReadsOrRefusesEachMutatedSavedMachine)
     EXPECT_LT(refused, 150);
 }
 
+// --- The watch and systemd ---
+
+// The lines that --watch writes to a file, which is its journal too, while the fan breaks again and again, until one of
+// them has this text.
+std::vector<std::string> watched(const Folder& folder, const std::string& option, const std::string& text)
+{
+    std::string broken = savedMachine("900", "46");
+    const std::string fan = "\"sensor\":20,\"status\":";
+    broken.replace(broken.find(fan), fan.size() + 1, fan + '4');
+    folder.write("fine", savedMachine("1200", "45"));
+    folder.write("broken", broken);
+    folder.write("now", savedMachine("1200", "45"));
+    const Outcome outcome =
+        runProgram({"sh", "-c",
+                    "cd \"$1\" && : >out && JOURNAL_STREAM=$(stat -c %d:%i out) && export JOURNAL_STREAM\n"
+                    "\"$2\" --watch 0.05 $3 now >out & watch=$!\n"
+                    "for turn in $(seq 300); do\n"
+                    "    for state in broken fine; do cp $state next; mv next now; sleep 0.1; done\n"
+                    "    grep -qF -e \"$4\" out && break\n"
+                    "done\n"
+                    "kill $watch; wait $watch; cat out",
+                    "sh", folder.path(""), INVENTORY_PROGRAM, option, text});
+    EXPECT_EQ(outcome.err, "");
+    return linesOf(outcome.out);
+}
+
+TEST_F(InventoryFleet, WatchesWithPrioritiesForTheJournal)
+{
+    const auto lines = watched(folder, "", "status changed from 0 to 4");
+    ASSERT_FALSE(lines.empty());
+    EXPECT_EQ(lines.front(), "<6>Nodes: 3, watched every 0.05 s");
+    EXPECT_THAT(lines, testing::Contains("<3>/machine/x:fan1, Fan: status changed from 0 to 4"));
+    EXPECT_THAT(lines, testing::Contains("<6>/machine/x:fan1, Fan: reading changed from 1200 to 900"));
+    for (const std::string& line : lines)
+        EXPECT_THAT(line, Not(HasSubstr("x:temp1")));  // its reading passes no limit
+}
+
+TEST_F(InventoryFleet, WatchesWithAJsonObjectALine)
+{
+    const auto lines =
+        watched(folder, "--json --readings", "Temperature Sensor: reading changed from 45 to 46");
+    ASSERT_FALSE(lines.empty());
+    for (const std::string& line : lines)
+        EXPECT_THAT(
+            line,
+            testing::MatchesRegex("<[0-9]>\\{\"time\":\"[0-9TZ:-]+\",\"severity\":[0-3],\"class\":[0-5],"
+                                  "\"status\":[0-9]+,\"paths\":\\[\"[^\"]+\"\\],\"message\":\"[^\"]+\"\\}"));
+}
+
+TEST_F(InventoryFleet, HasUnitsThatSystemdAccepts)
+{
+    if (std::string_view(SYSTEMD_ANALYZE).empty())
+        GTEST_SKIP() << "the Debian package systemd is missing";
+    const std::filesystem::path packaging = INVENTORY_PACKAGING;
+    const std::pair<const char*, const char*> units[] = {
+        {"ic-inventory.service", "ic-inventory.service"},
+        {"ic-inventory.ic-inventory-metrics.service", "ic-inventory-metrics.service"},
+        {"ic-inventory.ic-inventory-metrics.timer", "ic-inventory-metrics.timer"}};
+    std::vector<std::string> words {SYSTEMD_ANALYZE, "verify", "--man=no"};
+    for (const auto& [file, unit] : units) {
+        // The program need not be installed here.
+        const std::string text = contentOf(packaging / file);
+        words.push_back(
+            folder.write(unit, std::regex_replace(text, std::regex("/usr/bin/ic-inventory"), "/bin/true")));
+    }
+    const Outcome outcome = runProgram(words);
+    EXPECT_EQ(outcome.status, 0);
+    EXPECT_EQ(outcome.out + outcome.err, "");
+}
+
 }  // namespace
