@@ -46,10 +46,14 @@ std::optional<double> numberOf(const Properties& properties, unsigned int key)
 }
 
 // "8 cores"; "" for 0, which means that the number is not known.
+std::string amountOf(double number, const char* word)
+{
+    return number >= 1 && number < 1e15 ? counted(static_cast<std::size_t>(number), word) : "";
+}
+
 std::string countOf(const Properties& properties, unsigned int key, const char* word)
 {
-    const double number = numberOf(properties, key).value_or(0);
-    return number >= 1 ? counted(static_cast<std::size_t>(number), word) : "";
+    return amountOf(numberOf(properties, key).value_or(0), word);
 }
 
 std::string sizeOf(const Properties& properties, unsigned int key = KEY_SIZE)
@@ -679,9 +683,6 @@ std::vector<Entry> View::entries() const
         cores.first += numberOf(shown->properties, KEY_CORES).value_or(0);
         cores.second += numberOf(shown->properties, KEY_THREADS).value_or(0);
     }
-    const auto amount = [](double number, const char* word) {
-        return number >= 1 ? counted(static_cast<std::size_t>(number), word) : "";
-    };
     for (const std::string& model : models) {
         const auto& [number, cores] = sums[model];
         if (processors.lines.size() + 1 == most && models.size() > most) {
@@ -691,7 +692,7 @@ std::vector<Entry> View::entries() const
         }
         processors.lines.push_back(
             joined({model.empty() ? counted(number, "processor") : times(number, model),
-                    amount(cores.first, "core"), amount(cores.second, "thread")}));
+                    amountOf(cores.first, "core"), amountOf(cores.second, "thread")}));
     }
     if (processors.lines.empty()) {
         const std::string counts =

@@ -393,7 +393,7 @@ TEST_F(InventoryViews, NameTheProgramInItsHelpAsItWasStarted)
     const Outcome help = runProgram({other, "--help"});
     EXPECT_EQ(help.status, 0);
     EXPECT_THAT(help.out, HasSubstr("Usage: other-name "));
-    EXPECT_THAT(help.out, HasSubstr("\n  other-name --diff day1.xml day2.xml "));
+    EXPECT_THAT(help.out, HasSubstr("\n  other-name --diff day1"));
     EXPECT_THAT(help.out, Not(HasSubstr("inventory")));
 }
 
@@ -597,6 +597,88 @@ TEST_F(InventoryDrawing, GoesToAFileOrToStandardOutput)
                         AllOf(StartsWith("inventory: " + bad + ": "), HasSubstr(" cannot be written")));
         }
     }
+}
+
+// --- The page ---
+
+// Opens each page in a frame of each width, and writes what is wrong with it. PAGES is a list of file names.
+constexpr const char* driver = R"(<!DOCTYPE html><meta charset="utf-8"><body><script>
+(async () => {
+    const wrong = [];
+    let checks = 0;
+    for (const name of PAGES)
+        for (const width of [1280, 400]) {
+            const frame = document.createElement('iframe');
+            frame.style.cssText = 'border: 0; height: 700px; width: ' + width + 'px';
+            frame.src = name;
+            const loaded = new Promise(done => frame.onload = done);
+            document.body.append(frame);
+            await loaded;
+            const page = frame.contentWindow.document;
+            const expect = (is, what) => { ++checks; if (!is) wrong.push(name + ' ' + width + ': ' + what); };
+            expect(frame.contentWindow.errors.length === 0, 'errors ' + frame.contentWindow.errors);
+            expect(frame.contentWindow.hacked === undefined, 'a text was run');
+            expect(!page.querySelector('img, [src]'), 'refers to another file');
+            expect([...page.querySelectorAll('[href]')].every(one => /^(#|data:)/.test(one.getAttribute('href'))), 'a link');
+            expect(page.documentElement.scrollWidth <= width, 'is wider: ' + page.documentElement.scrollWidth);
+            const wide = [...page.body.querySelectorAll('*')].filter(one => one.getBoundingClientRect().right > width + 0.5);
+            expect(wide.length === 0, 'wide: ' + wide.slice(0, 3).map(one => one.outerHTML.slice(0, 100)));
+            expect(page.querySelector('svg').getBoundingClientRect().width > 0.7 * Math.min(width, 600), 'a narrow drawing');
+
+            const search = page.querySelector('input');
+            const rows = [...page.querySelectorAll('.nodes tbody tr')];
+            const shown = () => rows.filter(row => row.getBoundingClientRect().height > 0);
+            const searchFor = text => { search.value = text; search.dispatchEvent(new Event('input', {bubbles: true})); };
+            expect(shown().length === rows.length && rows.length > 0, 'hides rows at first');
+            for (const text of ['CPU', 'hardware threads', '/machine', 'no such text']) {
+                searchFor(text);
+                const fitting = rows.filter(row => row.textContent.toLowerCase().includes(text.toLowerCase()));
+                const now = shown();
+                expect(now.length === fitting.length && now.every((row, i) => row === fitting[i]), 'search for ' + text);
+                expect((text === 'no such text') === (now.length === 0), 'found ' + now.length + ' for ' + text);
+            }
+            searchFor('');
+            expect(shown().length === rows.length, 'does not show all rows again');
+            frame.remove();
+        }
+    document.body.textContent = wrong.length ? wrong.join('\n') : 'ALL WELL after ' + checks + ' checks';
+})().catch(error => document.body.textContent = 'FAILED: ' + error);
+</script>)";
+
+class InventoryPage : public InventoryViews { };
+
+TEST_F(InventoryPage, WorksInABrowser)
+{
+#ifdef CHROMIUM
+    std::vector<std::string> machines = realMachines();
+    machines.push_back(hostile);
+    std::string pages;
+    for (const std::string& machine : machines) {
+        const Outcome outcome = run({"--html", "-", machine});
+        ASSERT_EQ(outcome.status, 0) << outcome.err;
+        std::string page = outcome.out;
+        page.insert(page.find("<head>") + 6,
+                    "<script>errors = []; addEventListener('error', one => errors.push(one.message));"
+                    " addEventListener('securitypolicyviolation', () => errors.push('policy'))"
+                    "</script>");
+        const std::string name = std::filesystem::path(machine).stem().string() + ".html";
+        folder.write(name, page);
+        pages += (pages.empty() ? "'" : ", '") + name + '\'';
+    }
+    std::string test = driver;
+    test.replace(test.find("PAGES"), 5, '[' + pages + ']');
+    const Outcome outcome = runProgram(
+        {"env", "HOME=" + folder.path("home"), CHROMIUM, "--headless=new", "--no-sandbox", "--disable-gpu",
+         "--user-data-dir=" + folder.path("profile"), "--allow-file-access-from-files",
+         "--enable-logging=stderr", "--virtual-time-budget=600000", "--dump-dom",
+         "file://" + folder.write("driver.html", test)});
+    EXPECT_EQ(outcome.status, 0);
+    EXPECT_THAT(outcome.out,
+                HasSubstr("ALL WELL after " + std::to_string(machines.size() * 2 * 17) + " checks"));
+    EXPECT_THAT(outcome.err, Not(HasSubstr("CONSOLE")));
+#else
+    GTEST_SKIP() << "the Debian package chromium is missing";
+#endif
 }
 
 }  // namespace
