@@ -18,11 +18,11 @@ constexpr auto intrusion = IC::Node::SENSOR_INTRUSION;
 // clang-format off
 constexpr Trouble troubles[] = {
     {Trouble::ABOVE, KEY_EMERGENCY_LIMIT, all, STATUS_OUTSIDE_LIMITS, 3, CLASS_ENVIRONMENT, "it is above its emergency limit"},
-    {Trouble::FLAG_SET, KEY_EMERGENCY_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises the alarm of its emergency limit"},
+    {Trouble::FLAG_SET, KEY_EMERGENCY_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises its emergency alarm"},
     {Trouble::ABOVE, KEY_UPPER_CRITICAL, all, STATUS_OUTSIDE_LIMITS, 3, CLASS_ENVIRONMENT, "it is above its upper critical limit"},
-    {Trouble::FLAG_SET, KEY_CRIT_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises the alarm of its upper critical limit"},
+    {Trouble::FLAG_SET, KEY_CRIT_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises its upper critical alarm"},
     {Trouble::BELOW, KEY_LOWER_CRITICAL, all, STATUS_OUTSIDE_LIMITS, 3, CLASS_ENVIRONMENT, "it is below its lower critical limit"},
-    {Trouble::FLAG_SET, KEY_LCRIT_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises the alarm of its lower critical limit"},
+    {Trouble::FLAG_SET, KEY_LCRIT_ALARM, all, STATUS_ALARM, 3, CLASS_ENVIRONMENT, "it raises its lower critical alarm"},
     {Trouble::IN_STATUS, STATUS_NOT_USABLE, all, STATUS_NOT_USABLE, 2, CLASS_CONFIGURATION, "the system may not use it"},
     {Trouble::FLAG_SET, KEY_FAULT, all, STATUS_FAULT, 2, CLASS_ENVIRONMENT, "it reports a fault"},
     {Trouble::FLAG_SET, KEY_ALARM, all, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises an alarm"},
@@ -30,17 +30,17 @@ constexpr Trouble troubles[] = {
     {Trouble::IN_STATUS, STATUS_ALARM, all, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises an alarm"},
     {Trouble::IN_STATUS, STATUS_FAULT, all, STATUS_FAULT, 2, CLASS_ENVIRONMENT, "it reports a fault"},
     {Trouble::BELOW, KEY_LOWER_LIMIT, fan, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is below its lower limit"},
-    {Trouble::FLAG_SET, KEY_MIN_ALARM, fan, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises the alarm of its lower limit"},
+    {Trouble::FLAG_SET, KEY_MIN_ALARM, fan, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises its lower alarm"},
     {Trouble::BELOW, KEY_LOWER_LIMIT, voltage, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is below its lower limit"},
-    {Trouble::FLAG_SET, KEY_MIN_ALARM, voltage, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises the alarm of its lower limit"},
+    {Trouble::FLAG_SET, KEY_MIN_ALARM, voltage, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises its lower alarm"},
     {Trouble::ABOVE, KEY_UPPER_LIMIT, voltage, STATUS_OUTSIDE_LIMITS, 2, CLASS_ENVIRONMENT, "it is above its upper limit"},
-    {Trouble::FLAG_SET, KEY_MAX_ALARM, voltage, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises the alarm of its upper limit"},
+    {Trouble::FLAG_SET, KEY_MAX_ALARM, voltage, STATUS_ALARM, 2, CLASS_ENVIRONMENT, "it raises its upper alarm"},
     {Trouble::ABOVE, KEY_UPPER_LIMIT, all, STATUS_OUTSIDE_LIMITS, 1, CLASS_ENVIRONMENT, "it is above its upper limit"},
-    {Trouble::FLAG_SET, KEY_MAX_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises the alarm of its upper limit"},
+    {Trouble::FLAG_SET, KEY_MAX_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises its upper alarm"},
     {Trouble::BELOW, KEY_LOWER_LIMIT, all, STATUS_OUTSIDE_LIMITS, 1, CLASS_ENVIRONMENT, "it is below its lower limit"},
-    {Trouble::FLAG_SET, KEY_MIN_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises the alarm of its lower limit"},
+    {Trouble::FLAG_SET, KEY_MIN_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises its lower alarm"},
     {Trouble::ABOVE, KEY_CAP, all, STATUS_OUTSIDE_LIMITS, 1, CLASS_ENVIRONMENT, "it is above its cap"},
-    {Trouble::FLAG_SET, KEY_CAP_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises the alarm of its cap"},
+    {Trouble::FLAG_SET, KEY_CAP_ALARM, all, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "it raises its cap alarm"},
     {Trouble::FLAG_SET, KEY_ALARM, intrusion, STATUS_ALARM, 1, CLASS_ENVIRONMENT, "the chassis has been opened"},
     {Trouble::NO_READING, KEY_READING, all, STATUS_UNREAD, 1, CLASS_ENVIRONMENT, "it cannot be read"},
     {Trouble::IN_STATUS, STATUS_UNREAD, all, STATUS_UNREAD, 1, CLASS_ENVIRONMENT, "it cannot be read"},
@@ -184,6 +184,11 @@ IC::Alert alertOf(const Change& change)
 }
 
 }  // namespace
+
+std::vector<Trouble> allTroubles()
+{
+    return {std::begin(troubles), std::end(troubles)};
+}
 
 std::vector<const Trouble*> troublesOf(const IC::Node& node)
 {

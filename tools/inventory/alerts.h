@@ -24,6 +24,7 @@ struct Trouble {
     AlertClass alertClass;
     const char* words;
 };
+std::vector<Trouble> allTroubles();                            // the table
 std::vector<const Trouble*> troublesOf(const IC::Node& node);  // in the order of the table, the worst first
 const Trouble* troubleOf(const IC::Node& node);                // the worst, or null
 

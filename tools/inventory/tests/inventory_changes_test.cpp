@@ -198,7 +198,7 @@ TEST(InventoryChanges, BecomeAlertsWithASeverityAndAClass)
         return one(fan, {{KEY_CRIT_ALARM, IC::Number(isSet)}}, STATUS_ALARM);
     };
     EXPECT_EQ(alert(flagged(false), flagged(true)),
-              "3 2 5 Fan: alarm of the upper critical limit changed from false to true");
+              "3 2 5 Fan: upper critical alarm changed from false to true");
     EXPECT_EQ(alert(one(cpu), one(cpu, {}, STATUS_PARTLY_USABLE)), "1 1 2 CPU: status changed from 0 to 2");
 }
 

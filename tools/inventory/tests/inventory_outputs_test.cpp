@@ -5,6 +5,7 @@
 #include <regex>
 #include <set>
 
+#include "alerts.h"
 #include "inventory_run.h"
 #include "writing.h"
 
@@ -378,6 +379,29 @@ TEST(InventoryManual, ListsAllProperties)
     const auto begin = manual.find(".It 1 Ta ");
     ASSERT_NE(begin, std::string::npos);
     EXPECT_EQ(manual.substr(begin, manual.find(".El\n", begin) - begin), table);
+}
+
+TEST(InventoryManual, ListsAllAlerts)
+{
+    std::map<unsigned int, std::string> tables;  // by severity
+    for (const Trouble& trouble : allTroubles()) {
+        const bool isOfStatus = trouble.sign == Trouble::IN_STATUS;
+        EXPECT_EQ(trouble.alertClass,
+                  isOfStatus && trouble.number <= STATUS_SIZE_UNKNOWN ? CLASS_CONFIGURATION
+                                                                      : CLASS_ENVIRONMENT);
+        tables[trouble.severity] += ".It "
+            + (isOfStatus ? "status " + std::to_string(trouble.number) : infoOf(trouble.number)->identifier)
+            + " Ta " + trouble.words + " Ta"
+            + (trouble.sensor == IC::Node::SENSOR_UNKNOWN ? "" : ' ' + IC::pst[trouble.sensor]) + '\n';
+    }
+    const std::string manual = contentOf(INVENTORY_MANUAL);
+    for (const auto& [severity, table] : tables) {
+        const auto begin = manual.find("\nSeverity " + std::to_string(severity) + ", ");
+        ASSERT_NE(begin, std::string::npos);
+        const auto first = manual.find("Ta Sy Only of\n", begin);
+        EXPECT_EQ(manual.substr(first, manual.find(".El\n", begin) - first), "Ta Sy Only of\n" + table);
+    }
+    EXPECT_EQ(tables.size(), 3u);
 }
 
 }  // namespace

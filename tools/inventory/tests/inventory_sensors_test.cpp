@@ -181,10 +181,10 @@ const std::map<std::string, std::string> keysOfValues {
     {"_crit", "upperCritical"},
     {"_emergency", "emergencyLimit"},
     {"_cap", "cap"},
-    {"_min_hyst", "lowerLimitHysteresis"},
-    {"_lcrit_hyst", "lowerCriticalHysteresis"},
-    {"_max_hyst", "upperLimitHysteresis"},
-    {"_crit_hyst", "upperCriticalHysteresis"},
+    {"_min_hyst", "minHysteresis"},
+    {"_lcrit_hyst", "lcritHysteresis"},
+    {"_max_hyst", "maxHysteresis"},
+    {"_crit_hyst", "critHysteresis"},
     {"_emergency_hyst", "emergencyHysteresis"},
     {"_cap_hyst", "capHysteresis"},
     {"_alarm", "alarm"},
@@ -309,12 +309,11 @@ TEST(InventorySensors, EachFlagAndEachLimitIsAnAlert)
         {{"fan1_input=0", "fan1_min=0"}, {}},
         {{"fan1_input=5001", "fan1_max=5000"}, {"1 it is above its upper limit"}},
         {{"fan1_input=2000", "fan1_alarm=1"}, {"2 it raises an alarm"}},
-        {{"fan1_input=2000", "fan1_min_alarm=1"}, {"2 it raises the alarm of its lower limit"}},
-        {{"fan1_input=2000", "fan1_max_alarm=1"}, {"1 it raises the alarm of its upper limit"}},
+        {{"fan1_input=2000", "fan1_min_alarm=1"}, {"2 it raises its lower alarm"}},
+        {{"fan1_input=2000", "fan1_max_alarm=1"}, {"1 it raises its upper alarm"}},
         {{"fan1_input=0", "fan1_min=1000", "fan1_fault=1"}, {"2 it reports a fault"}},
         {{"fan1_input=900", "fan1_min=1000", "fan1_alarm=1", "fan1_min_alarm=1"},
-         {"2 it raises an alarm", "2 it is below its lower limit",
-          "2 it raises the alarm of its lower limit"}},
+         {"2 it raises an alarm", "2 it is below its lower limit", "2 it raises its lower alarm"}},
         {{"fan1_min=1000"}, {"1 it cannot be read"}},
         {{"fan1_input=2000", "fan1_beep=1"}, {}},
         {{"temp1_input=90000", "temp1_crit=90000"}, {}},
@@ -324,25 +323,23 @@ TEST(InventorySensors, EachFlagAndEachLimitIsAnAlert)
         {{"temp1_input=-5000", "temp1_min=-4000"}, {"1 it is below its lower limit"}},
         {{"temp1_input=-50000", "temp1_lcrit=-40000"}, {"3 it is below its lower critical limit"}},
         {{"temp1_input=50000", "temp1_max=0", "temp1_crit=0"}, {}},
-        {{"temp1_input=50000", "temp1_min_alarm=1"}, {"1 it raises the alarm of its lower limit"}},
-        {{"temp1_input=50000", "temp1_max_alarm=1"}, {"1 it raises the alarm of its upper limit"}},
-        {{"temp1_input=50000", "temp1_lcrit_alarm=1"}, {"3 it raises the alarm of its lower critical limit"}},
-        {{"temp1_input=50000", "temp1_crit_alarm=1"}, {"3 it raises the alarm of its upper critical limit"}},
-        {{"temp1_input=50000", "temp1_emergency_alarm=1"}, {"3 it raises the alarm of its emergency limit"}},
+        {{"temp1_input=50000", "temp1_min_alarm=1"}, {"1 it raises its lower alarm"}},
+        {{"temp1_input=50000", "temp1_max_alarm=1"}, {"1 it raises its upper alarm"}},
+        {{"temp1_input=50000", "temp1_lcrit_alarm=1"}, {"3 it raises its lower critical alarm"}},
+        {{"temp1_input=50000", "temp1_crit_alarm=1"}, {"3 it raises its upper critical alarm"}},
+        {{"temp1_input=50000", "temp1_emergency_alarm=1"}, {"3 it raises its emergency alarm"}},
         {{"temp1_input=-128000", "temp1_fault=1"}, {"2 it reports a fault"}},
         {{"temp1_input=broken", "temp1_fault=1"}, {"2 it reports a fault"}},
         {{"temp1_input=broken"}, {"1 it cannot be read"}},
         {{"in0_input=10900", "in0_min=11000"}, {"2 it is below its lower limit"}},
         {{"in0_input=10900", "in0_lcrit=11000"}, {"3 it is below its lower critical limit"}},
         {{"in0_input=13100", "in0_max=13000"}, {"2 it is above its upper limit"}},
-        {{"in0_input=12000", "in0_min_alarm=0", "in0_max_alarm=1"},
-         {"2 it raises the alarm of its upper limit"}},
-        {{"in0_input=12000", "in0_min_alarm=1", "in0_max_alarm=0"},
-         {"2 it raises the alarm of its lower limit"}},
+        {{"in0_input=12000", "in0_min_alarm=0", "in0_max_alarm=1"}, {"2 it raises its upper alarm"}},
+        {{"in0_input=12000", "in0_min_alarm=1", "in0_max_alarm=0"}, {"2 it raises its lower alarm"}},
         {{"curr1_input=12000", "curr1_crit=11000"}, {"3 it is above its upper critical limit"}},
         {{"curr1_input=12000", "curr1_alarm=1"}, {"2 it raises an alarm"}},
         {{"power1_average=300000000", "power1_cap=250000000"}, {"1 it is above its cap"}},
-        {{"power1_input=250000000", "power1_cap_alarm=1"}, {"1 it raises the alarm of its cap"}},
+        {{"power1_input=250000000", "power1_cap_alarm=1"}, {"1 it raises its cap alarm"}},
         {{"intrusion0_alarm=1"}, {"1 the chassis has been opened"}},
         {{"intrusion0_alarm=broken"}, {"1 it cannot be read"}},
         {{"beep_enable=0"}, {}},
@@ -379,12 +376,12 @@ TEST(InventorySensors, OfChipsWithTheSameNameAreNamedByTheirDevices)
         return chipAt("/devices/platform/" + device, "platform", number, "probe", {"temp1_input=" + degrees});
     };
     const std::vector<std::string> devices {
-        chip("rack-probe", "0", "21000") + chip("door-probe", "1", "22000"),
-        chip("rack-probe", "1", "21000") + chip("door-probe", "0", "22000")};
+        chip("rack-probe", "0", "21000") + chip("sill-probe", "1", "22000"),
+        chip("rack-probe", "1", "21000") + chip("sill-probe", "0", "22000")};
     for (const std::string& text : devices) {
         const Described machine(text);
         EXPECT_EQ(machine.value("/machine/probe-isa-0000-rack-probe:temp1", "reading"), 21.0);
-        EXPECT_EQ(machine.value("/machine/probe-isa-0000-door-probe:temp1", "reading"), 22.0);
+        EXPECT_EQ(machine.value("/machine/probe-isa-0000-sill-probe:temp1", "reading"), 22.0);
     }
 }
 
