@@ -268,9 +268,13 @@ int widthNeeded(Box& box)
     for (const Line& line : box.lines)
         letters = std::max(letters, std::min(lettersIn(line.text), longestLine));
     int width = widthOf(letters);
-    for (std::vector<Box>* boxes : {&box.bars, &box.devices})
-        for (Box& inner : *boxes)
-            width = std::max(width, widthNeeded(inner) + 2 * gap);
+    for (Box& bar : box.bars)
+        width = std::max(width, widthNeeded(bar) + 2 * gap);
+    // Many devices stand in several columns.
+    const int columns =
+        std::clamp(static_cast<int>(box.devices.size()) / 6, 1, box.sensor == Node::SENSOR_COMPUTER ? 5 : 2);
+    for (Box& device : box.devices)
+        width = std::max(width, columns * (widthNeeded(device) + gap) + gap);
     int widest = 0;
     for (Box& part : box.parts)
         widest = std::max(widest, widthNeeded(part));

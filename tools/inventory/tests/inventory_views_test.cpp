@@ -188,15 +188,58 @@ TEST(InventoryTree, WritesSetsAsRanges)
     EXPECT_EQ(rangesOf(std::string("1")), "");
 }
 
+struct Made : IC::Node {
+    Made(const std::string& itsPath, const std::string& itsParent,
+         const std::map<unsigned int, IC::PropertyValue>& its = {}, SensorType sensor = SENSOR_FAN)
+        : Node(sensor)
+    {
+        path = itsPath;
+        parent = itsParent;
+        properties = its;
+    }
+};
+
+TEST(InventoryTree, HasTheUnitsOfAPerson)
+{
+    Nodes nodes;
+    const auto add = [&](const char* unit, double reading, IC::Node::SensorType sensor) {
+        nodes.push_back(std::make_unique<Made>("/one", "",
+                                               std::map<unsigned int, IC::PropertyValue> {
+                                                   {KEY_READING, IC::PropertyValue(IC::Number(reading))},
+                                                   {KEY_UNIT, IC::PropertyValue(unit)},
+                                                   {KEY_UPPER_LIMIT, IC::PropertyValue(IC::Number(3000.0))}},
+                                               sensor));
+    };
+    add("celsius", 45.5, IC::Node::SENSOR_TEMPERATURE_SENSOR);
+    add("rpm", 1200, IC::Node::SENSOR_FAN);
+    add("volts", 12.05, IC::Node::SENSOR_VOLTAGE_SENSOR);
+    add("watts", 250, IC::Node::SENSOR_POWER_DOMAIN);
+    add("amperes", -0.25, IC::Node::SENSOR_POWER_DOMAIN);
+    add("\x1b[2J", 1, IC::Node::SENSOR_FAN);
+    nodes.push_back(
+        std::make_unique<Made>("/two", "",
+                               std::map<unsigned int, IC::PropertyValue> {
+                                   {KEY_SIZE, IC::PropertyValue(IC::Number(ZQ::Uint64 {1} << 34))},
+                                   {KEY_CORES, IC::PropertyValue(IC::Number(1e300))},
+                                   {KEY_LINK_SPEED, IC::PropertyValue(IC::Number(15.754))}},
+                               IC::Node::SENSOR_VIDEO));
+    std::ostringstream out;
+    writeTree(out, nodes, {false, false, true, utf8});
+    EXPECT_EQ(out.str(),
+              "temperature sensor one: 45.5 °C, at most 3000 °C\n"
+              "fan one: 1200 RPM, at most 3000 RPM\n"
+              "voltage sensor one: 12.05 V, at most 3000 V\n"
+              "power domain one: 250 W, at most 3000 W\n"
+              "power domain one: -0.25 A, at most 3000 A\n"
+              "fan one: 1 \\x1b[2J, at most 3000 \\x1b[2J\n"
+              "GPU two: 16 GiB, link 126 Gbit/s\n");
+    std::ostringstream plain;
+    writeTree(plain, nodes, {false, false, true});
+    EXPECT_THAT(plain.str(), StartsWith("temperature sensor one: 45.5 C, at most"));
+}
+
 TEST(InventoryTree, HasEveryNodeOfADamagedOrderOnce)
 {
-    struct Made : IC::Node {
-        Made(const char* itsPath, const std::string& itsParent) : Node(SENSOR_FAN)
-        {
-            path = itsPath;
-            parent = itsParent;
-        }
-    };
     // A parent of its own, a parent that comes later, two nodes of one path.
     Nodes nodes;
     for (const auto& [path, parent] : std::vector<std::pair<const char*, const char*>> {
@@ -209,7 +252,7 @@ TEST(InventoryTree, HasEveryNodeOfADamagedOrderOnce)
     std::string parent;
     for (int i = 0; i < 100000; ++i) {
         const std::string path = "/" + std::to_string(i);
-        nodes.push_back(std::make_unique<Made>(path.c_str(), parent));
+        nodes.push_back(std::make_unique<Made>(path, parent));
         parent = path;
     }
     std::ostringstream deep;
