@@ -23,6 +23,40 @@ constexpr int formVersion = 1;
     throw BadInput("not a saved machine: " + why);
 }
 
+// Refuses a document of many levels: each would need memory. That parse() has a callback for this purpose helps
+// nothing, because each end of an array or an object then takes time for all the elements around it.
+struct DepthCheck : nlohmann::json_sax<Json> {
+    bool null() override { return true; }
+    bool boolean(bool) override { return true; }
+    bool number_integer(number_integer_t) override { return true; }
+    bool number_unsigned(number_unsigned_t) override { return true; }
+    bool number_float(number_float_t, const string_t&) override { return true; }
+    bool string(string_t&) override { return true; }
+    bool binary(binary_t&) override { return true; }
+    bool key(string_t&) override { return true; }
+    bool start_object(std::size_t) override { return descend(); }
+    bool end_object() override { return ascend(); }
+    bool start_array(std::size_t) override { return descend(); }
+    bool end_array() override { return ascend(); }
+    bool parse_error(std::size_t, const std::string&, const Json::exception&) override { return false; }
+
+private:
+    bool descend()
+    {
+        constexpr int deepest = 12;
+        if (++depth_ > deepest)
+            refuse("too many levels");
+        return true;
+    }
+    bool ascend()
+    {
+        --depth_;
+        return true;
+    }
+
+    int depth_ = 0;
+};
+
 // The kind in the document for a kind in the table of properties.
 std::string kindInDocument(const std::string& kind)
 {
@@ -129,19 +163,15 @@ bool isSaved(const std::string& content)
 
 Inventory readSaved(const std::string& content)
 {
-    // No machine comes near; a document of more levels or more bytes would need too much memory.
-    constexpr int deepest = 12;
-    constexpr std::size_t largest = 32 << 20;
+    // No machine comes near; a larger document would need too much memory.
+    constexpr std::size_t largest = 16 << 20;
     if (content.size() > largest)
         refuse("too large");
-    const auto checkDepth = [](int depth, Json::parse_event_t, Json&) {
-        if (depth > deepest)
-            refuse("too many levels");
-        return true;
-    };
     Inventory inventory;
     try {
-        Json document = Json::parse(content, checkDepth);
+        DepthCheck check;
+        Json::sax_parse(content, &check);
+        Json document = Json::parse(content);
         if (!has(document, "format", format))
             refuse(std::string("its format is not ") + format);
         if (document.at("version") != formVersion)
