@@ -98,6 +98,7 @@ struct Request {
 
 Inventory readFrom(const std::string& file)
 {
+    const Notice notice("reading the machine...");
     try {
         const std::string content = readFile(file);
         return isSaved(content) ? readSaved(content) : readExport(content);
@@ -108,6 +109,7 @@ Inventory readFrom(const std::string& file)
 
 Inventory readHere()
 {
+    const Notice notice("reading the machine...");
     Inventory inventory = readThisMachine();
     readMemory(inventory);
     readSensors(inventory);
@@ -313,10 +315,7 @@ int run(int argc, char** argv)
     if (isGiven(diff))
         return written(
             target, [&](std::ostream& out) { return compare(out, request); }, EXIT_BAD_INPUT);
-    const Inventory inventory = [&] {
-        const Notice notice("reading the machine...");
-        return read();
-    }();
+    const Inventory inventory = read();
     const auto write = [&](std::ostream& out) -> int {
         if (isGiven(set))
             return std::apply([&](const auto&... words) { return change(out, inventory.nodes, words...); },
