@@ -230,8 +230,9 @@ Pieces kindOf(const Node& node, const Properties& properties)
         add(withUnit(properties, KEY_READING));
         if (const std::string least = withUnit(properties, KEY_LOWER_LIMIT); !least.empty())
             add("at least " + least);
-        if (const std::string most = withUnit(properties, KEY_UPPER_LIMIT); !most.empty())
-            add("at most " + most);
+        // An upper limit of 0 is none.
+        if (numberOf(properties, KEY_UPPER_LIMIT).value_or(0) != 0)
+            add("at most " + withUnit(properties, KEY_UPPER_LIMIT));
     }
     // Of a node that has no properties.
     if (properties.empty())
