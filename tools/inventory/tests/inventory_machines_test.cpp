@@ -238,8 +238,11 @@ TEST(InventoryMachines, KeepThePathsAlsoWhereNumbersAreMissingOrOccurTwice)
         SCOPED_TRACE(std::string(row.description) + ' ' + row.type);
         const Topology topology = load(renumbered(row.description, row.type, row.number));
         std::set<std::string> paths;
-        for (const auto& node : readTopology(topology.get()).nodes)
+        const Inventory inventory = readTopology(topology.get());
+        for (const auto& node : inventory.nodes) {
             paths.insert(node->getPath());
+            EXPECT_EQ(node->getDescription().find("number ,"), std::string::npos) << node->getDescription();
+        }
         for (const std::string& path : row.paths)
             EXPECT_EQ(paths.count(path), 1u) << path << " of " << testing::PrintToString(paths);
         EXPECT_THAT(wronglyChangedIn(topology), IsEmpty());
