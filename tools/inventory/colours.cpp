@@ -66,7 +66,7 @@ std::string darkFillOf(const Colour& colour)
     unsigned int parts[3] = {};
     std::sscanf(colour.fill, "#%2x%2x%2x", &parts[0], &parts[1], &parts[2]);
     const unsigned int least = std::min({parts[0], parts[1], parts[2]});
-    char text[8];
+    char text[32];
     const auto dark = [&](unsigned int part) { return (part + 2 * (part - least)) * 3 / 16; };
     std::snprintf(text, sizeof text, "#%02x%02x%02x", dark(parts[0]), dark(parts[1]), dark(parts[2]));
     return text;

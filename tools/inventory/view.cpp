@@ -654,119 +654,139 @@ void addLines(Entry& row, const Kinds& kinds, std::size_t most)
     }
 }
 
+constexpr std::size_t mostKinds = 3;  // lines of a label
+
+using Several = std::vector<const Shown*>;
+
+std::string kindInWords(const Shown* shown)
+{
+    return shown->kind.empty() ? shown->word : joined(shown->kind);
+}
+
+// Processors of one kind, with all their cores and threads.
+struct Processors {
+    std::size_t number = 0;
+    double cores = 0;
+    double threads = 0;
+};
+
+Entry processorsEntry(const Several& packages, const Properties& ofMachine)
+{
+    Entry entry {"Processors", {}};
+    const std::string modelOfAll = processorModel(ofMachine, KEY_CPU_MODEL);  // of old exports
+    Pieces models;
+    std::map<std::string, Processors> sums;
+    for (const Shown* shown : packages) {
+        std::string model = processorModel(shown->properties);
+        model = model.empty() ? modelOfAll : model;
+        if (sums.find(model) == sums.end())
+            models.push_back(model);
+        Processors& sum = sums[model];
+        ++sum.number;
+        sum.cores += numberOf(shown->properties, KEY_CORES).value_or(0);
+        sum.threads += numberOf(shown->properties, KEY_THREADS).value_or(0);
+    }
+    for (const std::string& model : models) {
+        if (entry.lines.size() + 1 == mostKinds && models.size() > mostKinds) {
+            entry.lines.push_back("and " + std::to_string(models.size() - entry.lines.size())
+                                  + " other kinds");
+            return entry;
+        }
+        const Processors& sum = sums[model];
+        entry.lines.push_back(
+            joined({model.empty() ? counted(sum.number, "processor") : times(sum.number, model),
+                    amountOf(sum.cores, "core"), amountOf(sum.threads, "thread")}));
+    }
+    const std::string counts = joined(
+        {modelOfAll, countOf(ofMachine, KEY_CORES, "core"), countOf(ofMachine, KEY_THREADS, "thread")});
+    if (models.empty() && !counts.empty())
+        entry.lines.push_back(counts);
+    return entry;
+}
+
+Entry memoryEntry(const Properties& ofMachine, std::size_t numaNodes, const Several& modules,
+                  const Several& devices)
+{
+    Entry entry {"Memory", {}};
+    const std::string nodes = numaNodes > 1 ? " in " + counted(numaNodes, "NUMA node") : "";
+    const std::string size = sizeOf(ofMachine);
+    // Only a machine on which the system counts something else has this property.
+    const std::string ofSystem = sizeOf(ofMachine, KEY_SYSTEM_MEMORY);
+    const std::string sizes =
+        joined({size.empty() ? "" : size + nodes, ofSystem.empty() ? "" : ofSystem + " in the system"});
+    if (!sizes.empty())
+        entry.lines.push_back(sizes);
+    Kinds kindsOfModules;
+    for (const Shown* shown : modules)
+        kindsOfModules.add(joined({kindInWords(shown), joined(shown->troubles)}), shown);
+    addLines(entry, kindsOfModules, mostKinds);
+    Kinds kindsOfDevices;
+    for (const Shown* shown : devices)
+        kindsOfDevices.add(joined({shown->word, joined(shown->kind)}), shown, {shown});
+    addLines(entry, kindsOfDevices, mostKinds - 1);
+    return entry;
+}
+
+Entry networkEntry(const Several& controllers, const Several& ports)
+{
+    Entry entry {"Network", {}};
+    std::map<std::string, Several> portsOf;
+    for (const Shown* shown : controllers)
+        portsOf[shown->node->getPath()] = {};
+    Several alone;
+    for (const Shown* shown : ports) {
+        const auto controller = portsOf.find(shown->node->getParent());
+        (controller == portsOf.end() ? alone : controller->second).push_back(shown);
+    }
+    Kinds kinds;
+    for (const Shown* shown : controllers)
+        kinds.add(kindInWords(shown), shown, portsOf[shown->node->getPath()]);
+    for (const Shown* shown : alone)
+        kinds.add(joined({shown->word, joined(shown->kind)}), shown, {shown});
+    addLines(entry, kinds, mostKinds);
+    return entry;
+}
+
+enum Naming : bool { UNNAMED, NAMED };
+
+Entry devicesEntry(const char* label, const Several& devices, Naming naming)
+{
+    Entry entry {label, {}};
+    Kinds kinds;
+    for (const Shown* shown : devices)
+        kinds.add(kindInWords(shown), shown, naming == NAMED ? Several {shown} : Several {});
+    addLines(entry, kinds, mostKinds);
+    return entry;
+}
+
+Entry systemEntry(const Several& systems, const Several& firmware)
+{
+    Entry entry {"System", {}};
+    if (!systems.empty() && !systems.front()->kind.empty())
+        entry.lines.push_back(joined(systems.front()->kind));
+    if (!firmware.empty() && !firmware.front()->kind.empty())
+        entry.lines.push_back("BIOS " + joined(firmware.front()->kind));
+    return entry;
+}
+
 }  // namespace
 
 std::vector<Entry> View::entries() const
 {
-    constexpr std::size_t most = 3;  // lines for a label
-    std::vector<Entry> rows;
-    const auto keep = [&](const Entry& row) {
-        if (!row.lines.empty())
-            rows.push_back(row);
-    };
-    const Shown* its = machine();
-    const Properties none;
-    const Properties& ofMachine = its == nullptr ? none : its->properties;
-    const auto text = [](const Shown* shown) { return joined(shown->kind); };
-
-    // Processors of one kind with all their cores and threads.
-    Entry processors {"Processors", {}};
-    Pieces models;
-    std::map<std::string, std::pair<std::size_t, std::pair<double, double>>> sums;
-    for (const Shown* shown : each(Node::SENSOR_CPU)) {
-        std::string model = processorModel(shown->properties);
-        if (model.empty())  // old exports say it of the machine
-            model = processorModel(ofMachine, KEY_CPU_MODEL);
-        if (sums.find(model) == sums.end())
-            models.push_back(model);
-        auto& [number, cores] = sums[model];
-        ++number;
-        cores.first += numberOf(shown->properties, KEY_CORES).value_or(0);
-        cores.second += numberOf(shown->properties, KEY_THREADS).value_or(0);
-    }
-    for (const std::string& model : models) {
-        const auto& [number, cores] = sums[model];
-        if (processors.lines.size() + 1 == most && models.size() > most) {
-            processors.lines.push_back("and " + std::to_string(models.size() - processors.lines.size())
-                                       + " other kinds");
-            break;
-        }
-        processors.lines.push_back(
-            joined({model.empty() ? counted(number, "processor") : times(number, model),
-                    amountOf(cores.first, "core"), amountOf(cores.second, "thread")}));
-    }
-    if (processors.lines.empty()) {
-        const std::string counts =
-            joined({processorModel(ofMachine, KEY_CPU_MODEL), countOf(ofMachine, KEY_CORES, "core"),
-                    countOf(ofMachine, KEY_THREADS, "thread")});
-        if (!counts.empty())
-            processors.lines.push_back(counts);
-    }
-    keep(processors);
-
-    Entry memory {"Memory", {}};
-    const std::size_t numaNodes = each(Node::SENSOR_MEMORY_ARRAY).size();
-    // What the system counts differs from the nodes' sum only if both are properties.
-    const std::string ofSystem = sizeOf(ofMachine, KEY_SYSTEM_MEMORY);
-    if (const std::string size = sizeOf(ofMachine); !size.empty() || !ofSystem.empty())
-        memory.lines.push_back(joined({size + (numaNodes > 1 ? " in " + counted(numaNodes, "NUMA node") : ""),
-                                       ofSystem.empty() ? "" : ofSystem + " in the system"}));
-    Kinds modules;
-    for (const Shown* shown : each(Node::SENSOR_DIMM))
-        modules.add(joined({shown->kind.empty() ? shown->word : text(shown), joined(shown->troubles)}),
-                    shown);
-    addLines(memory, modules, most);
-    Kinds memoryDevices;
-    for (const Shown* shown : each(Node::SENSOR_MEMORY_DEVICE))
-        memoryDevices.add(joined({shown->word, text(shown)}), shown, {shown});
-    addLines(memory, memoryDevices, 2);
-    keep(memory);
-
-    Entry gpus {"GPUs", {}};
-    Kinds videos;
-    for (const Shown* shown : each(Node::SENSOR_VIDEO))
-        videos.add(shown->kind.empty() ? shown->word : text(shown), shown);
-    addLines(gpus, videos, most);
-    keep(gpus);
-
-    Entry network {"Network", {}};
-    Kinds controllers;
-    std::map<std::string, std::vector<const Shown*>> ports;
-    const std::vector<const Shown*> networkControllers = each(Node::SENSOR_NETWORK_CONTROLLER);
-    std::map<std::string, bool> isController;
-    for (const Shown* shown : networkControllers)
-        isController[shown->node->getPath()] = true;
-    std::vector<const Shown*> alone;
-    for (const Shown* shown : each(Node::SENSOR_NETWORK_PORT)) {
-        if (isController.count(shown->node->getParent()) != 0)
-            ports[shown->node->getParent()].push_back(shown);
-        else
-            alone.push_back(shown);
-    }
-    for (const Shown* shown : networkControllers)
-        controllers.add(shown->kind.empty() ? shown->word : text(shown), shown,
-                        ports[shown->node->getPath()]);
-    for (const Shown* shown : alone)
-        controllers.add(joined({shown->word, text(shown)}), shown, {shown});
-    addLines(network, controllers, most);
-    keep(network);
-
-    Entry disks {"Disks", {}};
-    Kinds drives;
-    for (const Shown* shown : each(Node::SENSOR_HARD_DRIVE))
-        drives.add(shown->kind.empty() ? shown->word : text(shown), shown, {shown});
-    addLines(disks, drives, most);
-    keep(disks);
-
-    Entry system {"System", {}};
-    for (const Shown* shown : each(Node::SENSOR_OS))
-        if (system.lines.empty() && !shown->kind.empty())
-            system.lines.push_back(text(shown));
-    for (const Shown* shown : each(Node::SENSOR_BIOS))
-        if (system.lines.size() < 2 && !shown->kind.empty())
-            system.lines.push_back("BIOS " + text(shown));
-    keep(system);
-    return rows;
+    const Shown* const its = machine();
+    const Properties ofMachine = its == nullptr ? Properties() : its->properties;
+    std::vector<Entry> entries {
+        processorsEntry(each(Node::SENSOR_CPU), ofMachine),
+        memoryEntry(ofMachine, each(Node::SENSOR_MEMORY_ARRAY).size(), each(Node::SENSOR_DIMM),
+                    each(Node::SENSOR_MEMORY_DEVICE)),
+        devicesEntry("GPUs", each(Node::SENSOR_VIDEO), UNNAMED),
+        networkEntry(each(Node::SENSOR_NETWORK_CONTROLLER), each(Node::SENSOR_NETWORK_PORT)),
+        devicesEntry("Disks", each(Node::SENSOR_HARD_DRIVE), NAMED),
+        systemEntry(each(Node::SENSOR_OS), each(Node::SENSOR_BIOS))};
+    entries.erase(std::remove_if(entries.begin(), entries.end(),
+                                 [](const Entry& entry) { return entry.lines.empty(); }),
+                  entries.end());
+    return entries;
 }
 
 }  // namespace inventory
