@@ -230,7 +230,7 @@ void compareMemory(const IC::Node& machine, Component::Facts& facts)
     const ZQ::Uint64 system = systemMemory();
     const auto ofSystem = static_cast<double>(system);
     const auto ofNodes = static_cast<double>(size.operator ZQ::Uint64());
-    if (std::abs(ofNodes - ofSystem) > tolerance * ofSystem)
+    if (system != 0 && std::abs(ofNodes - ofSystem) > tolerance * ofSystem)
         facts.insert({KEY_SYSTEM_MEMORY, IC::PropertyValue(IC::Number(system), true)});
 }
 

@@ -1,6 +1,7 @@
 // Reads all features of all chips that libsensors knows into nodes.
 #include <sensors/sensors.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
@@ -51,19 +52,21 @@ const Kind& kindOf(std::string_view feature)
     return unknownKind;
 }
 
-// Chips of power supplies, by the beginnings of their names: the drivers of Linux for single models, and for batteries
-// and mains adapters. The first power that such a chip measures is that of the whole supply.
+// Chips of power supplies, by parts of their names in lower case: the drivers of Linux for the bus and for single models,
+// and for batteries and mains adapters. The first power that such a chip measures is that of the whole supply.
 constexpr std::string_view supplies[] = {
-    "acbel",  "bpa_rs", "bpd_rs",     "cffps",           "corsairpsu", "crps",
-    "dps",    "fsg",    "intel_crps", "ipsps",           "pfe",        "psu",
-    "sgd009", "ym2151", "yh5151",     "ucsi_source_psy", "BAT"};
+    "acbel", "bat",   "bpa_rs", "bpd_rs", "cffps",           "crps",   "dps",   "fsg", "ipsps",
+    "pfe",   "pmbus", "psu",    "sgd009", "ucsi_source_psy", "ym2151", "yh5151"};
 
-bool isSupply(std::string_view chip)
+bool isSupply(std::string name)
 {
-    for (const std::string_view supply : supplies)
-        if (chip.substr(0, supply.size()) == supply)
-            return true;
-    return false;
+    for (char& letter : name)
+        letter = letter >= 'A' && letter <= 'Z' ? static_cast<char>(letter - 'A' + 'a') : letter;
+    return std::any_of(std::begin(supplies), std::end(supplies), [&name](std::string_view supply) {
+        // "bat" is a part of other names.
+        return supply == "bat" ? name.compare(0, supply.size(), supply) == 0
+                               : name.find(supply) != std::string::npos;
+    });
 }
 
 // The values of a sensor, by what follows the name of the feature: fan1_min, in0_max_alarm, cpu0_vid.
