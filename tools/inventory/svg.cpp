@@ -430,7 +430,7 @@ int writeSvg(std::ostream& out, const View& view)
     place(page, width);
     std::ostringstream legendText;
     const int top = legend.write(legendText, width);
-    out << "<svg xmlns=\"http://www.w3.org/2000/svg\" class=\"machine\" viewBox=\"0 0 " << width << ' '
+    out << R"(<svg xmlns="http://www.w3.org/2000/svg" class="machine" viewBox="0 0 )" << width << ' '
         << top + page.height << "\">\n<title>" << escapedForXml(view.title()) << "</title>\n<style>\n"
         << ".machine text { font: 11px monospace; fill: #000; white-space: pre }\n"
            ".machine .name { font-weight: bold }\n"
