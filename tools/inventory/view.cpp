@@ -248,7 +248,7 @@ std::string addressOf(const Properties& properties)
         return "";
     std::string text;
     for (const unsigned char byte : found->second.operator IC::Buffer())
-        text += (text.empty() ? "" : ":") + IC::pB(byte);
+        text.append(text.empty() ? "" : ":").append(IC::pB(byte));
     return text;
 }
 
