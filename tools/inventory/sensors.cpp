@@ -52,8 +52,8 @@ const Kind& kindOf(std::string_view feature)
     return unknownKind;
 }
 
-// Chips of power supplies, by parts of their names in lower case: the drivers of Linux for the bus and for single models,
-// and for batteries and mains adapters. The first power that such a chip measures is that of the whole supply.
+// Chips of power supplies, by parts of their names in lower case: the drivers of Linux for the bus, for single models,
+// for batteries and for mains adapters. The first power that such a chip measures is that of the whole supply.
 constexpr std::string_view supplies[] = {
     "acbel", "bat",   "bpa_rs", "bpd_rs", "cffps",           "crps",   "dps",   "fsg", "ipsps",
     "pfe",   "pmbus", "psu",    "sgd009", "ucsi_source_psy", "ym2151", "yh5151"};
