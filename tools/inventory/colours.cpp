@@ -63,12 +63,14 @@ std::size_t rankOf(Node::SensorType sensor)
 std::string darkFillOf(const Colour& colour)
 {
     // The difference to grey is doubled, because in the dark it is hard to see.
-    unsigned int parts[3] = {};
-    std::sscanf(colour.fill, "#%2x%2x%2x", &parts[0], &parts[1], &parts[2]);
-    const unsigned int least = std::min({parts[0], parts[1], parts[2]});
+    const std::string fill = colour.fill;
+    unsigned long parts[3] = {};
+    for (std::size_t i = 0; i < std::size(parts); ++i)
+        parts[i] = std::stoul(fill.substr(1 + 2 * i, 2), nullptr, 16);
+    const unsigned long least = std::min({parts[0], parts[1], parts[2]});
     char text[32];
-    const auto dark = [&](unsigned int part) { return (part + 2 * (part - least)) * 3 / 16; };
-    std::snprintf(text, sizeof text, "#%02x%02x%02x", dark(parts[0]), dark(parts[1]), dark(parts[2]));
+    const auto dark = [&](unsigned long part) { return (part + 2 * (part - least)) * 3 / 16; };
+    std::snprintf(text, sizeof text, "#%02lx%02lx%02lx", dark(parts[0]), dark(parts[1]), dark(parts[2]));
     return text;
 }
 
