@@ -87,6 +87,22 @@ struct JsonAccess {
     }
 };
 
+// What follows the first byte of a character of UTF-8: so many bytes, the first of them in this range.
+struct Utf8Rest {
+    int bytes;
+    unsigned char least;
+    unsigned char most;
+};
+
+// The ranges exclude overlong forms, surrogates and what is above U+10FFFF.
+inline Utf8Rest utf8RestAfter(unsigned char first) noexcept
+{
+    const int bytes = first < 0xE0 ? 1 : first < 0xF0 ? 2 : 3;
+    const unsigned char least = first == 0xE0 ? 0xA0 : first == 0xF0 ? 0x90 : 0x80;
+    const unsigned char most = first == 0xED ? 0x9F : first == 0xF4 ? 0x8F : 0xBF;
+    return {bytes, least, most};
+}
+
 // Whether the text is UTF-8, as the library nlohmann/json requires of what it writes as JSON.
 inline bool isUtf8(const std::string& text) noexcept
 {
@@ -96,17 +112,12 @@ inline bool isUtf8(const std::string& text) noexcept
             continue;
         if (first < 0xC2 || first > 0xF4)
             return false;
-        // Excludes overlong forms, surrogates and what is above U+10FFFF.
-        unsigned char least = first == 0xE0 ? 0xA0 : first == 0xF0 ? 0x90 : 0x80;
-        unsigned char most = first == 0xED ? 0x9F : first == 0xF4 ? 0x8F : 0xBF;
-        for (int following = first < 0xE0 ? 1 : first < 0xF0 ? 2 : 3; following > 0; --following) {
+        for (Utf8Rest rest = utf8RestAfter(first); rest.bytes > 0; rest = {rest.bytes - 1, 0x80, 0xBF}) {
             if (next == text.end())
                 return false;
             const auto byte = static_cast<unsigned char>(*next++);
-            if (byte < least || byte > most)
+            if (byte < rest.least || byte > rest.most)
                 return false;
-            least = 0x80;
-            most = 0xBF;
         }
     }
     return true;
@@ -378,7 +389,7 @@ ZQ::Uint64 readReal(const JsonPlace<Json>& place)
     }
     const std::string& name = place.string();
     if (name != "infinity" && name != "-infinity")
-        place.fail("expected \"infinity\" or \"-infinity\"");
+        place.fail(R"(expected "infinity" or "-infinity")");
     return name == "infinity" ? infiniteBits : negativeInfiniteBits;
 }
 
