@@ -10,6 +10,8 @@ enum AlertClass : unsigned char { CLASS_CONFIGURATION = 1, CLASS_ENVIRONMENT = 2
 
 // Something that can be wrong with a node, a row of the table in alerts.cpp.
 struct Trouble {
+    unsigned char severity;
+    AlertClass alertClass;
     enum Sign : unsigned char {
         IN_STATUS,  // the node's status is `number`
         FLAG_SET,   // the property `number` is true
@@ -20,8 +22,6 @@ struct Trouble {
     unsigned int number;
     IC::Node::SensorType sensor;  // the only sensor type that the row is about, or SENSOR_UNKNOWN for all
     Status status;                // of a sensor whose worst trouble this is
-    unsigned char severity;
-    AlertClass alertClass;
     const char* words;
 };
 std::vector<Trouble> allTroubles();                            // the table

@@ -235,6 +235,31 @@ std::string help()
     return text.str();
 }
 
+// Writes what the options ask for, the tree without them. Gives the exit status.
+int writeMachine(std::ostream& out, const CLI::App& app, const Request& request, const Inventory& inventory)
+{
+    const auto has = [&](const char* option) { return app.count(option) != 0; };
+    if (has("--set"))
+        return std::apply([&](const auto&... words) { return change(out, inventory.nodes, words...); },
+                          request.setting);
+    const auto alerts = alertsOf(inventory.nodes);
+    if (has("--check"))
+        return writeCheck(out, inventory.nodes, alerts);
+    if (has("--svg"))
+        writeSvg(out, inventory.nodes);
+    else if (has("--html"))
+        writeHtml(out, inventory.nodes);
+    else if (has("--save"))
+        writeSaved(out, inventory);
+    else if (has("--json"))
+        writeJson(out, inventory.nodes, alerts);
+    else if (has("--metrics"))
+        writeMetrics(out, inventory.nodes, alerts, INVENTORY_VERSION);
+    else
+        describe(out, inventory.nodes, request.form);
+    return EXIT_DONE;
+}
+
 int run(int argc, char** argv)
 {
     CLI::App app("Describes this machine, or that of FILE, as nodes with numbered properties.",
@@ -316,27 +341,7 @@ int run(int argc, char** argv)
         return written(
             target, [&](std::ostream& out) { return compare(out, request); }, EXIT_BAD_INPUT);
     const Inventory inventory = read();
-    const auto write = [&](std::ostream& out) -> int {
-        if (isGiven(set))
-            return std::apply([&](const auto&... words) { return change(out, inventory.nodes, words...); },
-                              request.setting);
-        const auto alerts = alertsOf(inventory.nodes);
-        if (isGiven(check))
-            return writeCheck(out, inventory.nodes, alerts);
-        if (isGiven(svg))
-            writeSvg(out, inventory.nodes);
-        else if (isGiven(html))
-            writeHtml(out, inventory.nodes);
-        else if (isGiven(save))
-            writeSaved(out, inventory);
-        else if (isGiven(json))
-            writeJson(out, inventory.nodes, alerts);
-        else if (isGiven(metrics))
-            writeMetrics(out, inventory.nodes, alerts, INVENTORY_VERSION);
-        else
-            describe(out, inventory.nodes, request.form);
-        return EXIT_DONE;
-    };
+    const auto write = [&](std::ostream& out) { return writeMachine(out, app, request, inventory); };
     return written(target, write, isGiven(check) ? int {CHECK_UNKNOWN} : int {EXIT_REFUSED});
 }
 

@@ -267,7 +267,7 @@ struct Unusable {
 Unusable countUnusable(const Subject& subject)
 {
     const hwloc_obj* const object = subject.object;
-    const hwloc_topology_t topology = subject.topology;
+    hwloc_topology* const topology = subject.topology;
     Unusable count;
     const Bitmap threads =
         unusableOf(object->complete_cpuset, object->cpuset, hwloc_topology_get_allowed_cpuset(topology));
@@ -363,7 +363,7 @@ Component::Component(const Site& site) : Node(site.sensor)
 
 Component::Component(const Subject& subject) : Component(static_cast<const Site&>(subject))
 {
-    const hwloc_obj_t object = subject.object;
+    hwloc_obj* const object = subject.object;
     const bool ofMachine = object->type == HWLOC_OBJ_MACHINE;
     // A driver knows its device better than the bus does: its facts come first.
     if (object->type == HWLOC_OBJ_PCI_DEVICE)

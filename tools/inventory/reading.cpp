@@ -149,7 +149,7 @@ class Planner {
 public:
     explicit Planner(hwloc_topology_t topology)
     {
-        const hwloc_obj_t machine = hwloc_get_root_obj(topology);
+        hwloc_obj* const machine = hwloc_get_root_obj(topology);
         learn(machine, nullptr);
         plan(machine, Around {});
         tellApart();
@@ -426,7 +426,7 @@ private:
 
     static std::string difference(const Plan& plan)
     {
-        const hwloc_obj_t object = plan.object;
+        hwloc_obj* const object = plan.object;
         if (plan.row == nullptr)
             return '-' + pciAddress(object);
         if (object->type == HWLOC_OBJ_GROUP)

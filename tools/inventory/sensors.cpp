@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
+#include <iterator>
 #include <system_error>
 
 #include "alerts.h"
@@ -23,25 +24,25 @@ namespace fs = std::filesystem;
 // is about humidity or the control of fans: they are readings of the domain that is cooled.
 const struct Kind {
     std::string_view word;
-    IC::Node::SensorType sensor;
     const char* unit;
     const char* unitInWords;
+    IC::Node::SensorType sensor;
     bool isFlag;  // it has no reading but a flag
 } kinds[] = {
-    {"in", IC::Node::SENSOR_VOLTAGE_SENSOR, "volts", " V", false},
-    {"fan", IC::Node::SENSOR_FAN, "rpm", " RPM", false},
-    {"temp", IC::Node::SENSOR_TEMPERATURE_SENSOR, "celsius", " degrees Celsius", false},
-    {"power", IC::Node::SENSOR_POWER_DOMAIN, "watts", " W", false},
-    {"energy", IC::Node::SENSOR_POWER_DOMAIN, "joules", " J", false},
-    {"curr", IC::Node::SENSOR_POWER_DOMAIN, "amperes", " A", false},
-    {"humidity", IC::Node::SENSOR_COOLING_DOMAIN, "percent", " %", false},
-    {"cpu", IC::Node::SENSOR_VOLTAGE_SENSOR, "volts", " V", false},  // cpu0_vid
-    {"intrusion", IC::Node::SENSOR_INTRUSION, "", "", true},
-    {"beep_enable", IC::Node::SENSOR_ALERT_INDICATION, "", "", true},
-    {"pwm", IC::Node::SENSOR_COOLING_DOMAIN, "", "", false},
-    {"freq", IC::Node::SENSOR_POWER_DOMAIN, "hertz", " Hz", false},
+    {"in", "volts", " V", IC::Node::SENSOR_VOLTAGE_SENSOR, false},
+    {"fan", "rpm", " RPM", IC::Node::SENSOR_FAN, false},
+    {"temp", "celsius", " degrees Celsius", IC::Node::SENSOR_TEMPERATURE_SENSOR, false},
+    {"power", "watts", " W", IC::Node::SENSOR_POWER_DOMAIN, false},
+    {"energy", "joules", " J", IC::Node::SENSOR_POWER_DOMAIN, false},
+    {"curr", "amperes", " A", IC::Node::SENSOR_POWER_DOMAIN, false},
+    {"humidity", "percent", " %", IC::Node::SENSOR_COOLING_DOMAIN, false},
+    {"cpu", "volts", " V", IC::Node::SENSOR_VOLTAGE_SENSOR, false},  // cpu0_vid
+    {"intrusion", "", "", IC::Node::SENSOR_INTRUSION, true},
+    {"beep_enable", "", "", IC::Node::SENSOR_ALERT_INDICATION, true},
+    {"pwm", "", "", IC::Node::SENSOR_COOLING_DOMAIN, false},
+    {"freq", "hertz", " Hz", IC::Node::SENSOR_POWER_DOMAIN, false},
 };
-constexpr Kind unknownKind {"", IC::Node::SENSOR_UNKNOWN, "", "", false};
+constexpr Kind unknownKind {"", "", "", IC::Node::SENSOR_UNKNOWN, false};
 
 const Kind& kindOf(std::string_view feature)
 {
