@@ -277,10 +277,13 @@ int run(int argc, char** argv)
         app.add_flag("--all", request.form.all, "Write each node; otherwise equal parts share a line");
     const auto* properties = app.add_flag("--properties", request.form.withProperties,
                                           "Write the properties of each node: [number = value] name");
-    const auto* json = app.add_flag("--json", "Write the nodes, their properties and the alerts as JSON");
-    const auto* metrics = app.add_flag("--metrics", "Write metrics in the text format that Prometheus reads");
-    const auto* check = app.add_flag(
-        "--check", "Write a line for monitoring systems, with the readings; see the exit status");
+    // Not as the second argument, which CLI11 could also take for a variable as C++20.
+    const auto* json =
+        app.add_flag("--json")->description("Write the nodes, their properties and the alerts as JSON");
+    const auto* metrics =
+        app.add_flag("--metrics")->description("Write metrics in the text format that Prometheus reads");
+    const auto* check = app.add_flag("--check")->description(
+        "Write a line for monitoring systems, with the readings; see the exit status");
     const auto* save = app.add_option("--save", request.saved, "Keep the machine, with its sensors, in SAVED")
                            ->type_name("SAVED");
     const auto* svg = app.add_option("--svg", request.drawing, "Draw the machine into SVG")->type_name("SVG");
