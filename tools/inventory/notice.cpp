@@ -10,8 +10,12 @@ namespace inventory {
 
 Notice::Notice(std::string text) : text_(std::move(text))
 {
-    if (isatty(STDERR_FILENO) != 0)
-        thread_ = std::thread([this] { wait(); });
+    if (isatty(STDERR_FILENO) == 0)
+        return;
+    std::unique_lock<std::mutex> guard(mutex_);
+    thread_ = std::thread([this] { wait(); });
+    // Until it waits: reading an export calls fork(), and a thread that starts may hold locks of the system.
+    over_.wait(guard, [this] { return isWaiting_; });
 }
 
 Notice::~Notice()
@@ -28,6 +32,8 @@ Notice::~Notice()
 void Notice::wait()
 {
     std::unique_lock<std::mutex> guard(mutex_);
+    isWaiting_ = true;
+    over_.notify_one();
     if (over_.wait_for(guard, std::chrono::milliseconds(500), [this] { return isOver_; }))
         return;
     std::cerr << text_ << std::flush;

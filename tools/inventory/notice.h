@@ -23,6 +23,7 @@ private:
     std::string text_;
     std::mutex mutex_;
     std::condition_variable over_;
+    bool isWaiting_ = false;
     bool isOver_ = false;
     std::thread thread_;
 };

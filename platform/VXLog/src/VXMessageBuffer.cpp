@@ -133,7 +133,7 @@ VXMessageBuffer::Composer::Closer::~Closer()
     while (const Composer* const composer = takeKept())
         delete composer;
     const std::lock_guard lock(kept);
-    for (std::size_t i = 0; i < kept.count; ++i)
+    for (std::size_t i = 0; i < Striped<Kept>::count; ++i)
         kept.at(i).isClosed = true;
 }
 

@@ -370,15 +370,20 @@ TEST_F(InventoryFleet, ReadsOrRefusesEachMutatedSavedMachine)
         std::string text = good;
         for (std::size_t times = 1 + below(3); times > 0; --times) {
             const std::size_t at = below(text.size());
-            switch (below(3)) {
+            const std::size_t from = below(text.size());
+            switch (below(4)) {
             case 0:
                 text[at] = symbols[below(symbols.size())];
                 break;
             case 1:
                 text.erase(at, 1 + below(20));
                 break;
-            default:
-                text.insert(at, text.substr(below(text.size()), below(40)));
+            case 2:
+                text.insert(at, text.substr(from, below(40)));
+                break;
+            default:  // another digit, which is often another machine
+                if (const auto digit = text.find_first_of("123456789", at); digit != std::string::npos)
+                    text[digit] = symbols[1 + below(9)];
             }
         }
         const Outcome outcome = run({"--metrics", folder.write("mutated.json", text)});
