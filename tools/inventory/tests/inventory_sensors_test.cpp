@@ -366,7 +366,7 @@ TEST(InventorySensors, OnlyAPowerSupplysChipIsAPowerSupply)
         + chipAt("/devices/platform/i2c-7/7-0058", "i2c", "1", "pfe1100",
                  {"power1_input=400000000", "power2_input=380000000", "fan1_input=9000"})
         + chipAt("/devices/platform/i2c-7/7-0059", "i2c", "2", "PSU2", {"power1_input=1000000"})
-        + chipAt("/devices/platform/BAT0", "platform", "3", "BAT0", {"power1_input=1000000"})
+        + chipAt("/devices/platform/supply", "platform", "3", "BAT0", {"power1_input=1000000"})
         + chipAt("/devices/platform/i2c-7/7-0060", "i2c", "4", "combat", {"power1_input=1000000"}));
     EXPECT_THAT(machine.pathsOf("Power Supply"),
                 UnorderedElementsAre("/machine/pfe1100-i2c-7-58:power1", "/machine/PSU2-i2c-7-59:power1",
