@@ -321,7 +321,6 @@ TEST(InventoryValues, PlaceholdersSayNothing)
                                 "Base Board Serial Number",
                                 "Unknown",
                                 "<BAD INDEX>",
-                                "<OUT OF SPEC>",
                                 "NO DIMM",
                                 "[Empty]",
                                 "No Module Installed",
