@@ -1,3 +1,4 @@
+#include <cfenv>
 #include <functional>
 #include <iomanip>
 #include <sstream>
@@ -296,6 +297,19 @@ TEST(ErrorText, FollowsTheGlobalLocaleLikeANewStream)
         EXPECT_EQ(error.operator std::string(), "1,6 - 1,2,3,4,5,6,7 - 1234567");
     }
     EXPECT_EQ(error.operator std::string(), "16 - 1234567 - 1234567");
+}
+
+TEST(ErrorText, RoundsARealToTheNearestTextInAnyRoundingMode)
+{
+    const Error third(0, Number(1.0 / 3), "");
+    const Error twoThirds(0, Number(2.0 / 3), "");
+    const int before = std::fegetround();
+    for (const int mode : {FE_UPWARD, FE_DOWNWARD}) {
+        ASSERT_EQ(std::fesetround(mode), 0);
+        const std::string texts = third.operator std::string() + ", " + twoThirds.operator std::string();
+        std::fesetround(before);
+        EXPECT_EQ(texts, "0 - 0.333333, 0 - 0.666667");
+    }
 }
 
 TEST(ErrorText, IsCompleteOrThrowsWhenMemoryRunsOut)
