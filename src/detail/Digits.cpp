@@ -49,9 +49,9 @@ void store(char* out, std::uint64_t text)
 // Writes a real with six significant digits if up to three multiplications find them for certain; otherwise returns
 // null.
 //
-// Scaling by powers of ten moves six digits before the point. Each multiplication has an error below 2^-32, or 2^-31
-// where the rounding mode is not to the nearest. If the result is further than three of these from the middle between
-// two integers, the nearest integer has the digits of the real itself.
+// Scaling by powers of ten moves six digits before the point. A multiplication adds an error below 2^-32; in a rounding
+// mode other than to the nearest, below 2^-31. Three of them stay below `uncertain`. A result that is further than that
+// from the middle between two integers has the same nearest integer as the exact product.
 char* writeSixDigits(char* out, double real)
 {
     constexpr double uncertain = 0x1p-29;

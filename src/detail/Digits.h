@@ -79,9 +79,10 @@ inline char* writeInteger(char* out, std::int32_t number)
                         static_cast<std::uint64_t>(std::abs(std::int64_t {number})));
 }
 
-// A real with six significant digits; at most `longestReal` characters.
+// A real with six significant digits; at most `longestReal` characters. It needs 15 of them, for "-12345." and eight
+// characters that are written at once.
 char* writeReal(char* out, double real);
-constexpr std::size_t longestReal = 17;  // -123456.000000000 before it is shortened
+constexpr std::size_t longestReal = 17;
 
 // The number in decimal. Writes in place: copying from a buffer stalls on store forwarding.
 inline std::string decimalText(std::uint32_t number)
