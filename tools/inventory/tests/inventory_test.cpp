@@ -17,6 +17,7 @@
 #include "inventory_run.h"
 #include "mapping.h"
 #include "reading.h"
+#include "synthetic.h"
 #include "values.h"
 #include "writing.h"
 
@@ -29,23 +30,6 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
-
-// The export of a synthetic machine.
-std::string synthetic(const std::string& description)
-{
-    hwloc_topology_t topology = nullptr;
-    char* text = nullptr;
-    int length = 0;
-    if (hwloc_topology_init(&topology) != 0
-        || hwloc_topology_set_synthetic(topology, description.c_str()) != 0
-        || hwloc_topology_load(topology) != 0
-        || hwloc_topology_export_xmlbuffer(topology, &text, &length, 0) != 0)
-        throw std::runtime_error("hwloc does not make up " + description);
-    std::string xml = text;
-    hwloc_free_xmlbuffer(topology, text);
-    hwloc_topology_destroy(topology);
-    return xml;
-}
 
 void replace(std::string& text, const std::string& from, const std::string& to)
 {

@@ -12,6 +12,7 @@
 #include "colours.h"
 #include "inventory_run.h"
 #include "reading.h"
+#include "synthetic.h"
 #include "values.h"
 #include "writing.h"
 
@@ -23,24 +24,6 @@ using testing::EndsWith;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
-
-// The export of a synthetic machine.
-std::string synthetic(const std::string& description)
-{
-    hwloc_topology_t topology = nullptr;
-    char* text = nullptr;
-    int length = 0;
-    if (hwloc_topology_init(&topology) != 0
-        || hwloc_topology_set_all_types_filter(topology, HWLOC_TYPE_FILTER_KEEP_ALL) != 0
-        || hwloc_topology_set_synthetic(topology, description.c_str()) != 0
-        || hwloc_topology_load(topology) != 0
-        || hwloc_topology_export_xmlbuffer(topology, &text, &length, 0) != 0)
-        throw std::runtime_error("hwloc does not make up " + description);
-    std::string xml = text;
-    hwloc_free_xmlbuffer(topology, text);
-    hwloc_topology_destroy(topology);
-    return xml;
-}
 
 // Two processors with eight cores each, memory modules and devices.
 std::string server(const std::string& modules)
