@@ -43,36 +43,37 @@ std::optional<T> take(std::string_view& text, int base = 10)
 constexpr std::string_view placeholders[] = {
     "", "0123456789",
     // There is none.
-    "badindex", "dimmunknown", "empty", "invalid", "manufacturerunknown", "modulenotinstalled", "na", "nil", "noasset",
-    "noassetinformation", "nodimm", "nodimminstalled", "nodimmpresent", "nomodule", "nomoduleinstalled", "none",
-    "noserial", "noserialnumber", "notapplicable", "notassigned", "notavailable", "notdefined", "notinstalled",
-    "notpopulated", "notpresent", "notprovided", "notset", "notspecified", "null", "other", "outofspec", "tba", "tbd",
-    "undefined", "unk", "unknow", "unknown", "unknownmanufacturer", "unknownserial", "unknownserialnumber",
-    "unknownvendor", "unspecified",
+    "badindex", "dimmunknown", "empty", "invalid", "manufacturerunknown", "modulenotinstalled", "na", "nil",
+    "noasset", "noassetinformation", "nodimm", "nodimminstalled", "nodimmpresent", "noenclosure", "nomodule",
+    "nomoduleinstalled", "none", "noserial", "noserialnumber", "notapplicable", "notassigned", "notavailable",
+    "notdefined", "notinstalled", "notpopulated", "notpresent", "notprovided", "notset", "notsettable",
+    "notspecified", "null", "other", "outofspec", "tba", "tbd", "undefine", "undefined", "unk", "unknow", "unknown",
+    "unknownmanufacturer", "unknownserial", "unknownserialnumber", "unknownvendor", "unspecified",
     // Nobody has filled it in.
-    "byoem", "default", "defaultstring", "filledbyoem", "fillbyoem", "oem", "oemdefaultstring", "oemstring",
+    "byoem", "default", "defaultstring", "filledbyoem", "fillbyoem", "oem", "oemdefaultstring", "oemstring", "tbdbyoem",
     "tobefilled", "tobefilledbymanufacturer", "tobefilledbyoem", "tobefilledbyvendor", "tobefilledinbyoem",
     "tobesetbyoem",
     // It says only what it is.
     "baseboardmanufacturer", "baseboardproductname", "baseboardserialnumber", "baseboardversion", "biosversion",
-    "boardmanufacturer", "boardproductname", "boardserialnumber", "boardversion", "chassismanufacture",
+    "boardmanufacturer", "boardname", "boardproductname", "boardserialnumber", "boardversion", "chassismanufacture",
     "chassismanufacturer", "chassisserialnumber", "chassisversion", "family", "manufacturer", "manufacturername",
     "modulemanufacturer", "moduleserialnumber", "oemchassismanufacturer", "partno", "partnumber", "productname",
-    "productversion", "serial", "serialno", "serialnumber", "sku", "skunumber", "systemfamily", "systemmanufacturer",
-    "systemname", "systemproductname", "systemserialnumber", "systemsku", "systemskunumber", "systemuuid",
-    "systemversion", "vendor", "version"};
+    "productversion", "serial", "serialno", "serialnumber", "sku", "skunumber", "systemfamily",
+    "systemmanufacturer", "systemname", "systemproductname", "systemserialnumber", "systemsku", "systemskunumber",
+    "systemuuid", "systemversion", "vendor", "version"};
 
 // The same, but for digits: "SerNum0", "Array1_PartNumber3", "Type2 - Board Version", "Default string000".
 constexpr std::string_view numberedPlaceholders[] = {
-    "amanufacturer", "apartnum", "arraypartnumber", "asernum", "defaultstring", "modulepartnumber",
-    "oemdefaultstring", "partnum", "sernum", "serialnum", "tobefilledbyoem", "typeboardmanufacturer",
-    "typeboardproductname", "typeboardserialnumber", "typeboardversion"};
+    "amanufacturer", "apartnum", "arraypartnumber", "asernum", "defaultstring", "manufacturer", "modulepartnumber",
+    "oemdefaultstring", "oemdefine", "partnum", "sernum", "serialnum", "tobefilledbyoem", "typeboardmanufacturer",
+    "typeboardproductname", "typeboardserialnumber", "typeboardversion", "typeproductconfigid"};
 
 // Digits in a row are no number of a part, but may be a size.
 constexpr std::string_view countedDigits[] = {
-    "1234567890", "1234", "12345", "123456", "1234567", "12345678", "123456789", "01234567", "012345678", "987654321",
+    "1234", "12345", "123456", "1234567", "12345678", "123456789", "01234567", "012345678", "987654321",
     "9876543210",
-    "01234567890123456789", "012345678901234567890123456789"};
+    // The UUID that boards have whose maker has given none.
+    "03000200040005000006000700080009"};
 // clang-format on
 
 // The letters, in lower case, and the digits, so that "To Be Filled By O.E.M." and "To be filled by OEM" are the same.
@@ -176,18 +177,20 @@ std::string told(std::string_view text)
     const std::string letters = lettersOf(text);
     const bool isPlaceholder = isIn(placeholders, letters)
         || isIn(numberedPlaceholders, withoutDigits(letters))
+        || (letters.size() > 1 && letters.find_first_not_of('x') == std::string::npos)  // "x.x"
         || letters.find("assettag") != std::string::npos;  // "P1-DIMMA1_AssetTag (date:19/02)"
     return isPlaceholder ? std::string() : std::string(trimmed(text));
 }
 
 std::string toldIdentity(std::string_view text)
 {
-    // Firmware fills a number that it does not know: "0", "00000000", "FFFFFFFF", "xxxx".
+    // Firmware fills a number that it does not know: "0", "00000000", "FFFFFFFF", "SSN12345678901234567".
     const std::string letters = lettersOf(text);
     const auto isAll = [&letters](char filling) {
         return letters.find_first_not_of(filling) == std::string::npos;
     };
-    const bool isFilled = isAll('0') || (letters.size() > 3 && (isAll('f') || isAll('x')));
+    const bool isFilled =
+        isAll('0') || (letters.size() > 3 && isAll('f')) || letters.find("1234567890") != std::string::npos;
     return isFilled || isIn(countedDigits, letters) ? std::string() : told(text);
 }
 

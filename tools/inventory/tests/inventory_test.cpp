@@ -315,13 +315,21 @@ TEST(InventoryValues, PlaceholdersSayNothing)
                                 "A1_AssetTag0",
                                 "P1-DIMMA1_AssetTag (date:19/02)",
                                 "Array1_PartNumber3",
+                                "Manufacturer00",
+                                "OEM_Define1",
+                                "Type1ProductConfigId",
+                                "Board Name",
+                                "No Enclosure",
+                                "x.x",
+                                "XXXXXXXX",
                                 "Type2 - Board Version"})
         EXPECT_EQ(told(nothing), "") << nothing;
     for (const char* nothing : {"0", "00000000", "0000-0000", "FFFFFFFF", "xxxxxxxx", "123456789", "Unknown",
-                                "00000000-0000-0000-0000-000000000000"})
+                                "00000000-0000-0000-0000-000000000000", "Asset-1234567890",
+                                "SSN12345678901234567", "03000200-0400-0500-0006-000700080009"})
         EXPECT_EQ(toldIdentity(nothing), "") << nothing;
     for (const char* something : {"0", "00000000", "Nanya", "Noname", "Samsung", "Version 2", "\xe6\x97\xa5",
-                                  "NA1234", "System x3650", "123456789"})
+                                  "NA1234", "System x3650", "123456789", "X", "X10"})
         EXPECT_EQ(told(something), something);
     for (const char* something : {"1", "00000001", "48AAE639", "F", "01", "S0000000"})
         EXPECT_EQ(toldIdentity(something), something);
