@@ -61,14 +61,16 @@ private:
     std::map<std::string, const IC::Node*> targets_;
 };
 
-// What a cache or a group of cores is, but for its name and its threads.
+// What a part with threads is, but for its path and its threads.
 struct Sort {
     IC::Node::SensorType sensor;
     std::string level;
     std::string kind;
+    std::string number;
     bool operator<(const Sort& other) const
     {
-        return std::tie(sensor, level, kind) < std::tie(other.sensor, other.level, other.kind);
+        return std::tie(sensor, level, kind, number)
+            < std::tie(other.sensor, other.level, other.kind, other.number);
     }
 };
 
@@ -76,9 +78,13 @@ Sort sortOf(const IC::Node& node)
 {
     IC::PropertyValue level("");
     IC::PropertyValue kind("");
+    IC::PropertyValue number("");
     static_cast<void>(node.getProperty(KEY_LEVEL, level));
     static_cast<void>(node.getProperty(KEY_CACHE_KIND, kind));
-    return {node.getSensor(), std::string(level), std::string(kind)};
+    // A group or a cache may have another number, too.
+    if (node.getSensor() == IC::Node::SENSOR_CPU || node.getSensor() == IC::Node::SENSOR_CPU_CORE)
+        static_cast<void>(node.getProperty(KEY_INDEX, number));
+    return {node.getSensor(), std::string(level), std::string(kind), std::string(number)};
 }
 
 IC::NumberArray threadsOf(const IC::Node& node)
@@ -141,12 +147,21 @@ public:
 private:
     void add(Change change) { changes_.push_back(std::move(change)); }
 
-    // Caches and groups are named by their lowest core or thread. One that has lost it or got a lower one is the same
-    // if its threads are some of the former ones, or all of them and more.
+    // Caches, groups and some packages are named by their lowest core or thread. One that has lost it or got a lower
+    // one is the same if its threads are some of the former ones, or all of them and more. So is a core with the same
+    // number: its path changes where another core with this number came or went.
     void findRenamed(const Nodes& before, const Nodes& after)
     {
         const auto mayBeRenamed = [](const IC::Node& node) {
-            return node.getSensor() == IC::Node::SENSOR_CACHE || node.getSensor() == IC::Node::SENSOR_GROUP;
+            switch (node.getSensor()) {
+            case IC::Node::SENSOR_CACHE:
+            case IC::Node::SENSOR_GROUP:
+            case IC::Node::SENSOR_CPU:
+            case IC::Node::SENSOR_CPU_CORE:
+                return true;
+            default:
+                return false;
+            }
         };
         std::map<std::pair<Sort, std::string>, std::vector<const IC::Node*>> byThread;
         for (const auto& node : after)
@@ -281,7 +296,7 @@ private:
 
     Side before_;
     Side after_;
-    std::map<const IC::Node*, const IC::Node*> later_;  // of caches and groups with another name
+    std::map<const IC::Node*, const IC::Node*> later_;  // of parts with another path
     std::map<const IC::Node*, const IC::Node*> earlier_;
     std::vector<Change> changes_;
 };

@@ -179,15 +179,16 @@ private:
     }
 
     // Finds the numbers that occur twice: of packages in the machine, of what is in a package in that package. Then
-    // those of all packages, all cores and so on are no names, so that a core that goes changes no other name.
+    // those of all packages, all cores and so on are no names, so that a core that goes changes no other name as long
+    // as another number occurs twice.
     void learn(hwloc_obj_t object, hwloc_obj_t package)
     {
-        const bool isCore = object->type == HWLOC_OBJ_CORE;
-        const bool isNamed = isCore || object->type == HWLOC_OBJ_PACKAGE || object->type == HWLOC_OBJ_DIE
-            || object->type == HWLOC_OBJ_GROUP;
-        const bool isTwice = isNamed && isNumbered(object)
-            && !numbers_.insert({sortOf(object), package, object->os_index}).second;
-        if (isTwice || (isCore && !isNumbered(object)))
+        packages_ += object->type == HWLOC_OBJ_PACKAGE ? 1 : 0;
+        cores_ += object->type == HWLOC_OBJ_CORE ? 1 : 0;
+        const bool isNamed = object->type == HWLOC_OBJ_CORE || object->type == HWLOC_OBJ_PACKAGE
+            || object->type == HWLOC_OBJ_DIE || object->type == HWLOC_OBJ_GROUP;
+        if (isNamed && isNumbered(object)
+            && !numbers_.insert({sortOf(object), package, object->os_index}).second)
             twice_.insert(sortOf(object));
         for (hwloc_obj_t child = object->first_child; child != nullptr; child = child->next_sibling)
             learn(child, object->type == HWLOC_OBJ_PACKAGE ? object : package);
@@ -241,14 +242,17 @@ private:
             + std::to_string(group->attr->group.subkind);
     }
 
+    // Whether a package needs nothing that tells it apart. One with a single core may be what is left of two.
+    bool isAlone() const { return packages_ == 1 && cores_ > 1; }
+
     // Tells packages, dies and groups apart that have no unique number. Memory stays when a core goes; the lowest
     // thread does not always.
-    static std::string substitute(hwloc_obj_t object)
+    std::string substitute(hwloc_obj_t object) const
     {
         if (object->type == HWLOC_OBJ_GROUP && !hasMemory(object))
             return kindOf(object) + '-' + lowestThread(object);  // groups of several kinds lie in each other
         if (object->type == HWLOC_OBJ_CORE || object->nodeset == nullptr || !hasMemory(object))
-            return lowestThread(object);
+            return object->type == HWLOC_OBJ_PACKAGE && isAlone() ? "" : lowestThread(object);
         std::string name = "numa";
         for (int node = -1; (node = hwloc_bitmap_next(object->nodeset, node)) != -1;)
             name += (name.size() > 4 ? "." : "") + std::to_string(node);
@@ -266,12 +270,14 @@ private:
         return mayBeUnique && isUnique(object) ? name : joined(name, substitute(object));
     }
 
-    // The lowest number of the cores inside.
+    // The lowest number of the cores inside that have one.
     static std::optional<unsigned int> lowestCore(hwloc_obj_t object)
     {
         std::optional<unsigned int> lowest;
         for (hwloc_obj_t child = object->first_child; child != nullptr; child = child->next_sibling) {
-            const auto inside = child->type == HWLOC_OBJ_CORE ? child->os_index : lowestCore(child);
+            const auto inside = child->type != HWLOC_OBJ_CORE ? lowestCore(child)
+                : isNumbered(child)                           ? std::optional(child->os_index)
+                                                              : std::nullopt;
             if (inside && (!lowest || *inside < *lowest))
                 lowest = inside;
         }
@@ -452,6 +458,8 @@ private:
     };
     std::set<Number> numbers_;
     std::set<Sort> twice_;
+    unsigned int packages_ = 0;
+    unsigned int cores_ = 0;
     std::map<std::pair<std::size_t, std::string>, std::size_t> slots_;
     std::map<std::string, std::size_t> devices_;  // by UUID
     std::set<IC::Node::SensorType> parts_;

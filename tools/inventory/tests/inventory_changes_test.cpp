@@ -151,6 +151,33 @@ TEST(InventoryChanges, IncludeNodesAndPropertiesThatComeAndGo)
               "+ CPU /a\n");
 }
 
+TEST(InventoryChanges, ExcludeAnotherPathOfTheSameCoreOrPackage)
+{
+    const auto threads = [](const std::vector<unsigned int>& numbers) {
+        return IC::NumberArray(numbers.begin(), numbers.end());
+    };
+    const auto core = [&](const char* path, unsigned int number, unsigned int thread) {
+        return new Made(IC::Node::SENSOR_CPU_CORE, path,
+                        {{KEY_INDEX, IC::Number(number)}, {KEY_CPU_SET, threads({thread})}});
+    };
+    const Nodes before = listOf({new Made(cpu, "/p-t0", {{KEY_CPU_SET, threads({0, 1})}}),
+                                 core("/core-4-t0", 4, 0), core("/core-4-t1", 4, 1)});
+    const auto changes = [&before](const Nodes& after) {
+        std::ostringstream out;
+        writeChanges(out, changesBetween(before, after));
+        return out.str();
+    };
+    EXPECT_EQ(changes(listOf({new Made(cpu, "/p-t1", {{KEY_CPU_SET, threads({1})}}), core("/core-4", 4, 1)})),
+              "  CPU /p-t1\n"
+              "-   [25 = {0, 1}] numbers of the hardware threads\n"
+              "+   [25 = {1}] numbers of the hardware threads\n"
+              "- CPU Core /core-4-t0\n");
+    // With another number it is another core.
+    EXPECT_EQ(changes(listOf({new Made(cpu, "/p-t0", {{KEY_CPU_SET, threads({0, 1})}}),
+                              core("/core-4-t0", 4, 0), core("/core-5", 5, 1)})),
+              "- CPU Core /core-4-t1\n+ CPU Core /core-5\n");
+}
+
 TEST(InventoryChanges, ExcludeTheTimeOfReading)
 {
     const Nodes before =

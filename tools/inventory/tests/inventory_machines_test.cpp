@@ -176,12 +176,13 @@ TEST(InventoryMachines, KeepThePathsOfWhatStaysWhenACoreGoes)
 
 // The export of a machine that hwloc makes up, with other numbers for the objects of one type.
 std::string renumbered(const std::string& description, const std::string& type,
-                       const std::function<std::optional<unsigned int>(unsigned int)>& number)
+                       const std::function<std::optional<unsigned int>(unsigned int)>& number,
+                       unsigned long form)
 {
     const Topology topology = load("", description);
     char* text = nullptr;
     int length = 0;
-    check(hwloc_topology_export_xmlbuffer(topology.get(), &text, &length, 0), "export " + description);
+    check(hwloc_topology_export_xmlbuffer(topology.get(), &text, &length, form), "export " + description);
     std::string xml = text;
     hwloc_free_xmlbuffer(topology.get(), text);
     const std::string head = "type=\"" + type + "\" os_index=\"";
@@ -193,7 +194,7 @@ std::string renumbered(const std::string& description, const std::string& type,
         const auto begin = at + type.size() + 7;
         xml.replace(begin, end + 1 - begin, index);
     }
-    EXPECT_GT(count, 1u) << type;
+    EXPECT_GT(count, 0u) << type;
     return xml;
 }
 
@@ -203,22 +204,36 @@ TEST(InventoryMachines, KeepThePathsAlsoWhereNumbersAreMissingOrOccurTwice)
     const auto zero = [](unsigned int) { return std::optional(0U); };
     const auto ofTwo = [](unsigned int count) { return std::optional(count % 2); };
     const auto same = [](unsigned int count) { return std::optional(count); };
+    const auto notTheThird = [](unsigned int count) {
+        return count == 2 ? std::nullopt : std::optional(count);
+    };
     const struct {
         const char* description;
         const char* type;
         std::function<std::optional<unsigned int>(unsigned int)> number;
         std::vector<std::string> paths;  // some of them
+        unsigned long form = 0;          // of the export
     } rows[] = {
         {"pack:2 numa:2 l3:1 core:2 pu:2",
          "Package",
          none,
          {"/machine/package-numa0.1", "/machine/package-numa2.3/core-4", "/machine/package-numa2.3/l3-6"}},
         {"pack:3 core:2 pu:2", "Package", none, {"/machine/package-t4", "/machine/core-5-t10"}},
+        {"pack:2 core:1 pu:2", "Package", none, {"/machine/package-t2", "/machine/core-1-t2"}},
         {"pack:3 l3:1 core:2 pu:1",
          "Package",
          zero,
          {"/machine/package-0-t2", "/machine/l3-t4", "/machine/core-5-t5"}},
+        {"pack:1 core:3 pu:2",
+         "Socket",
+         none,
+         {"/machine/package", "/machine/core-2-t4"},
+         HWLOC_TOPOLOGY_EXPORT_XML_FLAG_V1},
         {"pack:2 l2:2 core:2 pu:2", "Core", none, {"/machine/package-1/core-t8", "/machine/package-0/l2-t4"}},
+        {"pack:2 l2:2 core:2 pu:2",
+         "Core",
+         notTheThird,
+         {"/machine/package-0/core-1", "/machine/package-0/core-t4", "/machine/package-0/l2-3"}},
         {"pack:2 l2:2 core:2 pu:2",
          "Core",
          ofTwo,
@@ -236,7 +251,7 @@ TEST(InventoryMachines, KeepThePathsAlsoWhereNumbersAreMissingOrOccurTwice)
     };
     for (const auto& row : rows) {
         SCOPED_TRACE(std::string(row.description) + ' ' + row.type);
-        const Topology topology = load(renumbered(row.description, row.type, row.number));
+        const Topology topology = load(renumbered(row.description, row.type, row.number, row.form));
         std::set<std::string> paths;
         const Inventory inventory = readTopology(topology.get());
         for (const auto& node : inventory.nodes) {
