@@ -417,8 +417,8 @@ private:
         add({row, machine, 0, 0, row->word});
     }
 
-    // Two of one name get what tells them apart: nested groups their kind, slots their PCI address, devices and modules
-    // a number that their facts yield. Any other part keeps its name if the other one is a device.
+    // Two of one name get what tells them apart: nested groups their kind or their depth, slots their PCI address,
+    // devices and modules a number that their facts yield. Any other part keeps its name if the other one is a device.
     void tellApart()
     {
         std::map<std::pair<std::size_t, std::string>, std::vector<Plan*>> byName;
@@ -435,8 +435,12 @@ private:
         hwloc_obj* const object = plan.object;
         if (plan.row == nullptr)
             return '-' + pciAddress(object);
-        if (object->type == HWLOC_OBJ_GROUP)
-            return '-' + kindOf(object);
+        if (object->type == HWLOC_OBJ_GROUP) {
+            const std::string kind = '-' + kindOf(object);
+            return plan.name.find(kind) == std::string::npos
+                ? kind
+                : "-depth" + std::to_string(object->attr->group.depth);
+        }
         if (object->type != HWLOC_OBJ_OS_DEVICE && object->type != HWLOC_OBJ_MISC)
             return "";
         if (object->type == HWLOC_OBJ_MISC && object->os_index != HWLOC_UNKNOWN_INDEX)

@@ -248,6 +248,12 @@ TEST(InventoryMachines, KeepThePathsAlsoWhereNumbersAreMissingOrOccurTwice)
          "Core",
          same,
          {"/machine/group-kind10.1-t0", "/machine/package-7/core-14"}},
+        {"group:2 group:2 pack:2 core:2 pu:1",
+         "Core",
+         same,
+         {"/machine/group-kind0.0-t8-depth0", "/machine/group-kind0.0-t8-depth1",
+          "/machine/group-kind0.0-t12"},
+         HWLOC_TOPOLOGY_EXPORT_XML_FLAG_V1},
     };
     for (const auto& row : rows) {
         SCOPED_TRACE(std::string(row.description) + ' ' + row.type);
