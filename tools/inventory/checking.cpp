@@ -28,6 +28,13 @@ std::string realIn(const Properties& properties, unsigned int key)
     return realNumber(text) ? text : "";
 }
 
+// "" for 0 too, which means that no upper limit is set.
+std::string upperIn(const Properties& properties, unsigned int key)
+{
+    const std::string text = realIn(properties, key);
+    return realNumber(text).value_or(0) == 0 ? "" : text;
+}
+
 // The range of readings that are in order, as "10:90", "90" for 0 to 90, "~:90" or "10:"; empty without limits.
 std::string range(const std::string& lowest, const std::string& highest)
 {
@@ -47,8 +54,8 @@ std::string measured(const IC::Node& node)
     label.erase(std::remove_if(label.begin(), label.end(), [](char c) { return c == '\'' || c == '='; }),
                 label.end());
     std::string data = " '" + label + "'=" + reading + ';'
-        + range(realIn(properties, KEY_LOWER_LIMIT), realIn(properties, KEY_UPPER_LIMIT)) + ';'
-        + range(realIn(properties, KEY_LOWER_CRITICAL), realIn(properties, KEY_UPPER_CRITICAL));
+        + range(realIn(properties, KEY_LOWER_LIMIT), upperIn(properties, KEY_UPPER_LIMIT)) + ';'
+        + range(realIn(properties, KEY_LOWER_CRITICAL), upperIn(properties, KEY_UPPER_CRITICAL));
     data.erase(data.find_last_not_of(';') + 1);
     return data;
 }

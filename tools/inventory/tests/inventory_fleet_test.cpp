@@ -10,6 +10,7 @@
 
 namespace {
 
+using testing::EndsWith;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
@@ -147,6 +148,11 @@ TEST_F(InventoryFleet, HasALineForMonitoringSystems)
         EXPECT_EQ(outcome.out, row.line);
         EXPECT_EQ(outcome.err, "");
     }
+    // An upper limit of 0 is none.
+    const std::string unlimited =
+        std::regex_replace(savedMachine("1200", "45"), std::regex(R"("value":[89]0\})"), R"("value":0})");
+    EXPECT_THAT(run({"--check", folder.write("unlimited.json", unlimited)}).out,
+                EndsWith(" '/machine/x:fan1'=1200;1000: '/machine/x:temp1'=45\n"));
 }
 
 TEST_F(InventoryFleet, CannotTellWhatItCannotReadOrWrite)
