@@ -65,7 +65,7 @@ void watch(const std::function<Inventory()>& read, const Watch& settings, std::o
         out << (toJournal ? "<6>" : "") << "Nodes: " << last.nodes.size() << ", watched every "
             << exactText(IC::Number(settings.seconds)) << " s\n";
     std::string told;
-    while (out.flush()) {
+    while (out.flush() && !isOutputClosed()) {
         std::this_thread::sleep_for(std::chrono::duration<double>(settings.seconds));
         try {
             Inventory next = read();

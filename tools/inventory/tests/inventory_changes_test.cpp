@@ -470,6 +470,16 @@ TEST_F(InventoryWatch, ExitsWith0OnASignal)
     }
 }
 
+TEST_F(InventoryWatch, EndsWhenNobodyReadsOn)
+{
+    // The shell waits for both programs.
+    const Outcome outcome = runProgram(
+        {"timeout", "60", "sh", "-c", "\"$0\" --watch 0.02 \"$1\" | head -n 1", INVENTORY_PROGRAM, file});
+    EXPECT_EQ(outcome.status, 0);
+    EXPECT_EQ(outcome.out, "Nodes: 3, watched every 0.02 s\n");
+    EXPECT_EQ(outcome.err, "");
+}
+
 TEST_F(InventoryWatch, SleepsBetweenReadings)
 {
     Running program({INVENTORY_PROGRAM, "--watch", "1000000000", file});
