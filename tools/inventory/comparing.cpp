@@ -318,13 +318,17 @@ std::vector<Change> withoutMereReadings(std::vector<Change> changes)
     return changes;
 }
 
-Nodes withoutSensors(Nodes nodes)
+std::vector<Change> withoutOtherSources(std::vector<Change> changes)
 {
-    const auto isSensor = [](const std::unique_ptr<IC::Node>& node) {
-        return node->getProperties().count(KEY_CHIP) != 0;
+    const auto isOther = [](const Change& change) {
+        return change.node->getProperties().count(KEY_CHIP) != 0
+            || change.node->getSensor() == IC::Node::SENSOR_DIMM
+            || (change.subject == Change::PROPERTY
+                && (change.key == KEY_SYSTEM_MEMORY || change.key == KEY_MEMORY_SLOTS
+                    || change.key == KEY_ERROR_CORRECTION));
     };
-    nodes.erase(std::remove_if(nodes.begin(), nodes.end(), isSensor), nodes.end());
-    return nodes;
+    changes.erase(std::remove_if(changes.begin(), changes.end(), isOther), changes.end());
+    return changes;
 }
 
 }  // namespace inventory

@@ -27,7 +27,7 @@ std::vector<Change> changesBetween(const Nodes& before, const Nodes& after);
 // Without the readings of sensors that do not change what is wrong with the sensor.
 std::vector<Change> withoutMereReadings(std::vector<Change> changes);
 
-// Without the sensors, which hwloc does not export.
-Nodes withoutSensors(Nodes nodes);
+// Without what does not come from hwloc alone: the sensors, the memory modules and what the machine knows of them.
+std::vector<Change> withoutOtherSources(std::vector<Change> changes);
 
 }  // namespace inventory

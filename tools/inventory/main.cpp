@@ -136,14 +136,13 @@ void describe(std::ostream& out, const Nodes& nodes, const TreeForm& form)
 int compare(std::ostream& out, const Request& request)
 {
     const std::vector<std::string>& sides = request.sides;
-    Inventory old = readFrom(sides.front());
-    Inventory current = sides.size() > 1 ? readFrom(sides[1])
-        : old.hasSensors                 ? readHere()
-                                         : readThisMachine();
-    if (old.hasSensors != current.hasSensors)
-        for (Inventory* side : {&old, &current})
-            side->nodes = withoutSensors(std::move(side->nodes));
+    const Inventory old = readFrom(sides.front());
+    const Inventory current = sides.size() > 1 ? readFrom(sides[1])
+        : old.hasSensors                       ? readHere()
+                                               : readThisMachine();
     auto changes = changesBetween(old.nodes, current.nodes);
+    if (old.hasSensors != current.hasSensors)
+        changes = withoutOtherSources(std::move(changes));
     if (!request.withReadings)
         changes = withoutMereReadings(std::move(changes));
     if (changes.empty())

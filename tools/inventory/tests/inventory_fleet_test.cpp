@@ -298,10 +298,21 @@ TEST_F(InventoryFleet, ComparesReadingsThatPassALimit)
     EXPECT_EQ(slow.status, 1);
     EXPECT_THAT(slow.out, HasSubstr("[48 = 900] reading"));
     EXPECT_THAT(slow.out, Not(HasSubstr("[48 = 46] reading")));
-    // An export has no sensors.
-    const std::string export_ = folder.write("export.xml", machineOf(""));
-    const Outcome mixed = run({"--diff", before, export_});
-    EXPECT_THAT(mixed.out, Not(HasSubstr("x:fan1")));
+}
+
+TEST_F(InventoryFleet, ComparesWithAnExportOnlyWhatHwlocKnows)
+{
+    const std::string size = R"(,"102":{"kind":"uint64","value":4096},"103":{"kind":"uint32","value":8})";
+    std::string saved = savedMachine("1200", "45", size);
+    const std::string module =
+        R"(,{"sensor":19,"status":0,"description":"","path":"/machine/dimm-A1","parent":"/machine","properties":{}})";
+    saved.insert(saved.rfind(']'), module);
+    const Outcome mixed = run({"--diff", folder.write("saved.json", saved),
+                               folder.write("export.xml", machineOf(fact("Other", "new")))});
+    EXPECT_EQ(mixed.status, 1);
+    EXPECT_THAT(mixed.out, HasSubstr("[8 = {\"Other=new\"}] other facts"));
+    for (const char* other : {"x:fan1", "x:temp1", "dimm-A1", "[102 = ", "[103 = "})
+        EXPECT_THAT(mixed.out, Not(HasSubstr(other)));
 }
 
 TEST_F(InventoryFleet, RefusesHostileSavedMachinesInOneLine)
