@@ -10,6 +10,7 @@
 
 #include "alerts.h"
 #include "values.h"
+#include "view.h"
 
 namespace inventory {
 
@@ -47,9 +48,11 @@ public:
         return found == targets_.end() ? nullptr : found->second;
     }
 
-    // A reference as the path of the node that it leads to; its own text if there is no such node.
-    std::string textOf(const IC::PropertyValue& value) const
+    // A set of threads as ranges; a reference as the path of the node that it leads to, if there is such a node.
+    std::string textOf(unsigned int key, const IC::PropertyValue& value) const
     {
+        if (const std::string ranges = key == KEY_CPU_SET ? rangesOf(value) : ""; !ranges.empty())
+            return ranges;
         const bool isReference = value.getKind() == IC::PropertyValue::KIND_NUMBER
             && IC::Number(value).getKind() == IC::Number::KIND_NODEREF;
         const IC::Node* node = isReference ? target(IC::Number(value)) : nullptr;
@@ -230,14 +233,14 @@ private:
         for (const auto& [key, value] : old) {
             const auto found = current.find(key);
             if (found == current.end())
-                add({Change::PROPERTY, &now, &then, key, before_.textOf(value), {}});
+                add({Change::PROPERTY, &now, &then, key, before_.textOf(key, value), {}});
             else if (!same(value, found->second)
                      && !(key == KEY_PARENT && followsFromParent(value, found->second)))
                 add(changed(then, now, key, value, found->second));
         }
         for (const auto& [key, value] : current)
             if (old.count(key) == 0)
-                add({Change::PROPERTY, &now, &then, key, {}, after_.textOf(value)});
+                add({Change::PROPERTY, &now, &then, key, {}, after_.textOf(key, value)});
     }
 
     // Numbers that the library's operators call unequal differ, except that a real NaN equals no number, not even
@@ -285,8 +288,8 @@ private:
     Change changed(const IC::Node& nodeThen, const IC::Node& nodeNow, unsigned int key,
                    const IC::PropertyValue& then, const IC::PropertyValue& now) const
     {
-        std::string from = before_.textOf(then);
-        std::string to = after_.textOf(now);
+        std::string from = before_.textOf(key, then);
+        std::string to = after_.textOf(key, now);
         if (from == to) {  // then only the kinds differ
             from += std::string(" (") + kindName(then) + ')';
             to += std::string(" (") + kindName(now) + ')';

@@ -133,6 +133,29 @@ TEST(InventoryChanges, CompareReferencesByTheNodesThatTheyLeadTo)
               "  Fan /fan\n-   [2 = /cpu0] parent node\n+   [2 = CPU:7] parent node\n");
 }
 
+TEST(InventoryChanges, WriteSetsAsRanges)
+{
+    const auto threads = [](std::initializer_list<unsigned int> numbers) {
+        IC::NumberArray array;
+        for (const unsigned int number : numbers)
+            array.push_back(IC::Number(number));
+        return IC::PropertyValue(array);
+    };
+    const Nodes old = listOf({new Made(cpu, "/cpu0", {{KEY_CPU_SET, threads({0, 1, 2, 3, 192, 193})}}),
+                              new Made(cpu, "/cpu1", {{KEY_CPU_SET, threads({4, 5})}})});
+    const Nodes current = listOf({new Made(cpu, "/cpu0", {{KEY_CPU_SET, threads({0, 1, 2, 192})}}),
+                                  new Made(cpu, "/cpu1", {{KEY_CPU_SET, threads({})}})});
+    std::ostringstream out;
+    writeChanges(out, changesBetween(old, current));
+    EXPECT_EQ(out.str(),
+              "  CPU /cpu0\n"
+              "-   [25 = 0-3,192-193] numbers of the hardware threads\n"
+              "+   [25 = 0-2,192] numbers of the hardware threads\n"
+              "  CPU /cpu1\n"
+              "-   [25 = 4-5] numbers of the hardware threads\n"
+              "+   [25 = {}] numbers of the hardware threads\n");
+}
+
 TEST(InventoryChanges, IncludeNodesAndPropertiesThatComeAndGo)
 {
     const Nodes before = listOf({new Made(cpu, "/cpu0", {{KEY_MODEL, "x"}, {KEY_MAKER, "y"}}),
