@@ -136,8 +136,9 @@ void writePart(std::ostream& out, const Part& part, const TreeForm& form, const 
                                      : lines.belowChild);
     if (form.withProperties)
         for (const auto& [key, value] : first.properties)
-            writeProperty(out << below << (part.inner.empty() ? lines.lastProperty : lines.property), key,
-                          value);
+            if (key != KEY_LABEL || !exactText(value).empty())
+                writeProperty(out << below << (part.inner.empty() ? lines.lastProperty : lines.property), key,
+                              value);
     for (const Part& inner : part.inner)
         writePart(out, inner, form, below, &inner == &part.inner.back() ? lines.lastChild : lines.child);
 }
