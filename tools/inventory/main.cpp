@@ -117,6 +117,12 @@ Inventory readHere()
     return inventory;
 }
 
+Look uncut(Look look)
+{
+    look.width = 0;
+    return look;
+}
+
 void describe(std::ostream& out, const Nodes& nodes, const TreeForm& form)
 {
     const View view(nodes);
@@ -128,7 +134,7 @@ void describe(std::ostream& out, const Nodes& nodes, const TreeForm& form)
     if (!form.own && !form.withProperties && !form.all)
         return;
     out << '\n';
-    writeAlerts(out, alertsOf(nodes), form.look);
+    writeAlerts(out, alertsOf(nodes), form.own ? uncut(form.look) : form.look);
     out << '\n';
     writeSummary(out, nodes);
 }
@@ -324,7 +330,8 @@ int run(int argc, char** argv)
 
     const auto read = [&] { return isGiven(file) ? readFrom(request.file) : readHere(); };
     if (isGiven(watching)) {
-        watch(read, {secondsIn(request.period), request.withReadings, isGiven(json), lookOfStandardOutput()},
+        watch(read,
+              {secondsIn(request.period), request.withReadings, isGiven(json), uncut(lookOfStandardOutput())},
               std::cout);
         return flushed(EXIT_DONE, EXIT_REFUSED);
     }

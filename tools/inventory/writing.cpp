@@ -232,11 +232,14 @@ void writeProperty(std::ostream& out, unsigned int key, const IC::PropertyValue&
 void writeAlerts(std::ostream& out, const std::vector<IC::Alert>& alerts, const Look& look)
 {
     out << "Alerts: " << alerts.size() << '\n';
-    for (const IC::Alert& alert : alerts)
-        out << "  "
-            << painted(look, severities[alert.getSeverity()],
-                       printable(alert.getNodePaths().front() + ", " + alert.getMessage()))
-            << "\n    " << textOf(alert) << '\n';
+    for (const IC::Alert& alert : alerts) {
+        writeLine(out, look,
+                  {{"", "  "},
+                   {severities[alert.getSeverity()],
+                    printable(alert.getNodePaths().front() + ", " + alert.getMessage())}},
+                  1);
+        writeLine(out, look, {{"", "    " + textOf(alert)}}, 0);
+    }
 }
 
 void writeChanges(std::ostream& out, const std::vector<Change>& changes, const Look& look)

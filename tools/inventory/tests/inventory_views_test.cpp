@@ -368,6 +368,10 @@ TEST_F(InventoryViews, HaveColoursAndLinesOnATerminal)
                                       "          \\[1 = DIMM:0\\] this node\r\n(.|\n)*"));
     EXPECT_THAT(runOnTerminal({"LC_ALL=C", "NO_COLOR=1"}, command).out,
                 HasSubstr("|-- 2 x package: AMD EPYC"));
+    const std::string all = runOnTerminal({"LC_ALL=C", "NO_COLOR=1"}, command + " --all").out;
+    EXPECT_THAT(all, HasSubstr("\r\n    Alert 1; 1; 3; DIMM: its size is unknown; "));
+    for (const std::string& line : linesOf(all))
+        EXPECT_LE(line.size(), 70 + std::strlen("\r")) << line;
 }
 
 TEST_F(InventoryViews, HaveColouredChangesOnATerminal)
