@@ -430,9 +430,10 @@ int writeSvg(std::ostream& out, const View& view)
     place(page, width);
     std::ostringstream legendText;
     const int top = legend.write(legendText, width);
-    out << R"(<svg xmlns="http://www.w3.org/2000/svg" class="machine" viewBox="0 0 )" << width << ' '
-        << top + page.height << "\">\n<title>" << escapedForXml(view.title()) << "</title>\n<style>\n"
-        << ".machine text { font: 11px monospace; fill: #000; white-space: pre }\n"
+    out << R"(<svg xmlns="http://www.w3.org/2000/svg" class="machine" font-family="monospace" font-size="11")"
+        << " viewBox=\"0 0 " << width << ' ' << top + page.height << "\">\n<title>"
+        << escapedForXml(view.title()) << "</title>\n<style>\n"
+        << ".machine text { fill: #000; white-space: pre }\n"
            ".machine .name { font-weight: bold }\n"
            ".machine rect { stroke: #666; fill: #fff }\n"
            ".machine .paper { stroke: none }\n";

@@ -512,6 +512,7 @@ TEST_F(InventoryDrawing, HasABoxForEachPart)
     const Inventory small =
         readExport(synthetic("pack:1 [numa(memory=4294967296)] l2:2(size=1048576) core:1 pu:1"));
     writeSvg(out, small.nodes);
+    EXPECT_THAT(out.str(), Not(HasSubstr("px")));
     // Without the colours, the legend and the names.
     std::string text = out.str();
     const auto cutOut = [&](const std::string& from, const std::string& behind) {
@@ -522,7 +523,9 @@ TEST_F(InventoryDrawing, HasABoxForEachPart)
     cutOut("<g class=", "<g transform");
     text = std::regex_replace(text, std::regex("/machine[^\n]*\n"), "");
     text = std::regex_replace(text, std::regex("[-a-zN][-A-Za-z ]*[a-z-][0-9]+([:<])"), "NAME$1");
-    EXPECT_EQ(text, R"svg(<svg xmlns="http://www.w3.org/2000/svg" class="machine" viewBox="0 0 560 186">
+    EXPECT_EQ(
+        text,
+        R"svg(<svg xmlns="http://www.w3.org/2000/svg" class="machine" font-family="monospace" font-size="11" viewBox="0 0 560 186">
 <title>machine</title>
 <rect width="560" height="186" class="paper"/>
 <g transform="translate(0,27)">
