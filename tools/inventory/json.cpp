@@ -92,8 +92,10 @@ Json jsonOf(unsigned int key, const IC::PropertyValue& value)
 
 Json jsonOf(const IC::Node& node)
 {
+    const auto values = node.getProperties();
     Json properties = Json::object();
-    for (const auto& [key, value] : node.getProperties()) {
+    properties.get_ref<Json::object_t&>().reserve(values.size());  // to grow, it would copy what it holds
+    for (const auto& [key, value] : values) {
         const KeyInfo* info = infoOf(key);
         Json property {{"number", key}, {"caption", info == nullptr ? "" : info->caption}};
         if (info != nullptr && *info->unit != '\0')
@@ -109,7 +111,7 @@ Json jsonOf(const IC::Node& node)
             {"sensorName", IC::pst[node.getSensor()]},
             {"status", static_cast<unsigned int>(node.getStatus())},
             {"description", jsonOf(node.getDescription())},
-            {"properties", properties}};
+            {"properties", std::move(properties)}};
 }
 
 // In whole seconds.

@@ -247,9 +247,8 @@ int writeMachine(std::ostream& out, const CLI::App& app, const Request& request,
     if (has("--set"))
         return std::apply([&](const auto&... words) { return change(out, inventory.nodes, words...); },
                           request.setting);
-    const auto alerts = alertsOf(inventory.nodes);
     if (has("--check"))
-        return writeCheck(out, inventory.nodes, alerts);
+        return writeCheck(out, inventory.nodes, alertsOf(inventory.nodes));
     if (has("--svg"))
         writeSvg(out, inventory.nodes);
     else if (has("--html"))
@@ -257,9 +256,9 @@ int writeMachine(std::ostream& out, const CLI::App& app, const Request& request,
     else if (has("--save"))
         writeSaved(out, inventory);
     else if (has("--json"))
-        writeJson(out, inventory.nodes, alerts);
+        writeJson(out, inventory.nodes, alertsOf(inventory.nodes));
     else if (has("--metrics"))
-        writeMetrics(out, inventory.nodes, alerts, INVENTORY_VERSION);
+        writeMetrics(out, inventory.nodes, alertsOf(inventory.nodes), INVENTORY_VERSION);
     else
         describe(out, inventory.nodes, request.form);
     return EXIT_DONE;

@@ -482,6 +482,7 @@ View::View(const Nodes& nodes)
 
         Shown shown;
         shown.node = node.get();
+        shown.parent = above.shown;
         shown.properties = node->getProperties();
         shown.path = printable(path);
         shown.name = printable(path.substr(path.rfind('/') + 1));
@@ -491,8 +492,9 @@ View::View(const Nodes& nodes)
         shown.link = linkSpeed(shown.properties);
         if (const auto its = troubles.find(path); its != troubles.end())
             shown.troubles = its->second;
-        else if (const Trouble* trouble = troubleOf(*node); trouble != nullptr)
-            shown.troubles.emplace_back(trouble->words);
+        else if (node->getStatus() != 0)
+            if (const Trouble* trouble = troubleOf(*node); trouble != nullptr)
+                shown.troubles.emplace_back(trouble->words);
         shown_.push_back(std::move(shown));
         inside_[around].push_back(&shown_.back());
         places.try_emplace(path, Place {&shown_.back(), around, isDeep ? deepest : above.depth + 1});
@@ -596,14 +598,11 @@ const Shown* View::machine() const
 // Without those inside one of the same type.
 std::vector<const Shown*> View::each(Node::SensorType sensor) const
 {
-    std::map<std::string, Node::SensorType> sensors;
     std::vector<const Shown*> found;
-    for (const Shown& shown : shown_) {
-        sensors[shown.node->getPath()] = shown.node->getSensor();
-        const auto parent = sensors.find(shown.node->getParent());
-        if (shown.node->getSensor() == sensor && (parent == sensors.end() || parent->second != sensor))
+    for (const Shown& shown : shown_)
+        if (shown.node->getSensor() == sensor
+            && (shown.parent == nullptr || shown.parent->node->getSensor() != sensor))
             found.push_back(&shown);
-    }
     return found;
 }
 

@@ -23,6 +23,7 @@ constexpr const char* memorySideCache = "memory-side cache";
 // One node in words.
 struct Shown {
     const IC::Node* node = nullptr;
+    const Shown* parent = nullptr;  // null if it does not come before the node
     std::map<unsigned int, IC::PropertyValue> properties;
     std::string word;  // "core", "L2", "network port"
     std::string path;
