@@ -68,7 +68,7 @@ std::string darkFillOf(const Colour& colour)
     for (std::size_t i = 0; i < std::size(parts); ++i)
         parts[i] = std::stoul(fill.substr(1 + 2 * i, 2), nullptr, 16);
     const unsigned long least = std::min({parts[0], parts[1], parts[2]});
-    char text[32];
+    char text[64];
     const auto dark = [&](unsigned long part) { return (part + 2 * (part - least)) * 3 / 16; };
     std::snprintf(text, sizeof text, "#%02lx%02lx%02lx", dark(parts[0]), dark(parts[1]), dark(parts[2]));
     return text;
