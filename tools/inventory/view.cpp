@@ -112,6 +112,15 @@ std::string productOf(const Properties& properties)
     return maker.empty() || model.compare(0, maker.size(), maker) == 0 ? model : told(maker + ' ' + model);
 }
 
+// The model alone if it begins as its maker does: "NVIDIA Corporation" and "NVIDIA H100".
+std::string deviceOf(const Properties& properties)
+{
+    const std::string maker = textOf(properties, KEY_MAKER);
+    const std::string model = textOf(properties, KEY_MODEL);
+    const std::string first = maker.substr(0, maker.find(' ')) + ' ';
+    return first.size() > 1 && model.compare(0, first.size(), first) == 0 ? model : productOf(properties);
+}
+
 // Without "16-Core Processor" at its end: the number of cores stands beside it.
 std::string processorModel(const Properties& properties, unsigned int key = KEY_MODEL)
 {
@@ -222,7 +231,7 @@ Pieces kindOf(const Node& node, const Properties& properties)
             add(productOf(properties));
             break;
         }
-        add(joined({productOf(properties), textOf(properties, KEY_REVISION)}, " "));
+        add(joined({deviceOf(properties), textOf(properties, KEY_REVISION)}, " "));
         if (const std::string ids = textOf(properties, KEY_PCI_DEVICE); pieces.empty() && ids != "0000:0000")
             add(ids);
         add(textOf(properties, KEY_RELEASED).substr(0, 10));  // the day

@@ -221,6 +221,27 @@ TEST(InventoryTree, HasTheUnitsOfAPerson)
     EXPECT_THAT(plain.str(), StartsWith("temperature sensor one: 45.5 C, at most"));
 }
 
+TEST(InventoryTree, NamesTheMakerOfADeviceOnce)
+{
+    const std::pair<std::pair<const char*, const char*>, const char*> rows[] = {
+        {{"NVIDIA Corporation", "NVIDIA H100 80GB HBM3"}, "NVIDIA H100 80GB HBM3"},
+        {{"NVIDIA Corporation", "Tesla T4"}, "NVIDIA Corporation Tesla T4"},
+        {{"AMD", "AMD Instinct MI210"}, "AMD Instinct MI210"},
+        {{"Mat Rox", "Matrox G200"}, "Mat Rox Matrox G200"},
+    };
+    for (const auto& [device, text] : rows) {
+        Nodes nodes;
+        nodes.push_back(std::make_unique<Made>(
+            "/gpu0", "",
+            std::map<unsigned int, IC::PropertyValue> {{KEY_MAKER, IC::PropertyValue(device.first)},
+                                                       {KEY_MODEL, IC::PropertyValue(device.second)}},
+            IC::Node::SENSOR_VIDEO));
+        std::ostringstream out;
+        writeTree(out, nodes, {});
+        EXPECT_EQ(out.str(), std::string("gpu0: ") + text + '\n');
+    }
+}
+
 TEST(InventoryTree, HasEveryNodeOfADamagedOrderOnce)
 {
     // A parent of its own, a parent that comes later, two nodes of one path.
