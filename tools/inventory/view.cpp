@@ -121,6 +121,17 @@ std::string deviceOf(const Properties& properties)
     return first.size() > 1 && model.compare(0, first.size(), first) == 0 ? model : productOf(properties);
 }
 
+// Without the code that firmware writes for a maker whose name it does not know, such as "00AD063200AD".
+std::string moduleOf(const Properties& properties)
+{
+    const std::string maker = textOf(properties, KEY_MAKER);
+    const bool isCode = maker.size() >= 4 && maker.find_first_of("0123456789") != std::string::npos
+        && maker.find_first_not_of("0123456789abcdefABCDEFx") == std::string::npos;
+    return joined(
+        {isCode ? textOf(properties, KEY_MODEL) : productOf(properties), textOf(properties, KEY_PART_NUMBER)},
+        " ");
+}
+
 // Without "16-Core Processor" at its end: the number of cores stands beside it.
 std::string processorModel(const Properties& properties, unsigned int key = KEY_MODEL)
 {
@@ -222,7 +233,7 @@ Pieces kindOf(const Node& node, const Properties& properties)
         add(textOf(properties, KEY_MEMORY_TYPE));
         if (const std::string speed = countOf(properties, KEY_SPEED, ""); !speed.empty())
             add(speed + "MT/s");
-        add(joined({productOf(properties), textOf(properties, KEY_PART_NUMBER)}, " "));
+        add(moduleOf(properties));
         break;
     default:
         if (properties.count(KEY_CHIP) != 0)  // the name of a sensor says what it measures

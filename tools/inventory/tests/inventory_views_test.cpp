@@ -242,6 +242,19 @@ TEST(InventoryTree, NamesTheMakerOfADeviceOnce)
     }
 }
 
+TEST(InventoryTree, NamesTheMakerOfAModuleButNotItsCode)
+{
+    for (const auto& [maker, text] : std::vector<std::pair<std::string, std::string>> {
+             {"Samsung", "Samsung P-1"}, {"Face", "Face P-1"}, {"00AD063200AD", "P-1"}, {"0x2c00", "P-1"}}) {
+        const Inventory inventory =
+            readExport(machineOf("",
+                                 "<object type=\"Misc\" subtype=\"MemoryModule\">" + fact("Vendor", maker)
+                                     + fact("Size", "1024") + fact("PartNumber", "P-1") + "</object>"));
+        EXPECT_THAT(firstScreen(inventory), HasSubstr("  Memory      1 × 1 MiB, " + text + '\n'));
+        EXPECT_THAT(tree(inventory), HasSubstr("memory module dimm: 1 MiB, " + text + '\n'));
+    }
+}
+
 TEST(InventoryTree, HasEveryNodeOfADamagedOrderOnce)
 {
     // A parent of its own, a parent that comes later, two nodes of one path.
