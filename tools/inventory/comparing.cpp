@@ -51,7 +51,7 @@ public:
     // A set of threads as ranges; a reference as the path of the node that it leads to, if there is such a node.
     std::string textOf(unsigned int key, const IC::PropertyValue& value) const
     {
-        if (const std::string ranges = key == KEY_CPU_SET ? rangesOf(value) : ""; !ranges.empty())
+        if (std::string ranges = key == KEY_CPU_SET ? rangesOf(value) : ""; !ranges.empty())
             return ranges;
         const bool isReference = value.getKind() == IC::PropertyValue::KIND_NUMBER
             && IC::Number(value).getKind() == IC::Number::KIND_NODEREF;
