@@ -192,8 +192,8 @@ TEST(InventoryChanges, ExcludeAnotherPathOfTheSameCoreOrPackage)
     };
     EXPECT_EQ(changes(listOf({new Made(cpu, "/p-t1", {{KEY_CPU_SET, threads({1})}}), core("/core-4", 4, 1)})),
               "  CPU /p-t1\n"
-              "-   [25 = {0, 1}] numbers of the hardware threads\n"
-              "+   [25 = {1}] numbers of the hardware threads\n"
+              "-   [25 = 0-1] numbers of the hardware threads\n"
+              "+   [25 = 1] numbers of the hardware threads\n"
               "- CPU Core /core-4-t0\n");
     // With another number it is another core.
     EXPECT_EQ(changes(listOf({new Made(cpu, "/p-t0", {{KEY_CPU_SET, threads({0, 1})}}),
