@@ -6,18 +6,12 @@
 
 namespace IC::detail {
 
-// A copy saves the call that returns the standard library's own.
-[[gnu::init_priority(101)]] static const std::locale classicLocale = std::locale::classic();
-
-bool globalLocaleIsClassic()
-{
-    return std::locale() == classicLocale;
-}
+[[gnu::init_priority(101)]] const std::locale classicLocale = std::locale::classic();
 
 Text::Text()
 {
     std::locale global;
-    if (global != classicLocale)
+    if (!isClassic(global))
         locale_ = std::move(global);
 }
 

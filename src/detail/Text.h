@@ -24,7 +24,21 @@ class PropertyValue;
 
 namespace IC::detail {
 
-bool globalLocaleIsClassic();
+// A copy saves the call that returns the standard library's own.
+extern const std::locale classicLocale;
+
+// A locale is a pointer to what its copies share, so comparing the bytes saves the calls that compare names. One that
+// is equal but no copy of it is written through a stream, which writes the same.
+inline bool isClassic(const std::locale& locale)
+{
+    // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison,cert-oop57-cpp)
+    return std::memcmp(&locale, &classicLocale, sizeof locale) == 0;
+}
+
+inline bool globalLocaleIsClassic()
+{
+    return isClassic(std::locale());
+}
 
 // Collects a text form piece by piece. The text is what a fresh std::ostringstream writes under the global locale, as
 // the constructor finds it. Unlike a stream, it throws std::bad_alloc when memory runs out, and in the classic locale
