@@ -1,7 +1,6 @@
 #pragma once
 
 #include <cstddef>
-#include <functional>
 #include <iosfwd>
 #include <string>
 #include <type_traits>

@@ -2,7 +2,6 @@
 
 #include <cstddef>
 #include <cstring>
-#include <functional>
 #include <iosfwd>
 #include <string>
 #include <type_traits>

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <cstddef>
-#include <functional>
 #include <iosfwd>
 #include <map>
 #include <string>

@@ -144,15 +144,17 @@ inline bool Number::get(ZQ::Uint32& out) const noexcept
         out = load<ZQ::Uint32>();
         return true;
     }
-    if (kind_ == KIND_BOOL) {
-        out = load<ZQ::Uint8>() != 0 ? 1 : 0;
-        return true;
-    }
+    if (kind_ == KIND_REAL)
+        return getReal(out, 0x1p32);
     if (kind_ == KIND_UINT64) {
         out = static_cast<ZQ::Uint32>(load<ZQ::Uint64>());
         return out == load<ZQ::Uint64>();
     }
-    return kind_ == KIND_REAL && getReal(out, 0x1p32);
+    if (kind_ == KIND_BOOL) {
+        out = load<ZQ::Uint8>() != 0 ? 1 : 0;
+        return true;
+    }
+    return false;
 }
 
 inline bool Number::get(ZQ::Uint64& out) const noexcept
@@ -161,7 +163,7 @@ inline bool Number::get(ZQ::Uint64& out) const noexcept
         out = load<ZQ::Uint64>();
         return true;
     }
-    if (kind_ == KIND_UINT32) {
+    if (detail::likely(kind_ == KIND_UINT32)) {
         out = load<ZQ::Uint32>();
         return true;
     }
@@ -178,7 +180,7 @@ inline bool Number::get(ZQ::Real64& out) const noexcept
         out = load<ZQ::Real64>();
         return true;
     }
-    if (kind_ == KIND_UINT32) {
+    if (detail::likely(kind_ == KIND_UINT32)) {
         out = load<ZQ::Uint32>();
         return true;
     }
@@ -215,6 +217,9 @@ inline bool Number::both(KindType kind, const Number& a, const Number& b) noexce
     return a.kind_ == kind && b.kind_ == kind;
 }
 
+// std::equal_to needs no pragma, but <functional> takes as long to compile as all of IC/Number.h.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wfloat-equal"
 inline bool operator==(const Number& a, const Number& b)
 {
     if (a.kind_ != b.kind_)
@@ -222,9 +227,10 @@ inline bool operator==(const Number& a, const Number& b)
     if (Number::both(Number::KIND_UINT32, a, b))
         return a.load<ZQ::Uint32>() == b.load<ZQ::Uint32>();
     if (Number::both(Number::KIND_REAL, a, b))
-        return std::equal_to<>()(a.load<ZQ::Real64>(), b.load<ZQ::Real64>());
+        return a.load<ZQ::Real64>() == b.load<ZQ::Real64>();
     return Number::equal(a, b);
 }
+#pragma GCC diagnostic pop
 
 inline bool operator<(const Number& a, const Number& b)
 {
