@@ -273,6 +273,8 @@ inline bool operator<(const PropertyValue& a, const PropertyValue& b)
         return a.object<Number>() < b.object<Number>();
     if (Value::bothHold(Value::KIND_STRING, a, b))
         return a.object<std::string>() < b.object<std::string>();
+    if (Value::bothHold(Value::KIND_BUFFER, a, b))
+        return a.object<Buffer>() < b.object<Buffer>();
     return Value::less(a, b);
 }
 
@@ -283,6 +285,8 @@ inline bool operator>(const PropertyValue& a, const PropertyValue& b)
         return a.object<Number>() > b.object<Number>();
     if (Value::bothHold(Value::KIND_STRING, a, b))
         return a.object<std::string>() > b.object<std::string>();
+    if (Value::bothHold(Value::KIND_BUFFER, a, b))
+        return a.object<Buffer>() > b.object<Buffer>();
     return Value::greater(a, b);
 }
 
