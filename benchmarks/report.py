@@ -102,7 +102,7 @@ def read_process(path):
 
 
 def read_commands(paths):
-    """The results of hyperfine: for each row the CPU time of each contender, in nanoseconds."""
+    """One round of hyperfine: for each row the CPU time of each contender, in nanoseconds."""
     rows = {}
     for path in paths:
         for result in json.loads(path.read_text(encoding="utf-8"))["results"]:
@@ -132,13 +132,17 @@ class Row(dict):
 def read_results(paths):
     """The context, and the rows by their names."""
     processes = {}
-    commands = [path for path in paths if path.name.startswith("start-")]
+    rounds = {}
     for path in paths:
-        if path not in commands:
-            context, rows = read_process(path)
-            for row, contenders in rows.items():
-                processes.setdefault(row, []).append(contenders)
-    processes.update((row, [contenders]) for row, contenders in read_commands(commands).items())
+        if path.name.startswith("start-"):
+            rounds.setdefault(path.name.split("-")[1], []).append(path)
+            continue
+        context, rows = read_process(path)
+        for row, contenders in rows.items():
+            processes.setdefault(row, []).append(contenders)
+    for commands in rounds.values():
+        for row, contenders in read_commands(commands).items():
+            processes.setdefault(row, []).append(contenders)
     kinds = list(dict.fromkeys(kind(row) for row in processes))
     # Rows of one kind stand together; sizes and primitives come last.
     rows = sorted(processes, key=lambda row: (kind(row) in {"bytes", PRIMITIVE}, kinds.index(kind(row))))
