@@ -94,7 +94,8 @@ inline PropertyValue& PropertyValue::operator=(const PropertyValue& source)
 {
     if (bothHold(KIND_NUMBER, *this, source)) {
         object<Number>() = source.object<Number>();
-        readOnly_ = source.readOnly_;
+        if (readOnly_ != source.readOnly_)  // a store would take the line from the cache of another processor
+            readOnly_ = source.readOnly_;
     } else if (this != &source) {
         assign(source);
     }
