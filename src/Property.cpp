@@ -24,6 +24,14 @@ auto kindOf(const PropertyValue& value)
 
 constexpr char notANumber[] = "Can't return current value as a Number";
 
+// Not inline: the copy takes a frame that assignment within the capacity does not need.
+template <class T>
+[[gnu::noinline]] void replaceByCopy(T& target, const T& source)
+{
+    T copy(source);
+    target.swap(copy);
+}
+
 template <class T>
 void replace(T& target, const T& source)
 {
@@ -34,12 +42,10 @@ void replace(T& target, const T& source)
 template <class Element>
 void replace(std::vector<Element>& target, const std::vector<Element>& source)
 {
-    if (std::is_trivially_copyable_v<Element> && source.size() <= target.capacity()) {
+    if (std::is_trivially_copyable_v<Element> && source.size() <= target.capacity())
         target = source;
-        return;
-    }
-    std::vector<Element> copy(source);
-    target.swap(copy);
+    else
+        replaceByCopy(target, source);
 }
 
 template <class T>
@@ -134,8 +140,7 @@ void PropertyValue::copyObject(const PropertyValue& source)
 void PropertyValue::assign(const PropertyValue& source)
 {
     if (kind_ != source.kind_ || value_ == nullptr) {
-        PropertyValue copy(source);
-        swap(copy);
+        replaceByCopy(*this, source);
         return;
     }
     visit(kind_, [this, &source](auto held) {
