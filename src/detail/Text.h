@@ -27,8 +27,8 @@ namespace IC::detail {
 // A copy saves the call that returns the standard library's own.
 extern const std::locale classicLocale;
 
-// A locale is a pointer to what its copies share, so comparing the bytes saves the calls that compare names. One that
-// is equal but no copy of it is written through a stream, which writes the same.
+// Whether it is a copy of the classic locale. A locale is a pointer to what its copies share: comparing the bytes saves
+// the calls that compare names. Under a locale that only has the same name, numbers go through a stream.
 inline bool isClassic(const std::locale& locale)
 {
     // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison,cert-oop57-cpp)

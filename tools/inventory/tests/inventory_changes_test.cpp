@@ -44,14 +44,23 @@ Nodes listOf(std::initializer_list<Made*> nodes)
 constexpr auto cpu = IC::Node::SENSOR_CPU;
 constexpr auto fan = IC::Node::SENSOR_FAN;
 
+IC::NumberArray threads(const std::vector<unsigned int>& numbers)
+{
+    return {numbers.begin(), numbers.end()};
+}
+
+std::string written(const Nodes& before, const Nodes& after)
+{
+    std::ostringstream out;
+    writeChanges(out, changesBetween(before, after));
+    return out.str();
+}
+
 // The lines for a change of property 12 from one value to another.
 std::string between(const IC::PropertyValue& before, const IC::PropertyValue& after)
 {
-    const Nodes old = listOf({new Made(cpu, "/cpu0", {{KEY_MODEL, before}})});
-    const Nodes current = listOf({new Made(cpu, "/cpu0", {{KEY_MODEL, after}})});
-    std::ostringstream out;
-    writeChanges(out, changesBetween(old, current));
-    return out.str();
+    return written(listOf({new Made(cpu, "/cpu0", {{KEY_MODEL, before}})}),
+                   listOf({new Made(cpu, "/cpu0", {{KEY_MODEL, after}})}));
 }
 
 std::string linesFor(const std::string& before, const std::string& after)
@@ -116,38 +125,25 @@ TEST(InventoryChanges, CompareReferencesByTheNodesThatTheyLeadTo)
                        new Made(cpu, "/cpu1", {{KEY_SELF, reference(second)}}),
                        new Made(fan, "/fan", {{KEY_PARENT, reference(owner)}})});
     };
-    const auto changes = [](const Nodes& before, const Nodes& after) {
-        std::ostringstream out;
-        writeChanges(out, changesBetween(before, after));
-        return out.str();
-    };
     const Nodes first = machine(0, 1, 0);
-    EXPECT_EQ(changes(first, machine(0, 1, 0)), "");
-    EXPECT_EQ(changes(first, machine(0, 1, 1)),
+    EXPECT_EQ(written(first, machine(0, 1, 0)), "");
+    EXPECT_EQ(written(first, machine(0, 1, 1)),
               "  Fan /fan\n-   [2 = /cpu0] parent node\n+   [2 = /cpu1] parent node\n");
     // The processors have exchanged their numbers.
-    EXPECT_EQ(changes(first, machine(1, 0, 0)),
+    EXPECT_EQ(written(first, machine(1, 0, 0)),
               "  Fan /fan\n-   [2 = /cpu0] parent node\n+   [2 = /cpu1] parent node\n");
-    EXPECT_EQ(changes(first, machine(1, 0, 1)), "");
-    EXPECT_EQ(changes(first, machine(0, 1, 7)),
+    EXPECT_EQ(written(first, machine(1, 0, 1)), "");
+    EXPECT_EQ(written(first, machine(0, 1, 7)),
               "  Fan /fan\n-   [2 = /cpu0] parent node\n+   [2 = CPU:7] parent node\n");
 }
 
 TEST(InventoryChanges, WriteSetsAsRanges)
 {
-    const auto threads = [](std::initializer_list<unsigned int> numbers) {
-        IC::NumberArray array;
-        for (const unsigned int number : numbers)
-            array.push_back(IC::Number(number));
-        return IC::PropertyValue(array);
-    };
     const Nodes old = listOf({new Made(cpu, "/cpu0", {{KEY_CPU_SET, threads({0, 1, 2, 3, 192, 193})}}),
                               new Made(cpu, "/cpu1", {{KEY_CPU_SET, threads({4, 5})}})});
     const Nodes current = listOf({new Made(cpu, "/cpu0", {{KEY_CPU_SET, threads({0, 1, 2, 192})}}),
                                   new Made(cpu, "/cpu1", {{KEY_CPU_SET, threads({})}})});
-    std::ostringstream out;
-    writeChanges(out, changesBetween(old, current));
-    EXPECT_EQ(out.str(),
+    EXPECT_EQ(written(old, current),
               "  CPU /cpu0\n"
               "-   [25 = 0-3,192-193] numbers of the hardware threads\n"
               "+   [25 = 0-2,192] numbers of the hardware threads\n"
@@ -162,9 +158,7 @@ TEST(InventoryChanges, IncludeNodesAndPropertiesThatComeAndGo)
                                  new Made(cpu, "/cpu1", {{KEY_MODEL, "x"}}), new Made(fan, "/a")});
     const Nodes after = listOf({new Made(fan, "/fan1"), new Made(cpu, "/a"),
                                 new Made(cpu, "/cpu0", {{KEY_MODEL, "x"}, {KEY_REVISION, "z"}})});
-    std::ostringstream out;
-    writeChanges(out, changesBetween(before, after));
-    EXPECT_EQ(out.str(),
+    EXPECT_EQ(written(before, after),
               "  CPU /cpu0\n"
               "-   [11 = y] maker\n"
               "+   [13 = z] revision\n"
@@ -176,27 +170,21 @@ TEST(InventoryChanges, IncludeNodesAndPropertiesThatComeAndGo)
 
 TEST(InventoryChanges, ExcludeAnotherPathOfTheSameCoreOrPackage)
 {
-    const auto threads = [](const std::vector<unsigned int>& numbers) {
-        return IC::NumberArray(numbers.begin(), numbers.end());
-    };
-    const auto core = [&](const char* path, unsigned int number, unsigned int thread) {
+    const auto core = [](const char* path, unsigned int number, unsigned int thread) {
         return new Made(IC::Node::SENSOR_CPU_CORE, path,
                         {{KEY_INDEX, IC::Number(number)}, {KEY_CPU_SET, threads({thread})}});
     };
     const Nodes before = listOf({new Made(cpu, "/p-t0", {{KEY_CPU_SET, threads({0, 1})}}),
                                  core("/core-4-t0", 4, 0), core("/core-4-t1", 4, 1)});
-    const auto changes = [&before](const Nodes& after) {
-        std::ostringstream out;
-        writeChanges(out, changesBetween(before, after));
-        return out.str();
-    };
-    EXPECT_EQ(changes(listOf({new Made(cpu, "/p-t1", {{KEY_CPU_SET, threads({1})}}), core("/core-4", 4, 1)})),
+    EXPECT_EQ(written(before,
+                      listOf({new Made(cpu, "/p-t1", {{KEY_CPU_SET, threads({1})}}), core("/core-4", 4, 1)})),
               "  CPU /p-t1\n"
               "-   [25 = 0-1] numbers of the hardware threads\n"
               "+   [25 = 1] numbers of the hardware threads\n"
               "- CPU Core /core-4-t0\n");
     // With another number it is another core.
-    EXPECT_EQ(changes(listOf({new Made(cpu, "/p-t0", {{KEY_CPU_SET, threads({0, 1})}}),
+    EXPECT_EQ(written(before,
+                      listOf({new Made(cpu, "/p-t0", {{KEY_CPU_SET, threads({0, 1})}}),
                               core("/core-4-t0", 4, 0), core("/core-5", 5, 1)})),
               "- CPU Core /core-4-t1\n+ CPU Core /core-5\n");
 }
