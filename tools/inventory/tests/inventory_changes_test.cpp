@@ -16,7 +16,6 @@
 namespace {
 
 using namespace inventory;
-using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
