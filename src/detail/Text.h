@@ -27,12 +27,12 @@ namespace IC::detail {
 // A copy saves the call that returns the standard library's own.
 extern const std::locale classicLocale;
 
-// Whether it is a copy of the classic locale. A locale is a pointer to what its copies share: comparing the bytes saves
-// the calls that compare names. Under a locale that only has the same name, numbers go through a stream.
+// A locale is a pointer to what its copies share: comparing the bytes saves the call of operator==, which compares names
+// and thus also knows a classic locale that is not a copy of this one.
 inline bool isClassic(const std::locale& locale)
 {
     // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison,cert-oop57-cpp)
-    return std::memcmp(&locale, &classicLocale, sizeof locale) == 0;
+    return std::memcmp(&locale, &classicLocale, sizeof locale) == 0 || locale == classicLocale;
 }
 
 inline bool globalLocaleIsClassic()

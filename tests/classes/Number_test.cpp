@@ -1825,6 +1825,15 @@ TEST(NumberText, OfARealFollowsTheRoundingModeOnlyUnderAnotherLocaleThanTheClass
     }
 }
 
+TEST(NumberText, TakesALocaleThatEqualsTheClassicOneForIt)
+{
+    const std::locale classic(std::locale::classic(), "C", std::locale::collate);  // not a copy of it
+    ASSERT_EQ(classic, std::locale::classic());
+    const GlobalLocale locale(classic);
+    const RoundingMode mode(FE_UPWARD);
+    EXPECT_EQ(std::string(Number(1.0 / 3)), "0.333333");
+}
+
 TEST(NumberText, UsesTheNumberFacetOfTheGlobalLocale)
 {
     const TextRow rows[] = {{Number(-7), "<-7>"},
