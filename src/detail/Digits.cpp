@@ -31,7 +31,9 @@ std::uint64_t sixDigits(std::uint32_t number)
 {
     const auto pair = [](std::uint32_t two) {
         const char* const text = digitPairs<10>.data() + 2 * std::size_t {two};
-        return static_cast<std::uint64_t>(text[0]) | static_cast<std::uint64_t>(text[1]) << 8;
+        const auto first = static_cast<unsigned char>(text[0]);
+        const auto second = static_cast<unsigned char>(text[1]);
+        return std::uint64_t {first} | std::uint64_t {second} << 8;
     };
     const std::uint32_t high = number / 10000;
     const std::uint32_t low = number % 10000;
@@ -51,7 +53,8 @@ void store(char* out, std::uint64_t text)
 //
 // Scaling by powers of ten moves six digits before the point. A multiplication adds an error below 2^-32; in a rounding
 // mode other than to the nearest, below 2^-31. Three of them stay below `uncertain`. A result that is further than that
-// from the middle between two integers has the same nearest integer as the exact product.
+// from the middle between two integers has the same nearest integer as the exact product. Only the check asks for the
+// distance, so the digits do not wait for it.
 char* writeSixDigits(char* out, double real)
 {
     constexpr double uncertain = 0x1p-29;
@@ -76,11 +79,9 @@ char* writeSixDigits(char* out, double real)
         ++exponent;
         scaled *= powerOfTen(-1);
     }
-    auto number = static_cast<std::uint32_t>(scaled);
-    const double rest = scaled - number;
-    if (std::fabs(rest - 0.5) <= uncertain)
+    const auto number = static_cast<std::uint32_t>(scaled + 0.5);
+    if (std::fabs(scaled - number) >= 0.5 - uncertain)
         return nullptr;
-    number += rest > 0.5 ? 1 : 0;
     if (number > 999999)
         return nullptr;
 
