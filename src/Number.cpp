@@ -500,7 +500,7 @@ void detail::Text::append(const std::vector<Number>& numbers)
     constexpr std::size_t longest = 22;      // 18446744073709551615 and ", "
     reserve(12 * numbers.size() + longest);  // 4294967295 and ", "; most numbers are shorter
     add('{');
-    const bool plain = !locale_;
+    const bool plain = isClassic_;
     char* out = text_ + used_;
     const char* last = text_ + room_ - longest;
     for (const Number& number : numbers) {

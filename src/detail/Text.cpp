@@ -8,16 +8,9 @@ namespace IC::detail {
 
 [[gnu::init_priority(101)]] const std::locale classicLocale = std::locale::classic();
 
-Text::Text()
-{
-    std::locale global;
-    if (!isClassic(global))
-        locale_ = std::move(global);
-}
-
 void Text::add(int number)
 {
-    if (locale_) {
+    if (!isClassic_) {
         addStreamed(number);
         return;
     }
@@ -38,7 +31,7 @@ void Text::add(unsigned long long number)
 
 void Text::add(double number)
 {
-    if (locale_) {
+    if (!isClassic_) {
         addStreamed(number);
         return;
     }

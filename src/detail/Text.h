@@ -4,7 +4,6 @@
 #include <cstring>
 #include <limits>
 #include <locale>
-#include <optional>
 #include <ostream>
 #include <streambuf>
 #include <string>
@@ -27,17 +26,40 @@ namespace IC::detail {
 // A copy saves the call that returns the standard library's own.
 extern const std::locale classicLocale;
 
-// A locale is a pointer to what its copies share: comparing the bytes saves the call of operator==, which compares names
-// and thus also knows a classic locale that is not a copy of this one.
-inline bool isClassic(const std::locale& locale)
-{
-    // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison,cert-oop57-cpp)
-    return std::memcmp(&locale, &classicLocale, sizeof locale) == 0 || locale == classicLocale;
-}
+// The global locale, as the constructor finds it.
+class GlobalLocale {
+public:
+    GlobalLocale() : locale_() { }
+    // The classic locale lasts as long as the program: leaving a copy of it as it is saves a call.
+    ~GlobalLocale()
+    {
+        if (!isCopyOfClassic())
+            locale_.~locale();
+    }
+    GlobalLocale(const GlobalLocale&) = delete;
+    GlobalLocale& operator=(const GlobalLocale&) = delete;
+
+    // Whether it equals the classic locale.
+    bool isClassic() const { return isCopyOfClassic() || locale_ == classicLocale; }
+
+    const std::locale& get() const { return locale_; }
+
+private:
+    // A locale is a pointer to what its copies share: comparing the bytes saves the call of operator==.
+    bool isCopyOfClassic() const
+    {
+        // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison,cert-oop57-cpp)
+        return std::memcmp(&locale_, &classicLocale, sizeof locale_) == 0;
+    }
+
+    union {  // its destructor does nothing
+        std::locale locale_;
+    };
+};
 
 inline bool globalLocaleIsClassic()
 {
-    return isClassic(std::locale());
+    return GlobalLocale().isClassic();
 }
 
 // Collects a text form piece by piece. The text is what a fresh std::ostringstream writes under the global locale, as
@@ -45,7 +67,7 @@ inline bool globalLocaleIsClassic()
 // it rounds reals to the nearest text in any rounding mode: asking for the mode would cost time in each.
 class Text {
 public:
-    Text();
+    Text() = default;
 
     // Makes room for `length` more characters.
     void reserve(std::size_t length) { room(length); }
@@ -92,7 +114,7 @@ public:
     {
         Inserted inserted(*this);
         std::ostream out(&inserted);
-        out.imbue(locale_ ? *locale_ : std::locale::classic());
+        out.imbue(locale_.get());
         out.exceptions(std::ios_base::badbit);
         out << piece;
     }
@@ -137,7 +159,7 @@ private:
     template <class T>
     void addInteger(T number)
     {
-        if (locale_) {
+        if (!isClassic_) {
             addStreamed(number);
             return;
         }
@@ -160,9 +182,9 @@ private:
     char* text_ = short_;
     std::size_t room_ = sizeof short_;
     std::size_t used_ = 0;
-    // The global locale, unless it is the classic one. Only its own facets know how it writes numbers, so numbers then
-    // go through a stream.
-    std::optional<std::locale> locale_;
+    GlobalLocale locale_;
+    // Otherwise only the locale's own facets know how it writes numbers, so numbers go through a stream.
+    const bool isClassic_ = locale_.isClassic();
 };
 
 // Returns the text. Throws std::logic_error for a null pointer, which std::string need not.
