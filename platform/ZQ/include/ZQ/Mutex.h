@@ -24,10 +24,7 @@ public:
     // example because it is nested too deeply.
     bool lock(unsigned int timeoutMilliseconds)
     {
-        if (timeoutMilliseconds != forEver)
-            return lockWithin(timeoutMilliseconds);
-        mutex_.lock();
-        return true;
+        return (timeoutMilliseconds == forEver && mutex_.try_lock()) || lockWithin(timeoutMilliseconds);
     }
 
     // Releases one lock; throws nothing. The calling thread must hold the mutex.
