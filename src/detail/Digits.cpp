@@ -79,6 +79,7 @@ char* writeSixDigits(char* out, double real)
         ++exponent;
         scaled *= powerOfTen(-1);
     }
+    // NOLINTNEXTLINE(bugprone-incorrect-roundings): the check finds what this rounds wrongly
     const auto number = static_cast<std::uint32_t>(scaled + 0.5);
     if (std::fabs(scaled - number) >= 0.5 - uncertain)
         return nullptr;
