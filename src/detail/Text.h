@@ -40,7 +40,7 @@ public:
     GlobalLocale& operator=(const GlobalLocale&) = delete;
 
     // Whether it equals the classic locale.
-    bool isClassic() const { return isCopyOfClassic() || locale_ == classicLocale; }
+    bool isClassic() const { return isCopyOfClassic() || locale_ == std::locale::classic(); }
 
     const std::locale& get() const { return locale_; }
 
