@@ -160,6 +160,7 @@ bool operator>=(const Node& a, const Node& b)
 
 std::ostream& operator<<(std::ostream& out, const Node& node)
 {
+    // Through the string, because a derived class may override the conversion.
     return out << node.operator std::string();
 }
 

@@ -79,7 +79,7 @@ char* writeSixDigits(char* out, double real)
         ++exponent;
         scaled *= powerOfTen(-1);
     }
-    // NOLINTNEXTLINE(bugprone-incorrect-roundings): the check finds what this rounds wrongly
+    // NOLINTNEXTLINE(bugprone-incorrect-roundings): what lies in the middle is refused
     const auto number = static_cast<std::uint32_t>(scaled + 0.5);
     if (std::fabs(scaled - number) >= 0.5 - uncertain)
         return nullptr;

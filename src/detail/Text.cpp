@@ -8,6 +8,12 @@ namespace IC::detail {
 
 [[gnu::init_priority(101)]] const std::locale classicLocale = std::locale::classic();
 
+// Not by operator==: it allocates for a locale of several names, and ends the program when memory runs out.
+bool GlobalLocale::isNamedClassic() const
+{
+    return locale_.name() == "C";
+}
+
 void Text::add(int number)
 {
     if (!isClassic_) {

@@ -30,7 +30,8 @@ extern const std::locale classicLocale;
 class GlobalLocale {
 public:
     GlobalLocale() : locale_() { }
-    // The classic locale lasts as long as the program: leaving a copy of it as it is saves a call.
+    // The classic locale lasts as long as the program, however many copies of it there are: leaving one as it is saves a
+    // call.
     ~GlobalLocale()
     {
         if (!isCopyOfClassic())
@@ -39,18 +40,19 @@ public:
     GlobalLocale(const GlobalLocale&) = delete;
     GlobalLocale& operator=(const GlobalLocale&) = delete;
 
-    // Whether it equals the classic locale.
-    bool isClassic() const { return isCopyOfClassic() || locale_ == std::locale::classic(); }
+    // Whether it equals the classic locale. Throws std::bad_alloc when memory runs out.
+    bool isClassic() const { return isCopyOfClassic() || isNamedClassic(); }
 
     const std::locale& get() const { return locale_; }
 
 private:
-    // A locale is a pointer to what its copies share: comparing the bytes saves the call of operator==.
+    // A locale is a pointer to what its copies share: comparing the bytes saves a call.
     bool isCopyOfClassic() const
     {
         // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison,cert-oop57-cpp)
         return std::memcmp(&locale_, &classicLocale, sizeof locale_) == 0;
     }
+    bool isNamedClassic() const;
 
     union {  // its destructor does nothing
         std::locale locale_;

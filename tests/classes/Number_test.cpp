@@ -1733,9 +1733,26 @@ TEST(NumberText, FollowsTheGlobalLocaleLikeANewStream)
 
 TEST(NumberText, IsCompleteOrThrowsUnderAnotherLocaleWhenMemoryRunsOut)
 {
-    const GlobalLocale locale(decimalComma());
-    allocation::expectTextCompleteOrThrows(Number(18446744073709551615ull), "18.446.744.073.709.551.615");
-    allocation::expectTextCompleteOrThrows(Number(sNodeRef {25, 4294967295}), "Power Supply:4.294.967.295");
+    {
+        const GlobalLocale locale(decimalComma());
+        allocation::expectTextCompleteOrThrows(Number(18446744073709551615ull), "18.446.744.073.709.551.615");
+        allocation::expectTextCompleteOrThrows(Number(sNodeRef {25, 4294967295}),
+                                               "Power Supply:4.294.967.295");
+    }
+    // Its name is composed anew each time that it is asked for.
+    const GlobalLocale severalNames(std::locale(std::locale::classic(), "C.UTF-8", std::locale::collate));
+    allocation::expectTextCompleteOrThrows(Number(18446744073709551615ull), "18446744073709551615");
+}
+
+TEST(NumberText, ReleasesTheGlobalLocale)
+{
+    bool isDestroyed = false;
+    {
+        const GlobalLocale locale(std::locale(std::locale::classic(), new ObservedDigits(isDestroyed)));
+        EXPECT_EQ(text(Number(7u)), "7");
+        EXPECT_EQ(text(Number(Version2 {2, 15})), "2.15");
+    }
+    EXPECT_TRUE(isDestroyed);
 }
 
 TEST(NumberText, EqualsTheOutputOfANewStream)

@@ -15,6 +15,16 @@ private:
     std::string grouping_;
 };
 
+// Tells when the last locale that has it is gone.
+class ObservedDigits : public std::numpunct<char> {
+public:
+    explicit ObservedDigits(bool& isDestroyed) : isDestroyed_(isDestroyed) { }
+    ~ObservedDigits() override { isDestroyed_ = true; }
+
+private:
+    bool& isDestroyed_;
+};
+
 inline std::locale groupingLocale(char digitsPerGroup = 3)
 {
     return std::locale(std::locale::classic(), new GroupingDigits(digitsPerGroup));

@@ -15,14 +15,22 @@ namespace VXLog {
 
 namespace {
 
+// Whether the locale is a copy of the classic one, and thus a pointer to the same content. Not by operator==: it may
+// allocate, and ends the program when memory runs out.
+bool isCopyOfClassic(const std::locale& locale)
+{
+    // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison,cert-oop57-cpp)
+    return std::memcmp(&locale, &std::locale::classic(), sizeof locale) == 0;
+}
+
 // Collects what is written to a stream. Throws std::bad_alloc if memory runs out.
 class TextBuffer : public std::streambuf {
 public:
     std::string text;
-    bool isImbued = false;  // with another locale than the classic one
+    bool isImbued = false;  // with another locale than a copy of the classic one
 
 protected:
-    void imbue(const std::locale& locale) override { isImbued = locale != std::locale::classic(); }
+    void imbue(const std::locale& locale) override { isImbued = !isCopyOfClassic(locale); }
 
     int_type overflow(int_type character) override
     {
@@ -86,7 +94,7 @@ struct VXMessageBuffer::Composer {
         stream.rdbuf(&buffer);  // clears the error state too
         stream.exceptions(std::ios_base::badbit);
         stream.tie(nullptr);
-        if (buffer.isImbued || stream.getloc() != std::locale::classic())
+        if (buffer.isImbued || !isCopyOfClassic(stream.getloc()))
             stream.imbue(std::locale::classic());
         stream.flags(std::ios_base::dec | std::ios_base::skipws);
         stream.precision(6);
