@@ -241,6 +241,25 @@ TEST(Mutex, GivesUpAfterTheTimeOut)
     mutex.unlock();
 }
 
+#ifdef __SANITIZE_THREAD__
+TEST(Mutex, LetsThreadSanitizerSeeTheOrderOfLocks)
+{
+    EXPECT_EXIT(
+        {
+            ZQ::Mutex first;
+            ZQ::Mutex second;
+            for (const bool isReverse : {false, true}) {
+                (isReverse ? second : first).lock(0xFFFFFFFF);
+                (isReverse ? first : second).lock(0xFFFFFFFF);
+                first.unlock();
+                second.unlock();
+            }
+            std::exit(0);
+        },
+        testing::ExitedWithCode(66), "lock-order-inversion");
+}
+#endif
+
 TEST(Mutex, WaitsForEverWith0xFFFFFFFF)
 {
     ZQ::Mutex mutex;
@@ -302,15 +321,14 @@ TEST(MessageBuffer, StartsWithDefaultSettingsAfterABufferThatChangedThem)
               "1234567 1234567 0.123456");
 }
 
-// Tells when the last locale that has it is gone.
-class ObservedDigits : public std::numpunct<char> {
-public:
-    explicit ObservedDigits(bool& isDestroyed) : isDestroyed_(isDestroyed) { }
-    ~ObservedDigits() override { isDestroyed_ = true; }
-
-private:
-    bool& isDestroyed_;
-};
+TEST(MessageBuffer, TakesALocaleOfSeveralNamesWhenMemoryRunsOut)
+{
+    const std::locale severalNames(std::locale::classic(), "C.UTF-8", std::locale::collate);
+    EXPECT_TRUE(allocation::completesWith(0, [&severalNames] {
+        VXLog::VXMessageBuffer buffer;
+        static_cast<std::ostream&>(buffer).imbue(severalNames);
+    }));
+}
 
 TEST(MessageBuffer, ReleasesTheLocaleThatItsUserSet)
 {

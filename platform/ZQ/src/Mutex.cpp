@@ -1,19 +1,18 @@
 #include "ZQ/Mutex.h"
 
 #include <chrono>
-#include <thread>
 
 namespace ZQ {
 
 namespace {
 
-// Gives another thread the time to release a mutex.
-void pause()
+// Lets the processor wait for a moment, if it can. Not by yielding to other threads: they may keep it for long.
+void waitBriefly()
 {
 #if defined(__x86_64__) || defined(__i386__)
     __builtin_ia32_pause();
-#else
-    std::this_thread::yield();
+#elif defined(__aarch64__)
+    asm volatile("yield");
 #endif
 }
 
@@ -28,7 +27,7 @@ bool Mutex::lockWithin(unsigned int timeoutMilliseconds)
         // pauses grow, because an attempt takes the mutex's cache line from its holder.
         for (int pauses = 4; pauses <= 64; pauses *= 2) {
             for (int i = 0; i < pauses; ++i)
-                pause();
+                waitBriefly();
             if (mutex_.try_lock())
                 return true;
         }
