@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "IC/ICException.h"
 #include "IC/Node.h"
 #include "Samples.h"
 #include "VXLog/RecordSink.h"
@@ -239,6 +240,18 @@ const std::map<std::string, std::function<void(long)>> operations = {
     {"read-as-uint64", read<Subject::anyNumber, unsigned long long>},
     {"read-as-real", read<Subject::anyNumber, double>},
     {"read-real-as-uint32", read<Subject::wholeReal, unsigned int>},
+    {"refused-read",
+     [](long count) {
+         const PropertyValue text(std::string("no number"));
+         for (; count > 0; --count) {
+             try {
+                 const unsigned int number = text;
+                 use(number);
+             } catch (const IC::PropertyValueInvalidKind&) {
+                 continue;
+             }
+         }
+     }},
     {"unequal-kinds", compare<Subject::anyNumber, Subject::anyReal>},
     {"equal-numbers", compare<Subject::numbers100, Subject::numbers100>},
     {"get-same-kind",

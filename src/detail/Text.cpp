@@ -14,6 +14,8 @@ bool GlobalLocale::isNamedClassic() const
     return locale_.name() == "C";
 }
 
+Text::Text() = default;
+
 void Text::add(int number)
 {
     if (!isClassic_) {

@@ -69,7 +69,7 @@ inline bool globalLocaleIsClassic()
 // it rounds reals to the nearest text in any rounding mode: asking for the mode would cost time in each.
 class Text {
 public:
-    Text() = default;
+    Text();
 
     // Makes room for `length` more characters.
     void reserve(std::size_t length) { room(length); }
