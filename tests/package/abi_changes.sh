@@ -3,7 +3,7 @@
 set -eu
 compiler=$1
 work=$2
-abi=$(cd "$(dirname "$0")" && pwd)/abi.sh
+abi=$(CDPATH='' cd "$(dirname "$0")" && pwd)/abi.sh
 rm -rf "$work"
 mkdir -p "$work/include"
 status=0

@@ -14,7 +14,7 @@ way=$1
 source=$2
 installed=$3/install
 work=$3/$way
-here=$(cd "$(dirname "$0")" && pwd)
+here=$(CDPATH='' cd "$(dirname "$0")" && pwd)
 rm -rf "$work"
 mkdir -p "$work"
 
