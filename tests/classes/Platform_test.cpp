@@ -324,10 +324,9 @@ TEST(MessageBuffer, StartsWithDefaultSettingsAfterABufferThatChangedThem)
 TEST(MessageBuffer, TakesALocaleOfSeveralNamesWhenMemoryRunsOut)
 {
     const std::locale severalNames(std::locale::classic(), "C.UTF-8", std::locale::collate);
-    EXPECT_TRUE(allocation::completesWith(0, [&severalNames] {
-        VXLog::VXMessageBuffer buffer;
-        static_cast<std::ostream&>(buffer).imbue(severalNames);
-    }));
+    VXLog::VXMessageBuffer buffer;
+    std::ostream& stream = buffer;
+    EXPECT_TRUE(allocation::completesWith(0, [&] { stream.imbue(severalNames); }));
 }
 
 TEST(MessageBuffer, ReleasesTheLocaleThatItsUserSet)
