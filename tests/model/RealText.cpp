@@ -1,7 +1,8 @@
-// RealText [COUNT]: compares the texts of reals with those that new streams write. First come powers of ten and of two
-// with their neighbours, and denormals; then COUNT reals: random bits, random decimals of up to 17 digits, halfway
-// cases. Exits with 1 at the first difference.
+// RealText [COUNT]: compares the texts of reals, and of arrays of a hundred reals, with those that new streams write.
+// First come powers of ten and of two with their neighbours, and denormals; then COUNT reals: random bits, random
+// decimals of up to 17 digits, halfway cases. Exits with 1 at the first difference.
 #include <cmath>
+#include <cstddef>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
@@ -9,19 +10,41 @@
 #include <limits>
 #include <random>
 #include <sstream>
+#include <string>
 
 #include "IC/Number.h"
+#include "IC/Property.h"
 
 namespace {
 
 std::mt19937_64 randomBits(20260801);
+
+// Collects the reals and their texts, and compares each hundred.
+bool agreesInArray(double real, const std::string& text)
+{
+    constexpr std::size_t count = 100;
+    static IC::NumberArray reals;
+    static std::string expected;
+    reals.emplace_back(real);
+    expected += (reals.size() == 1 ? "{" : ", ") + text;
+    if (reals.size() < count)
+        return true;
+    expected += '}';
+    const std::string written = IC::PropertyValue(reals);
+    const bool same = written == expected;
+    if (!same)
+        std::cout << "an array is written " << written << " instead of " << expected << '\n';
+    reals.clear();
+    expected.clear();
+    return same;
+}
 
 bool agree(double real)
 {
     std::ostringstream stream;
     stream << real;
     if (std::string(IC::Number(real)) == stream.str())
-        return true;
+        return agreesInArray(real, stream.str());
     std::cout << std::hexfloat << real << " is written " << std::string(IC::Number(real)) << " instead of "
               << stream.str() << '\n';
     return false;
@@ -85,7 +108,7 @@ double halfway()
 
 int main(int argc, char** argv)
 {
-    const long long count = argc > 1 ? std::atoll(argv[1]) : 100000000;
+    const long long count = argc > 1 ? std::atoll(argv[1]) : 1000000000;
     bool same = agreeAtEdges();
     for (long long i = 0; same && i < count / 4; ++i) {
         const double decimal = randomDecimal();
