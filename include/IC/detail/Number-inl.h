@@ -83,7 +83,7 @@ inline Number::operator unsigned int() const
 
 inline Number::operator unsigned long long() const
 {
-    if (detail::likely(kind_ == KIND_UINT64))
+    if (kind_ == KIND_UINT64)
         return load<ZQ::Uint64>();
     ZQ::Uint64 content = 0;
     return get(content) ? content : toUint64();
@@ -224,7 +224,7 @@ inline bool operator==(const Number& a, const Number& b)
 {
     if (a.kind_ != b.kind_)
         return false;
-    if (Number::both(Number::KIND_UINT32, a, b))
+    if (detail::likely(Number::both(Number::KIND_UINT32, a, b)))
         return a.load<ZQ::Uint32>() == b.load<ZQ::Uint32>();
     if (Number::both(Number::KIND_REAL, a, b))
         return a.load<ZQ::Real64>() == b.load<ZQ::Real64>();
