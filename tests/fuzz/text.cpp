@@ -1,9 +1,12 @@
 // The texts of values, property maps, errors and alerts match the model, under the classic locale and under locales
-// that group digits. A copy has the same text. Streams of any settings insert each text as a whole.
+// that group digits. A copy has the same text. Streams of any settings insert each text as a whole, and as much of a map
+// as they take.
 #include <iomanip>
 #include <locale>
 #include <map>
 #include <sstream>
+#include <streambuf>
+#include <string>
 
 #include "AnyValue.h"
 #include "Check.h"
@@ -23,11 +26,27 @@ struct Settings {
     std::ostringstream stream() const
     {
         std::ostringstream out;
+        apply(out);
+        return out;
+    }
+
+    void apply(std::ostream& out) const
+    {
         out.flags(flags);
         out.width(width);
         out.fill(fill);
-        return out;
     }
+};
+
+// Takes so many characters and fails from then on.
+class Narrow : public std::streambuf {
+public:
+    explicit Narrow(std::size_t room) : room_(room, '\0') { setp(room_.data(), room_.data() + room); }
+
+    std::string taken() const { return {pbase(), pptr()}; }
+
+private:
+    std::string room_;
 };
 
 Settings anySettings(FuzzedDataProvider& bytes)
@@ -52,9 +71,10 @@ void requireInsertedAsOneText(const Value& value, const Settings& settings)
     requireSame(out.str(), expected.str(), "value in a stream");
 }
 
-void requirePropertiesInPieces(const ValuePair& first, const ValuePair& second, unsigned int key,
+void requirePropertiesInPieces(FuzzedDataProvider& bytes, const ValuePair& first, const ValuePair& second,
                                const Settings& settings)
 {
+    const auto key = anyInteger<unsigned int>(bytes);
     const std::map<unsigned int, IC::PropertyValue> properties = {{key, first.actual},
                                                                   {key / 2, second.actual}};
     std::ostringstream out = settings.stream();
@@ -66,7 +86,15 @@ void requirePropertiesInPieces(const ValuePair& first, const ValuePair& second, 
         before = "], [";
     }
     expected << "]";
-    requireSame(out.str(), expected.str(), "property map in a stream");
+    const std::string whole = expected.str();
+    requireSame(out.str(), whole, "property map in a stream");
+    const auto room = bytes.ConsumeIntegralInRange<std::size_t>(0, whole.size());
+    Narrow narrow(room);
+    std::ostream filled(&narrow);
+    settings.apply(filled);
+    filled << properties;
+    requireSame(narrow.taken(), whole.substr(0, room), "property map in a stream that fills up");
+    require(filled.bad() == (room < whole.size()), "only a stream that fills up is bad");
 }
 
 void requireErrorText(FuzzedDataProvider& bytes, const agreement::NumberPair& value, const Settings& settings)
@@ -134,7 +162,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     }
     case 2: {
         const auto first = anyValue(bytes);
-        requirePropertiesInPieces(first, anyValue(bytes), anyInteger<unsigned int>(bytes), settings);
+        requirePropertiesInPieces(bytes, first, anyValue(bytes), settings);
         break;
     }
     case 3:
