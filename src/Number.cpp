@@ -368,13 +368,8 @@ bool Number::equal(const Number& a, const Number& b)
 }
 
 // Emits these inline functions, because the library exports them.
-[[gnu::used]] static bool (*const comparisons[])(const Number&,
-                                                 const Number&) = {operator==, operator<, operator> };
-
-bool operator!=(const Number& a, const Number& b)
-{
-    return !(a == b);
-}
+[[gnu::used]] static bool (*const comparisons[])(
+    const Number&, const Number&) = {operator==, operator!=, operator<, operator> };
 
 // For two of one kind. Of a kind that is not named here, neither precedes.
 bool Number::precedes(const Number& a, const Number& b)

@@ -285,13 +285,8 @@ bool PropertyValue::equal(const PropertyValue& a, const PropertyValue& b)
 }
 
 // Emits these inline functions, because the library exports them.
-[[gnu::used]] static bool (*const comparisons[])(const PropertyValue&,
-                                                 const PropertyValue&) = {operator==, operator<, operator> };
-
-bool operator!=(const PropertyValue& a, const PropertyValue& b)
-{
-    return !(a == b);
-}
+[[gnu::used]] static bool (*const comparisons[])(
+    const PropertyValue&, const PropertyValue&) = {operator==, operator!=, operator<, operator> };
 
 // For two of one kind.
 bool PropertyValue::precedes(const PropertyValue& a, const PropertyValue& b)

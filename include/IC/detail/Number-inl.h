@@ -232,6 +232,11 @@ inline bool operator==(const Number& a, const Number& b)
 }
 #pragma GCC diagnostic pop
 
+inline bool operator!=(const Number& a, const Number& b)
+{
+    return !(a == b);
+}
+
 inline bool operator<(const Number& a, const Number& b)
 {
     if (Number::both(Number::KIND_UINT32, a, b))

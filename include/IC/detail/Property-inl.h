@@ -267,6 +267,11 @@ inline bool operator==(const PropertyValue& a, const PropertyValue& b)
     return Value::equal(a, b);
 }
 
+inline bool operator!=(const PropertyValue& a, const PropertyValue& b)
+{
+    return !(a == b);
+}
+
 inline bool operator<(const PropertyValue& a, const PropertyValue& b)
 {
     using Value = PropertyValue;
