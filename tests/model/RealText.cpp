@@ -95,7 +95,7 @@ double randomDecimal()
     return moved(static_cast<double>(randomBits() % static_cast<std::uint64_t>(longest)));
 }
 
-// Six digits and a five: the real nearest to the middle between two texts, or one of its neighbours.
+// Six digits and a five, moved: about the middle between two texts, mostly the nearest real or one of its neighbours.
 double halfway()
 {
     const auto digits = static_cast<double>((randomBits() % 1000000) * 10 + 5);

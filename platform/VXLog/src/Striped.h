@@ -12,8 +12,8 @@ namespace VXLog {
 
 // The locks of this library, with what they guard: copies of a T, each under a lock of its own, so that threads that run
 // at the same time seldom wait for each other. A thread holds at most one of them at a time, or all of one Striped, and
-// under them only this library's code runs. fork() acquires all and releases them in parent and child, so a child finds
-// them free.
+// under them only this library's code runs. fork() acquires those of every Striped and releases them in parent and child,
+// so a child finds them free.
 template <class T>
 class Striped {
 public:
