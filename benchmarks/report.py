@@ -304,114 +304,73 @@ def report(context, results, bars):
     return lines, len(missed)
 
 
-# The figure has a panel for each kind of workload and a group of bars for each workload.
+# The figure has a line for each of these workloads: what users do most, and where the library is first and last.
 
-COLOURS = {
-    LIBRARY: "#c0392b",
-    LIMIT: "#2c3e50",
-    "std::variant": "#2980b9",
-    RECORDS: "#7fb3d5",
-    "nlohmann::json": "#27ae60",
-    "boost::json": "#82c99a",
-    "Poco::Var": "#d68910",
-    "QVariant": "#a793c4",
-    "GVariant": "#c3b9cf",
-    PRIMITIVE: "#7f8c8d",
+SHOWN = [
+    "make/number", "copy/number", "copy/text12", "copy/texts100", "read/number", "equal/number", "equal/numbers100",
+    "text/number", "text/real", "map32/find-and-read", "map32/print", "node/get-and-read", "node/set-number",
+    "refused-read/text12", "compile/Node.h", "bytes/value/numbers100",
+]
+STYLE = """
+text { font: 13px sans-serif; fill: #222; } .card { fill: #fff; }
+.strong { font-weight: bold; } .middle { text-anchor: middle; } .end { text-anchor: end; }
+line { stroke: #ddd; } .one { stroke: #222; } .stem { stroke-width: 3; }
+.faster { fill: #0072b2; stroke: #0072b2; } .slower { fill: #c84a00; stroke: #c84a00; }
+@media (prefers-color-scheme: dark) {
+text { fill: #e2e2e2; } .card { fill: #1b1e23; } line { stroke: #3c4048; } .one { stroke: #e2e2e2; }
+.faster { fill: #56b4e9; stroke: #56b4e9; } .slower { fill: #ff9248; stroke: #ff9248; }
 }
-PANEL_WIDTH = 400
-LABEL_WIDTH = 128
-BAR_HEIGHT = 6
-GROUP_GAP = 8
-PANEL_COLUMNS = 3
+"""
 
 
-def escaped(text):
-    return html.escape(text, quote=True)
-
-
-def panel(name, rows, columns):
-    """The SVG of one panel, and its height."""
-    everything = [value for _, medians in rows for value in medians.values()]
-    low = math.floor(math.log10(min(everything)) - 0.3)
-    high = math.ceil(math.log10(max(everything)) + 0.01)
-    plot_width = PANEL_WIDTH - LABEL_WIDTH - 24
+def draw(results, bars):
+    """The figure as SVG: the ratio to the best peer and, where a bar names another peer, the ratio to that one."""
+    shown = []
+    for row in SHOWN:
+        medians = results[row]
+        counted = [peer for peer in PEERS if peer in medians and peer not in SHARING]
+        faster = sum(round(medians.ratio(LIBRARY, peer), 2) > 1 for peer in counted)
+        place = f"{1 + faster} of {1 + len(counted)}"
+        against = [ratio for _, ratio in (ratios(row, medians, []), ratios(row, medians, bars)) if ratio]
+        shown += [(value, row, peer, place) for peer, value in {ratio.other: ratio.value for ratio in against}.items()]
+    shown.sort()
+    low, high = (math.log(value) for value in (min(1, shown[0][0]) / 1.3, max(1, shown[-1][0]) * 1.3))
 
     def x(value):
-        return LABEL_WIDTH + plot_width * (math.log10(value) - low) / (high - low)
+        return round(180 + 240 * (math.log(value) - low) / (high - low), 1)
 
-    parts = [f'<text x="0" y="12" class="title">{escaped(name)}</text>']
-    y = 32
-    bars = []
-    for row, medians in rows:
-        shown = [column for column in columns if column in medians]
-        label = row.split("/", 1)[1]
-        middle = y + len(shown) * BAR_HEIGHT / 2 + 4
-        bars.append(f'<text x="{LABEL_WIDTH - 6}" y="{middle:.1f}" class="label">{escaped(label)}</text>')
-        for column in shown:
-            width = x(medians[column]) - LABEL_WIDTH
-            bars.append(
-                f'<rect x="{LABEL_WIDTH}" y="{y}" width="{width:.1f}" height="{BAR_HEIGHT - 1}" '
-                f'fill="{COLOURS[column]}"><title>{escaped(column)}: {quantity(medians[column], row)}</title></rect>'
-            )
-            y += BAR_HEIGHT
-        y += GROUP_GAP
-    for exponent in range(low, high + 1):
-        parts.append(
-            f'<line x1="{x(10**exponent):.1f}" y1="28" x2="{x(10**exponent):.1f}" y2="{y}" class="grid"/>'
-            f'<text x="{x(10**exponent):.1f}" y="24" class="tick">{tick(exponent, rows[0][0])}</text>'
-        )
-    return parts + bars, y + 16
+    def text(left, y, content, style=""):
+        return f'<text x="{left}" y="{y}" class="{style}">{html.escape(content)}</text>'
 
-
-def tick(exponent, row):
-    units = ["B", "kB", "MB"] if row.startswith("bytes/") else ["ns", "µs", "ms", "s"]
-    index = min(max(exponent // 3, 0), len(units) - 1)
-    return f"{10.0 ** (exponent - 3 * index):g} {units[index]}"
-
-
-def draw(results):
-    """The whole figure as SVG."""
-    columns = [column for column in COLOURS if any(column in medians for medians in results.values())]
-    panels = {}
-    for row, medians in results.items():
-        panels.setdefault(kind(row), []).append((row, medians))
-
-    heights = [64] * PANEL_COLUMNS
-    body = []
-    for name, rows in panels.items():
-        parts, height = panel(name, rows, columns)
-        column = heights.index(min(heights))
-        body.append(f'<g transform="translate({20 + column * (PANEL_WIDTH + 16)} {heights[column]})">')
-        body += parts + ["</g>"]
-        heights[column] += height
-
-    legend = []
-    left = 20
-    for column in columns:
-        if column == PRIMITIVE:
-            continue
-        legend.append(f'<rect x="{left}" y="30" width="10" height="10" fill="{COLOURS[column]}"/>')
-        legend.append(f'<text x="{left + 14}" y="39" class="legend">{escaped(heading(column))}</text>')
-        left += 40 + 6 * len(heading(column))
-    width = 40 + PANEL_COLUMNS * (PANEL_WIDTH + 16)
-    style = (
-        "text { font-family: sans-serif; fill: #222; } .title { font-size: 13px; font-weight: bold; }"
-        " .label { font-size: 10px; text-anchor: end; } .tick { font-size: 9px; text-anchor: middle; fill: #666; }"
-        " .legend { font-size: 10px; } .head { font-size: 12px; } .grid { stroke: #ddd; stroke-width: 1; }"
-    )
-    return "\n".join(
-        [
-            f'<svg xmlns="http://www.w3.org/2000/svg" viewBox="0 0 {width} {max(heights)}" width="{width}" '
-            f'height="{max(heights)}">',
-            f"<style>{style}</style>",
-            f'<rect width="{width}" height="{max(heights)}" fill="white"/>',
-            '<text x="20" y="20" class="head">Time of one operation (bytes where marked), logarithmic; shorter is '
-            "better. * copies share their content</text>",
+    bottom = 98 + 21 * len(shown)
+    parts = [
+        f'<svg xmlns="http://www.w3.org/2000/svg" viewBox="0 0 700 {bottom + 30}" width="700" height="{bottom + 30}">',
+        f"<style>{STYLE}</style>",
+        '<rect width="100%" height="100%" rx="6" class="card"/>',
+        text(14, 24, f"Time of {LIBRARY} ÷ time of the best peer whose copies are independent", "strong"),
+        text(14, 43, f"The place is among {LIBRARY} and these peers. bytes/... compares memory, not time."),
+        text(14, 62, "node/set-number is also compared with the node of variants that writes the same records."),
+        text(14, 88, "workload", "strong"),
+        text(x(1) - 8, 88, "← faster", "strong end"),
+        text(x(1) + 8, 88, "slower →", "strong"),
+        text(462, 88, "ratio", "strong end"),
+        text(474, 88, "peer", "strong"),
+        text(688, 88, "place", "strong end"),
+    ]
+    for tick in (0.01, 0.02, 0.05, 0.1, 0.2, 0.5, 1, 2, 5, 10, 20, 50, 100):
+        if low < math.log(tick) < high:
+            style = "one" if tick == 1 else ""
+            parts.append(f'<line x1="{x(tick)}" y1="96" x2="{x(tick)}" y2="{bottom}" class="{style}"/>')
+            parts.append(text(x(tick), bottom + 17, f"{tick:g}", "middle"))
+    for y, (value, row, peer, place) in zip(range(108, bottom, 21), shown):
+        side = "faster" if value < 1 else "slower"
+        parts += [
+            text(14, y + 4, row),
+            f'<line x1="{x(1)}" y1="{y}" x2="{x(value)}" y2="{y}" class="stem {side}"/>',
+            f'<circle cx="{x(value)}" cy="{y}" r="5" class="{side}"/>',
+            text(462, y + 4, f"{value:.2f}", "end"), text(474, y + 4, peer), text(688, y + 4, place, "end"),
         ]
-        + legend
-        + body
-        + ["</svg>", ""]
-    )
+    return "\n".join(parts + ["</svg>", ""])
 
 
 def update(page, lines):
@@ -439,7 +398,7 @@ def main():
     lines, missed = report(context, results, bars)
     print("\n".join(lines))
     if arguments.svg:
-        arguments.svg.write_text(draw(results), encoding="utf-8")
+        arguments.svg.write_text(draw(results, bars), encoding="utf-8")
     if arguments.update:
         update(arguments.update, lines)
     return 1 if missed else 0
