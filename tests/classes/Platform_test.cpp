@@ -2,6 +2,9 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sched.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <atomic>
@@ -12,6 +15,7 @@
 #include <iomanip>
 #include <limits>
 #include <memory>
+#include <optional>
 #include <sstream>
 #include <stdexcept>
 #include <thread>
@@ -38,6 +42,43 @@ static_assert(std::is_same_v<ZQ::Uint64, unsigned long long>);
 static_assert(std::is_same_v<ZQ::Real64, double>);
 
 static_assert(!std::is_copy_constructible_v<VXLog::Record>);  // it refers to texts of the caller
+
+thread_local std::optional<int> processor;  // what sched_getcpu returns instead of the true number
+thread_local bool isProcessorRead = false;
+
+}  // namespace
+
+// Replaces the C library's function, also in the shared libraries.
+extern "C" [[gnu::visibility("default")]] int sched_getcpu() noexcept
+{
+    isProcessorRead = true;
+    if (processor)
+        return *processor;
+    unsigned int number = 0;
+    return syscall(SYS_getcpu, &number, nullptr, nullptr) == 0 ? static_cast<int>(number) : -1;
+}
+
+namespace {
+
+// Makes sched_getcpu return the number on this thread for the lifetime of the object. Expects that it is called.
+class OnProcessor {
+public:
+    explicit OnProcessor(int number)
+    {
+        processor = number;
+        isProcessorRead = false;
+    }
+    ~OnProcessor()
+    {
+        EXPECT_TRUE(isProcessorRead);
+        processor.reset();
+    }
+    OnProcessor(const OnProcessor&) = delete;
+    OnProcessor& operator=(const OnProcessor&) = delete;
+};
+
+// The stand-ins keep 16 copies and choose one by the remainder: all remainders, larger numbers, and -1, a failure.
+constexpr int processors[] = {0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16, 20, 1000, -1};
 
 // Sets an environment variable for the lifetime of the object.
 class Environment {
@@ -396,6 +437,7 @@ TEST(MessageBuffer, ForgetsTheWordsAndCallbacksOfTheBufferBefore)
 
 TEST(MessageBuffer, KeepsAStreamForTheNextBuffer)
 {
+    const OnProcessor here(0);  // another processor may have kept an older stream
     const void* first = nullptr;
     {
         VXLog::VXMessageBuffer buffer;
@@ -423,6 +465,39 @@ TEST(MessageBuffer, MayBeDestroyedOrConstructedOnAnotherThread)
     std::thread([&buffer] { buffer.reset(); }).join();
     std::thread([&buffer] { buffer = std::make_unique<VXLog::VXMessageBuffer>(); }).join();
     EXPECT_EQ(buffer->str(*buffer << "made there"), "made there");
+}
+
+TEST(MessageBuffer, MayBeConstructedAndDestroyedOnAnyProcessor)
+{
+    std::unique_ptr<VXLog::VXMessageBuffer> buffer;
+    for (const int first : processors) {
+        for (const int second : processors) {
+            {
+                const OnProcessor here(first);
+                buffer = std::make_unique<VXLog::VXMessageBuffer>();
+            }
+            EXPECT_EQ(buffer->str(*buffer << "number " << 17u), "number 17") << first << ' ' << second;
+            *buffer << "left behind";
+            const OnProcessor there(second);
+            buffer.reset();
+        }
+    }
+}
+
+TEST(MessageBuffer, KeepsAtMostFourStreamsForEachOf16Processors)
+{
+    const OnProcessor here(9);
+    const auto useAtOnce = [](std::size_t count) {
+        std::vector<VXLog::VXMessageBuffer> buffers(count);
+        for (VXLog::VXMessageBuffer& buffer : buffers) {
+            EXPECT_EQ(buffer.str(buffer << "number " << 17u), "number 17");
+            buffer << "left behind";
+        }
+    };
+    useAtOnce(64);
+    const long kept = allocation::aliveNow;
+    useAtOnce(65);
+    EXPECT_EQ(allocation::aliveNow, kept);
 }
 
 // std::exit destroys it after the thread-local objects of the main thread.
@@ -532,6 +607,37 @@ TEST_F(Sink, IsReplacedByTheNextAndReturned)
     VXLog::setRecordSink(first);
     log("3");
     EXPECT_EQ(texts, "first 1;second 2;first 3;");
+}
+
+TEST_F(Sink, IsReplacedForAllProcessors)
+{
+    std::string texts;
+    const auto writeOnAll = [&texts] {
+        texts.clear();
+        for (const int number : processors) {
+            const OnProcessor here(number);
+            VXLog::VXMessageBuffer buffer;
+            log(buffer.str(buffer << "" << number));
+        }
+        return texts;
+    };
+    VXLog::RecordSink first;
+    for (const int number : processors) {
+        SCOPED_TRACE(number);
+        {
+            const OnProcessor here(number);
+            VXLog::setRecordSink(
+                [&](const VXLog::Record& record) { texts += "first " + record.message + ';'; });
+            first = VXLog::setRecordSink([&](const VXLog::Record& record) { texts += record.message + ';'; });
+        }
+        // A processor that keeps another sink makes later calls of setRecordSink wait for ever: end here.
+        ASSERT_EQ(writeOnAll(), "0;1;2;3;4;5;6;7;8;9;10;11;12;13;14;15;16;20;1000;-1;");
+        VXLog::setRecordSink(first);
+        ASSERT_EQ(
+            writeOnAll(),
+            "first 0;first 1;first 2;first 3;first 4;first 5;first 6;first 7;first 8;first 9;"
+            "first 10;first 11;first 12;first 13;first 14;first 15;first 16;first 20;first 1000;first -1;");
+    }
 }
 
 TEST_F(Sink, AnEmptySinkRestoresTheDefault)
