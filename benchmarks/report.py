@@ -25,7 +25,7 @@ COLUMNS = [LIBRARY, LIMIT] + PEERS
 PRIMITIVE = "primitive"
 ONE_THREAD = ", one thread"  # what a contender of a row of two threads does in one
 NODE_PANELS = {"node", "two-threads", "nodes"}
-WITHOUT_PEERS = {"bytes", "visit", "compile", "load"}
+WITHOUT_PEERS = {"bytes", "visit", "compile", "link", "load"}
 
 BEGIN = "<!-- measured: begin (written by scripts/run-benchmarks --update-docs) -->"
 END = "<!-- measured: end -->"
