@@ -1,6 +1,5 @@
 #include "IC/Node.h"
 
-#include <ostream>
 #include <utility>
 
 #include "detail/Failure.h"
@@ -161,7 +160,7 @@ bool operator>=(const Node& a, const Node& b)
 std::ostream& operator<<(std::ostream& out, const Node& node)
 {
     // Through the string, because a derived class may override the conversion.
-    return out << node.operator std::string();
+    return detail::insertText(out, node.operator std::string());
 }
 
 }  // namespace IC

@@ -431,12 +431,12 @@ std::ostream& operator<<(std::ostream& out, const Number& number)
     if (number.kind_ == Number::KIND_UINT32 && detail::globalLocaleIsClassic()) {  // the most frequent kinds
         char digits[10];
         const char* const end = detail::writeDecimal(digits, number.load<ZQ::Uint32>());
-        return out << std::string_view(digits, static_cast<std::size_t>(end - digits));
+        return detail::insertText(out, {digits, static_cast<std::size_t>(end - digits)});
     }
     if (number.kind_ == Number::KIND_REAL && detail::globalLocaleIsClassic()) {
         char digits[detail::longestReal];
         const char* const end = detail::writeReal(digits, number.load<ZQ::Real64>());
-        return out << std::string_view(digits, static_cast<std::size_t>(end - digits));
+        return detail::insertText(out, {digits, static_cast<std::size_t>(end - digits)});
     }
     return detail::insert(out, number);
 }

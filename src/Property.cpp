@@ -337,7 +337,7 @@ std::string pB(unsigned char byte)
 std::ostream& operator<<(std::ostream& out, const PropertyValue& value)
 {
     if (value.holds(PropertyValue::KIND_STRING))
-        return out << value.object<std::string>();
+        return detail::insertText(out, value.object<std::string>());
     if (value.holds(PropertyValue::KIND_NUMBER))
         return out << value.object<Number>();
     return detail::insert(out, value);
@@ -345,7 +345,7 @@ std::ostream& operator<<(std::ostream& out, const PropertyValue& value)
 
 std::ostream& operator<<(std::ostream& out, const std::pair<unsigned int, PropertyValue>& property)
 {
-    return out << property.first << " = " << property.second;
+    return detail::insertText(out << property.first, " = ") << property.second;
 }
 
 std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, PropertyValue>& properties)
@@ -353,7 +353,8 @@ std::ostream& operator<<(std::ostream& out, const std::map<unsigned int, Propert
     for (auto property = properties.begin(); property != properties.end();) {
         const auto& [key, value] = *property;
         const bool last = ++property == properties.end();
-        out << '[' << key << " = " << value << (last ? "]" : "], ");
+        detail::insertText(detail::insertText(out, "[") << key, " = ");
+        detail::insertText(out << value, last ? "]" : "], ");
     }
     return out;
 }

@@ -1,6 +1,7 @@
 #include "detail/Text.h"
 
 #include <algorithm>
+#include <exception>
 #include <limits>
 #include <stdexcept>
 
@@ -13,6 +14,13 @@ bool GlobalLocale::isNamedClassic() const
 {
     return locale_.name() == "C";
 }
+
+// What the stream's own operator sets if the buffer takes less than the whole text.
+#ifdef _LIBCPP_VERSION
+static constexpr auto isFull = std::ios_base::badbit | std::ios_base::failbit;
+#else
+static constexpr auto isFull = std::ios_base::badbit;
+#endif
 
 Text::Text() = default;
 
@@ -54,6 +62,34 @@ void Text::grow(std::size_t length)
         std::memcpy(long_.data(), short_, used_);
     text_ = long_.data();
     room_ = long_.size();
+}
+
+// Handles what a stream's buffer has thrown as the stream's own operator does. Not inline: the frame would cost time.
+[[gnu::noinline, gnu::cold]] static void handleExceptionOf(std::ostream& out)
+{
+    try {
+        out.setstate(std::ios_base::badbit);
+    } catch (...) {  // std::ios_base::failure; what the buffer has thrown goes on instead
+    }
+    const bool isCancelled = std::current_exception() == nullptr;  // the thread
+    if ((out.exceptions() & std::ios_base::badbit) != 0 || isCancelled)
+        throw;
+}
+
+std::ostream& insertText(std::ostream& out, std::string_view text)
+{
+    // The stream's own operator asks for each of these in functions that are not inline: that is half of its time.
+    if (!out.good() || out.width() != 0 || out.tie() != nullptr
+        || (out.flags() & std::ios_base::unitbuf) != 0)
+        return out << text;
+    const auto length = static_cast<std::streamsize>(text.size());
+    try {
+        if (out.rdbuf()->sputn(text.data(), length) != length)
+            out.setstate(isFull);
+    } catch (...) {
+        handleExceptionOf(out);
+    }
+    return out;
 }
 
 const char* checked(const char* text)

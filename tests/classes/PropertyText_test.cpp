@@ -728,6 +728,87 @@ TEST(PropertyStream, WritesAMapInFivePiecesForEachProperty)
     EXPECT_EQ(narrow.flushes, 10);
 }
 
+// Takes a whole text, some of it or nothing, or throws. Lists the calls.
+class Listing : public std::streambuf {
+public:
+    struct Thrown { };
+    enum class Answer { all, some, none, exception };
+
+    explicit Listing(Answer answer) : answer_(answer) { }
+
+    std::string calls;
+
+protected:
+    int_type overflow(int_type character) override
+    {
+        const char text = traits_type::to_char_type(character);
+        return xsputn(&text, 1) == 1 ? character : traits_type::eof();
+    }
+    std::streamsize xsputn(const char* characters, std::streamsize count) override
+    {
+        calls += '<' + std::string(characters, static_cast<std::size_t>(count)) + '>';
+        if (answer_ == Answer::exception)
+            throw Thrown();
+        return answer_ == Answer::all ? count : answer_ == Answer::some ? count / 2 : 0;
+    }
+    int sync() override
+    {
+        calls += "flush ";
+        return 0;
+    }
+
+private:
+    Answer answer_;
+};
+
+// What inserting a text or a value does to a stream.
+template <class Inserted>
+std::string effect(const Inserted& inserted, Listing::Answer answer, std::ios_base::iostate exceptions,
+                   std::ios_base::iostate state, bool isPadded, bool isTied, bool isFlushed)
+{
+    Listing buffer(answer);
+    std::ostream out(&buffer);
+    std::ostream tied(&buffer);
+    if (isTied)
+        out.tie(&tied);
+    if (isFlushed)
+        out << std::unitbuf;
+    if (isPadded)
+        out << std::setw(9);
+    out.clear(state);
+    std::string thrown;
+    try {
+        out.exceptions(exceptions);
+        out << inserted;
+    } catch (const Listing::Thrown&) {
+        thrown = "its own exception";
+    } catch (const std::ios_base::failure&) {
+        thrown = "failure";
+    }
+    return buffer.calls + ", state " + std::to_string(out.rdstate()) + ", width "
+        + std::to_string(out.width()) + ", exception " + thrown;
+}
+
+TEST(PropertyStream, DoesToAStreamWhatItsOwnInsertionDoes)
+{
+    constexpr auto good = std::ios_base::goodbit;
+    EXPECT_EQ(effect(text("abc"), Listing::Answer::all, good, good, false, false, true),
+              "<abc>flush , state 0, width 0, exception ");
+    using Answer = Listing::Answer;
+    for (const Answer answer : {Answer::all, Answer::some, Answer::none, Answer::exception})
+        for (const auto exceptions : {good, std::ios_base::badbit, std::ios_base::failbit})
+            for (const auto state : {good, std::ios_base::eofbit, std::ios_base::failbit})
+                for (const bool isPadded : {false, true})
+                    for (const bool isTied : {false, true})
+                        for (const bool isFlushed : {false, true})
+                            for (const PropertyValue& value : {text("abc"), text(""), number(Number(7u)),
+                                                               number(Number(0.5)), numbers({Number(1u)})})
+                                ASSERT_EQ(
+                                    effect(value, answer, exceptions, state, isPadded, isTied, isFlushed),
+                                    effect(std::string(value), answer, exceptions, state, isPadded, isTied,
+                                           isFlushed));
+}
+
 TEST(PropertyStream, KeepsThePiecesBeforeAValueThatThrows)
 {
     const Number dateTime(5L, 123);
