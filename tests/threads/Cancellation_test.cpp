@@ -5,8 +5,6 @@
 
 #include <algorithm>
 #include <memory>
-#include <ostream>
-#include <streambuf>
 #include <string>
 
 #include "IC/Node.h"
@@ -129,24 +127,6 @@ TEST_F(Cancellation, WhileARecordIsWrittenUnderTheLockReleasesTheLock)
 TEST_F(Cancellation, InAnOverrideUnderTheLockReleasesTheLock)
 {
     cancelIn([](Fan& fan) { static_cast<void>(fan.operator std::string()); });
-}
-
-TEST_F(Cancellation, WhileAStreamTakesAValueEndsTheThread)
-{
-    cancelIn([](Fan& fan) {
-        class Cancelling : public std::streambuf {
-            std::streamsize xsputn(const char*, std::streamsize) override
-            {
-                cancelThisThread();
-                pthread_testcancel();
-                return 0;
-            }
-        } cancelling;
-        std::ostream out(&cancelling);
-        PropertyValue value("");
-        fan.getProperty(1, value);
-        out << value;
-    });
 }
 
 TEST_F(Cancellation, TakesEffectAfterTheDefaultSinkHasWrittenItsLine)
