@@ -91,6 +91,20 @@ void makeTexts(long count)
     });
 }
 
+// Writes an array of so many reals; the operation that counts is a hundred of them.
+template <long length>
+void makeTextsOfReals(long count)
+{
+    benchmarks::Reals reals;
+    for (std::size_t i = 0; i < std::size_t {length}; ++i)
+        reals.push_back(content<Subject::anyReal>(i));
+    const PropertyValue value = valueOf(reals);
+    repeat(100 * count / length, [&value] {
+        std::string text = value;
+        use(text);
+    });
+}
+
 template <Subject S>
 void print(long count)
 {
@@ -217,6 +231,8 @@ const std::map<std::string, std::function<void(long)>> operations = {
      }},
     {"text-of-any-real", makeTexts<Subject::anyReal>},
     {"text-of-reals", makeTexts<Subject::reals100>},
+    {"text-of-1000-reals", makeTextsOfReals<1000>},
+    {"text-of-100000-reals", makeTextsOfReals<100000>},
     {"text-of-mixed", makeTexts<Subject::mixed100>},
     {"print-number", print<Subject::number>},
     {"print-any-real", print<Subject::anyReal>},

@@ -122,11 +122,11 @@ def main():
         counts = dict(zip(operations, executor.map(count, operations)))
 
     exceeded = []
-    print(f"{'operation':19} {'now':>9} {'table':>9} {'ratio':>6}")
+    print(f"{'operation':20} {'now':>9} {'table':>9} {'ratio':>6}")
     for operation, now in counts.items():
         before = table.get(operation, math.nan)
         ratio = now / before
-        print(f"{operation:19} {now:9.1f} {before:9.1f} {ratio:6.3f}")
+        print(f"{operation:20} {now:9.1f} {before:9.1f} {ratio:6.3f}")
         if not 1 - TOLERANCE <= ratio <= 1 + TOLERANCE:
             exceeded.append(operation)
 
