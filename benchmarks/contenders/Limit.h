@@ -12,12 +12,13 @@
 #include <utility>
 #include <vector>
 
+#include "Records.h"
 #include "detail/Digits.h"
 
 // The limit of the design: the library's representation (one heap object for each value, an ordered map, a re-entrant
 // mutex) in the shortest code that does the work. Everything is inline but the functions that throw and the digits of
-// reals. No records are written, and the locale is ignored. Digits come from the library's own functions: the limit
-// shows what the library does around them.
+// reals. The locale is ignored. Only setting a property writes records, and only that is virtual, as in the library.
+// Digits come from the library's own functions: the limit shows what the library does around them.
 namespace limit {
 
 struct NodeReference {
@@ -481,14 +482,18 @@ public:
         return {success, {}, {}};
     }
 
-    Outcome set(unsigned int key, const Value& value)
+    virtual Outcome set(unsigned int key, const Value& value)
     {
+        const auto written = [&](VXLog::VXMessageBuffer& buffer) -> std::ostream& {
+            return (buffer << "setProperty: " << key) << ' ' << value;
+        };
+        benchmarks::writeRecords(3000, written);
         const std::lock_guard<std::recursive_mutex> lock(mutex_);
         const auto found = properties_.find(key);
         if (found == properties_.end())
-            return {noSuchProperty, {}, {}};
+            return refusedSet(key, " does not exist", noSuchProperty);
         if (found->second.readOnly())
-            return {isReadOnly, {}, {}};
+            return refusedSet(key, " read-only", isReadOnly);
         found->second = value;
         return {success, {}, {}};
     }
@@ -524,6 +529,14 @@ private:
     {
         const std::lock_guard<std::recursive_mutex> lock(mutex_);
         return status();
+    }
+
+    static Outcome refusedSet(unsigned int key, const char* reason, unsigned char status)
+    {
+        benchmarks::writeRecords(6000, [&](VXLog::VXMessageBuffer& buffer) -> std::ostream& {
+            return buffer << "setProperty: " << key << reason;
+        });
+        return {status, {}, {}};
     }
 
     mutable std::recursive_mutex mutex_;

@@ -10,8 +10,7 @@
 #include <variant>
 
 #include "NodeWorkloads.h"
-#include "VXLog/VXLogger.h"
-#include "VXLog/VXMessageBuffer.h"
+#include "Records.h"
 #include "ValueWorkloads.h"
 
 namespace benchmarks {
@@ -210,7 +209,7 @@ public:
     // The same, with the two records that the library writes, each composed in a message buffer.
     bool setWithRecords(unsigned int key, const Variant& value)
     {
-        record(3000, [&](VXLog::VXMessageBuffer& buffer) -> std::ostream& {
+        writeRecords(3000, [&](VXLog::VXMessageBuffer& buffer) -> std::ostream& {
             std::ostream& out = buffer << "setProperty: " << key;
             out << ' ';
             std::visit(Print {out}, value);
@@ -219,7 +218,7 @@ public:
         const std::lock_guard<std::recursive_mutex> lock(mutex_);
         const auto found = properties_.find(key);
         if (found == properties_.end()) {
-            record(6000, [&](VXLog::VXMessageBuffer& buffer) -> std::ostream& {
+            writeRecords(6000, [&](VXLog::VXMessageBuffer& buffer) -> std::ostream& {
                 return buffer << "setProperty: " << key << " does not exist";
             });
             return false;
@@ -254,17 +253,6 @@ public:
     }
 
 private:
-    template <class Compose>
-    static void record(int level, const Compose& compose)
-    {
-        static const std::string logger = "Vexilon.IC.Node";
-        VXLog::VXMessageBuffer buffer;
-        VXLog::VXLogger::logLevelMessage("setProperty", "Node", __LINE__, logger, level, nullptr, 0, 0,
-                                         buffer.str(compose(buffer)));
-        VXLog::VXLogger::traceLevelMessage("setProperty", "Node", __LINE__, logger, level, nullptr, 0, 0,
-                                           buffer.str(compose(buffer)));
-    }
-
     mutable std::recursive_mutex mutex_;
     unsigned int sensor_ = 20;
     unsigned int status_ = 0;
