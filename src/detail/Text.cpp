@@ -79,7 +79,7 @@ void Text::grow(std::size_t length)
 std::ostream& insertText(std::ostream& out, std::string_view text)
 {
     // The stream's own operator asks for each of these in functions that are not inline: that is half of its time.
-    if (!out.good() || out.width() != 0 || out.tie() != nullptr
+    if (text.empty() || !out.good() || out.width() != 0 || out.tie() != nullptr
         || (out.flags() & std::ios_base::unitbuf) != 0)
         return out << text;
     const auto length = static_cast<std::streamsize>(text.size());
